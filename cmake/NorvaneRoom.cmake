@@ -1,0 +1,21 @@
+# norvane_room(NAME SOURCES... [LINK libs...]): a room of the house as a static library `nvr_NAME`, included by paths
+# from the repository's root ("runtime/Instance.h"), compiled so that it can go into the shared module.
+function(norvane_room name)
+  cmake_parse_arguments(ROOM "" "" "SOURCES;LINK" ${ARGN})
+  add_library(nvr_${name} STATIC ${ROOM_SOURCES})
+  target_include_directories(nvr_${name} PUBLIC ${PROJECT_SOURCE_DIR})
+  target_link_libraries(nvr_${name} PUBLIC ${ROOM_LINK} Threads::Threads)
+endfunction()
+
+# norvane_test(NAME SOURCES... [LINK libs...] [TIMEOUT s]): a GoogleTest program; each test runs in a process of its own,
+# since much of what is tested lives once a process.
+function(norvane_test name)
+  cmake_parse_arguments(TEST "" "TIMEOUT" "SOURCES;LINK;ENVIRONMENT" ${ARGN})
+  if(NOT TEST_TIMEOUT)
+    set(TEST_TIMEOUT 60)
+  endif()
+  add_executable(${name} ${TEST_SOURCES})
+  target_link_libraries(${name} PRIVATE ${TEST_LINK} GTest::gmock)
+  gtest_discover_tests(${name} TEST_PREFIX "${name}." DISCOVERY_MODE PRE_TEST
+    PROPERTIES TIMEOUT ${TEST_TIMEOUT} ENVIRONMENT "${TEST_ENVIRONMENT}")
+endfunction()
