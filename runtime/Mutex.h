@@ -1,0 +1,59 @@
+/// A POSIX mutex, plain or recursive, and guards for it.
+#pragma once
+
+#include <pthread.h>
+
+namespace cimple {
+
+struct MutexRep {
+    pthread_mutex_t mutex;
+};
+
+class Mutex {
+public:
+    /// `recursive`: the owner may lock it again.
+    explicit Mutex(bool recursive = true);
+    ~Mutex();
+    Mutex(const Mutex&) = delete;
+    Mutex& operator=(const Mutex&) = delete;
+
+    /// Waits for the mutex. Failure (a plain mutex destroyed under us, say) stops the process by assertion.
+    void lock();
+    void unlock();
+    /// 0, EBUSY (16) if another thread holds it, or -1.
+    int try_lock();
+
+private:
+    friend class Cond;
+    MutexRep* _rep;
+};
+
+class Cond {
+public:
+    Cond();
+    ~Cond();
+    Cond(const Cond&) = delete;
+    Cond& operator=(const Cond&) = delete;
+
+    /// Releases `mutex`, waits for a signal (or a spurious wake-up), and takes it again.
+    void wait(Mutex& mutex);
+    void signal();
+    void broadcast();
+
+private:
+    pthread_cond_t m_cond;
+};
+
+/// Holds a mutex for a scope.
+class Auto_Mutex {
+public:
+    explicit Auto_Mutex(Mutex& mutex) : m_mutex(mutex) { m_mutex.lock(); }
+    ~Auto_Mutex() { m_mutex.unlock(); }
+    Auto_Mutex(const Auto_Mutex&) = delete;
+    Auto_Mutex& operator=(const Auto_Mutex&) = delete;
+
+private:
+    Mutex& m_mutex;
+};
+
+} // namespace cimple
