@@ -118,9 +118,9 @@ struct Feature : Typed_Element {
     Kind kind = Kind::property;
     bool is_key = false; ///< says Key, or overrides a feature that is one
     bool has_default = false;
-    Value default_value;               ///< an override without a default of its own keeps the inherited one
-    std::vector<Parameter> parameters; ///< of a method, in order
-    std::string origin;                ///< name of the class that declares this very feature
+    Value default_value;                 ///< an override without a default of its own keeps the inherited one
+    std::vector<Parameter> parameters;   ///< of a method, in order
+    std::string origin;                  ///< name of the class that declares this very feature
     const Feature* overridden = nullptr; ///< the superclass's feature that this one replaces, or null
 
     /// The qualifier of that name on this feature or, failing that, on the features that it overrides, nearest first.
@@ -149,8 +149,9 @@ struct Class {
 
     /// The feature of that name, own or inherited, or null.
     const Feature* find_feature(std::string_view feature_name) const;
-    /// The method of that name, or null; likewise properties and references.
+    /// The method of that name, or null.
     const Feature* find_method(std::string_view method_name) const;
+    /// The property or reference of that name, or null.
     const Feature* find_property(std::string_view property_name) const;
 
     /// Is this class `ancestor`, or does it derive from it?

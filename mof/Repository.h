@@ -42,7 +42,8 @@ public:
     /// that was read already is passed over. Result: false after a fault.
     bool read_file(const std::string& path);
 
-    /// Reads every "*.mof" below `folder`, in the order of their names. Result: false after a fault, or if there are none.
+    /// Reads every "*.mof" below `folder`, in the order of their names. Result: false after a fault, or if there are
+    /// none.
     bool read_folder(const std::string& folder);
 
     /// Reads `text`; `name` stands for the file in faults.
@@ -73,7 +74,10 @@ private:
     bool add_class(Class&& declared);
     bool add_qualifier(Qualifier_Declaration&& declared);
     void link_supers();
+    void check_qualifiers(Qualifiers& qualifiers);
+    void check_qualifiers(Class& target);
     void resolve_features(Class& target);
+    void override_feature(Feature& feature, const Feature& overridden);
     void check_references(const Class& target);
 
     std::deque<Class> classes_;
