@@ -156,7 +156,7 @@ bool Repository::resolve()
             done[*at] = true;
         }
     }
-    for (const auto& declared : classes_)
+    for (auto& declared : classes_)
         check_references(declared);
     return faults_.empty();
 }
@@ -168,8 +168,10 @@ void Repository::link_supers()
         const auto at = by_name_.find(key_of(declared.super_name));
         if (at == by_name_.end())
             add_fault(declared.where, "the superclass " + in_quotes(declared.super_name) + " is not declared");
-        else
+        else {
             declared.super = at->second;
+            declared.super_name = declared.super->name;
+        }
     }
     for (auto& declared : classes_) {
         unsigned depth = 0;
@@ -258,17 +260,21 @@ void Repository::override_feature(Feature& feature, const Feature& overridden)
     }
 }
 
-void Repository::check_references(const Class& target)
+void Repository::check_references(Class& target)
 {
-    const auto known = [this](const Typed_Element& element) {
-        const bool good = element.type != Type::reference || find_class(element.target);
-        if (!good)
+    // The target's declared spelling replaces the one of the reference, so that names can be used as they are.
+    const auto known = [this](Typed_Element& element) {
+        if (element.type != Type::reference) return true;
+        const Class* referred = find_class(element.target);
+        if (referred)
+            element.target = referred->name;
+        else
             add_fault(element.where,
                       in_quotes(element.name) + " refers to " + in_quotes(element.target) + ", which is not declared");
-        return good;
+        return referred != nullptr;
     };
-    for (const auto& feature : target.declared) {
-        for (const auto& parameter : feature->parameters)
+    for (auto& feature : target.declared) {
+        for (auto& parameter : feature->parameters)
             known(parameter);
         if (!known(*feature) || feature->type != Type::reference || !feature->overridden) continue;
         const Class* narrowed = find_class(feature->target);

@@ -78,7 +78,7 @@ private:
     void check_qualifiers(Class& target);
     void resolve_features(Class& target);
     void override_feature(Feature& feature, const Feature& overridden);
-    void check_references(const Class& target);
+    void check_references(Class& target);
 
     std::deque<Class> classes_;
     std::vector<const Class*> order_;
