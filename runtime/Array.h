@@ -2,7 +2,8 @@
 ///
 /// Array_Base is one pointer to a rep of (traits, size, capacity, elements) and knows its element type only through
 /// Array_Traits, so that code that walks class records can handle every array alike. Array<T> is the typed face of the
-/// same handle. Copying copies the elements. No locks; one thread at a time.
+/// same handle. Copying copies the elements. No locks; one thread at a time. What makes or grows a rep throws
+/// std::bad_alloc and leaves the array as it was.
 #pragma once
 
 #include <cstddef>
@@ -28,17 +29,20 @@ extern const Array_Traits instance_array_traits;
 
 class Array_Base {
 public:
+    /// An empty array. Allocates nothing, and cannot throw, for the traits declared above.
     explicit Array_Base(const Array_Traits& traits);
     Array_Base(const Array_Base& other);
     ~Array_Base();
     Array_Base& operator=(const Array_Base& other);
 
     std::size_t size() const;
+    /// Elements that fit without growing: 8 at first.
     std::size_t capacity() const;
     const Array_Traits& traits() const;
     /// The elements, contiguous; null or not when empty. Valid until the array is written to.
     const void* data() const;
     void* data();
+    /// The element at `index`, which must lie inside.
     const void* at(std::size_t index) const;
     void* at(std::size_t index);
 
@@ -52,6 +56,11 @@ public:
 
 private:
     struct Rep;
+    static Rep empty_reps[number_of_types + 1]; // what empty arrays of the declared traits share; never written to
+    static Rep* new_rep(const Array_Traits& traits, std::size_t capacity);
+    static Rep* empty_rep(const Array_Traits& traits) noexcept;
+    static void free_rep(Rep* rep) noexcept;
+    static Rep* copy_rep(const Rep& source, std::size_t capacity);
     Rep* m_rep;
 };
 
@@ -84,6 +93,8 @@ public:
     void append(const T* elements, std::size_t count) { Array_Base::append(elements, count); }
     const T* begin() const { return static_cast<const T*>(data()); }
     const T* end() const { return begin() + size(); }
+    T* begin() { return static_cast<T*>(data()); }
+    T* end() { return begin() + size(); }
 };
 
 static_assert(sizeof(Array_Base) == sizeof(void*));

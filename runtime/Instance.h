@@ -6,6 +6,7 @@
 /// to one instance needs outside care. No operation here throws anything but std::bad_alloc, and none logs.
 #pragma once
 
+#include <atomic>
 #include <cstdio>
 
 #include "runtime/Array.h"
@@ -54,6 +55,7 @@ bool identical(const Instance* a, const Instance* b);
 
 /// Assigns features (all; or keys only) between two instances of one class; does nothing for different classes.
 /// Features that are null in `model` (null: no model) are passed over.
+/// A model of a third class leaves everything as it is. Each feature is assigned whole or not at all.
 void copy(Instance* dest, const Instance* src, const Instance* model = nullptr);
 void copy_keys(Instance* dest, const Instance* src);
 
@@ -73,7 +75,8 @@ void set_name_space_recursive(Instance* instance, const char* name_space, bool f
 
 /// The text "Class.Key=value,..." of an instance's keys, and back. Text out: 0, or -1 where the text ends at an array
 /// key or null key, or for a class without keys (text empty). Text in: an instance (refs 1) without non-key values, or
-/// null.
+/// null; its class may be any that `meta_class` or its repository leads to, but the end of a reference is always of the
+/// reference's own class or a subclass. Any text is safe.
 int instance_to_model_path(const Instance* instance, String& text);
 Instance* model_path_to_instance(const Meta_Class* meta_class, const char* text);
 
@@ -91,10 +94,26 @@ inline const void* feature_at(const Instance* instance, uint32 offset)
 }
 
 /// The null byte of a property (or reference array), directly behind its value.
-uint8& null_of(Instance* instance, const Meta_Property* property);
-uint8 null_of(const Instance* instance, const Meta_Property* property);
-uint8& null_of(Instance* instance, const Meta_Reference* reference_array);
-uint8 null_of(const Instance* instance, const Meta_Reference* reference_array);
+inline uint32 null_offset(const Meta_Property* property)
+{
+    return property->offset + (property->subscript ? uint32(sizeof(Array_Base)) : type_sizes[property->type]);
+}
+inline uint8& null_of(Instance* instance, const Meta_Property* property)
+{
+    return *static_cast<uint8*>(feature_at(instance, null_offset(property)));
+}
+inline uint8 null_of(const Instance* instance, const Meta_Property* property)
+{
+    return *static_cast<const uint8*>(feature_at(instance, null_offset(property)));
+}
+inline uint8& null_of(Instance* instance, const Meta_Reference* reference_array)
+{
+    return *static_cast<uint8*>(feature_at(instance, reference_array->offset + uint32(sizeof(Array_Base))));
+}
+inline uint8 null_of(const Instance* instance, const Meta_Reference* reference_array)
+{
+    return *static_cast<const uint8*>(feature_at(instance, reference_array->offset + uint32(sizeof(Array_Base))));
+}
 
 /// The handle of a scalar reference, of a reference array, of a property array.
 inline Instance*& reference_of(Instance* instance, const Meta_Reference* reference)

@@ -1,4 +1,7 @@
-/// A POSIX mutex, plain or recursive, and guards for it.
+/// A POSIX mutex, plain or recursive, a condition, and a guard.
+///
+/// Both are constant-initialised. A Mutex needs no destruction (the platform's mutexes hold nothing but their own
+/// bytes), so one at namespace scope simply lives for ever; a Cond there goes into an Immortal.
 #pragma once
 
 #include <pthread.h>
@@ -12,12 +15,14 @@ struct MutexRep {
 class Mutex {
 public:
     /// `recursive`: the owner may lock it again.
-    explicit Mutex(bool recursive = true);
-    ~Mutex();
+    explicit constexpr Mutex(bool recursive = true) noexcept
+        : _rep(recursive ? MutexRep{PTHREAD_RECURSIVE_MUTEX_INITIALIZER_NP} : MutexRep{PTHREAD_MUTEX_INITIALIZER})
+    {
+    }
     Mutex(const Mutex&) = delete;
     Mutex& operator=(const Mutex&) = delete;
 
-    /// Waits for the mutex. Failure (a plain mutex destroyed under us, say) stops the process by assertion.
+    /// Waits for the mutex. Failure (a corrupted mutex, say) stops the process by assertion.
     void lock();
     void unlock();
     /// 0, EBUSY (16) if another thread holds it, or -1.
@@ -25,13 +30,14 @@ public:
 
 private:
     friend class Cond;
-    MutexRep* _rep;
+    MutexRep _rep;
 };
 
 class Cond {
 public:
-    Cond();
-    ~Cond();
+    constexpr Cond() noexcept : m_cond PTHREAD_COND_INITIALIZER {}
+    /// Waits until threads that were woken have left wait().
+    ~Cond() { pthread_cond_destroy(&m_cond); }
     Cond(const Cond&) = delete;
     Cond& operator=(const Cond&) = delete;
 

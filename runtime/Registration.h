@@ -1,6 +1,7 @@
 /// The seam between the CMPI bridge and a provider: one record a provider, and one procedure with an operation code.
 #pragma once
 
+#include "runtime/Export.h"
 #include "runtime/Instance.h"
 
 namespace cimple {
@@ -129,6 +130,6 @@ struct Registration {
 };
 
 /// The head of the module's list of providers.
-extern "C" Registration* cimple_module();
+extern "C" CIMPLE_EXPORT Registration* cimple_module();
 
 } // namespace cimple

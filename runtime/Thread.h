@@ -16,18 +16,21 @@ public:
 
     Thread() = default;
 
-    /// True for a handle that no thread was created into (or whose thread was joined).
-    bool empty() const { return !m_set; }
-    void reset() { m_set = false; }
+    /// True for a handle that no thread was created into, or whose thread was joined.
+    bool empty() const { return m_thread == pthread_t{}; }
+    void reset() { m_thread = pthread_t{}; }
 
-    /// Creates a thread. Result 0 or the error of pthread_create; nothing is left behind then.
+    /// Creates a thread that runs `proc(arg)`; an exception that leaves `proc` ends the thread with result null.
+    /// Result 0 or the error of pthread_create (`thread` is empty and nothing is left behind then).
     static int create_detached(Thread& thread, Proc proc, void* arg);
     static int create_joinable(Thread& thread, Proc proc, void* arg);
 
-    /// Waits for a joinable thread to end; `result` takes what its procedure returned. Result that of pthread_join.
-    static int join(Thread thread, void*& result);
+    /// Waits for a joinable thread to end and empties the handle; `result` takes what its procedure returned, null on
+    /// failure. Result that of pthread_join, ESRCH for an empty handle.
+    static int join(Thread& thread, void*& result);
 
-    /// Ends the calling thread as a return of its procedure would.
+    /// Ends the calling thread, unwinding its stack: as a return of its procedure would, where the thread is one of
+    /// ours; on another, the current context's thread_exit_hook runs first.
     [[noreturn]] static void exit(void* result);
 
     static Thread self();
@@ -35,8 +38,7 @@ public:
     pthread_t id() const { return m_thread; }
 
 private:
-    pthread_t m_thread{};
-    bool m_set = false;
+    pthread_t m_thread{}; // glibc never gives a thread the value 0
 };
 
 } // namespace cimple

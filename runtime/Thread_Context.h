@@ -6,6 +6,7 @@
 
 #include <pthread.h>
 
+#include "runtime/Export.h"
 #include "runtime/Instance.h"
 
 namespace cimple {
@@ -45,15 +46,17 @@ public:
 
     /// The calling thread's current context, or null.
     static Thread_Context* top();
-    /// Makes `context` the current one; `pop` goes back to the one before. Neither owns anything.
+    /// Makes `context` the current one. Throws std::bad_alloc where the process or the thread has no room for a
+    /// thread-specific value; nothing is pushed then.
     static void push(Thread_Context* context);
-    static void pop();
+    /// Goes back to the context before. Neither owns anything.
+    static void pop() noexcept;
 };
 
-/// The thread-specific value behind the stack. Exported: a second module of the same make in one process shares it.
+/// The thread-specific value behind the stack. Exported for onlookers; code in here never binds to another module's.
 extern "C" {
-extern pthread_key_t _thread_context_key;
-extern pthread_once_t _thread_context_key_once;
+extern CIMPLE_EXPORT pthread_key_t _thread_context_key;
+extern CIMPLE_EXPORT pthread_once_t _thread_context_key_once;
 }
 
 } // namespace cimple

@@ -43,7 +43,7 @@ constexpr unsigned number_of_types = 14;
 extern const char* const type_names[number_of_types];
 
 /// The bytes that a value of each Type takes in a record (a string or datetime is one handle), by code.
-extern const uint8 type_sizes[number_of_types];
+inline constexpr uint8 type_sizes[number_of_types] = {1, 1, 1, 2, 2, 4, 4, 8, 8, 4, 8, 2, sizeof(void*), sizeof(void*)};
 
 class String;
 class Datetime;

@@ -5,30 +5,39 @@
 /// whole, also when several processes write there.
 #pragma once
 
-#include <cstdarg>
+#include <atomic>
 
-#include "runtime/Type.h"
+#include "runtime/Export.h"
 
 namespace cimple {
 
 enum Log_Level { LL_FATAL = 0, LL_ERR = 1, LL_WARN = 2, LL_INFO = 3, LL_DBG = 4 };
 
+/// The highest level that is written, -1 while the log is closed; above all levels until somebody asks.
+extern std::atomic<int> log_threshold;
+/// Opens the log, once a process. True if a message of that level would be written.
+bool log_open_and_ask(Log_Level level);
+
 /// True if a message of that level would be written. Opens the log at the first call of the process.
-bool log_wanted(Log_Level level);
+inline bool log_wanted(Log_Level level)
+{
+    return level <= log_threshold.load(std::memory_order_acquire) && log_open_and_ask(level);
+}
 
 /// Writes one line by printf rules. Never fails, leaves errno as it was.
 void log_write(Log_Level level, const char* file, int line, const char* format, ...)
     __attribute__((format(printf, 4, 5)));
 
-/// Lets the conversion layer's warnings through (on from the start) or not.
+/// Lets the conversion layer's warnings through (on from the start) or not: it asks before it logs one.
 void log_enable_warnings(bool enable);
 bool log_warnings_enabled();
 
 extern "C" {
 /// Writes "TRACE: file(line): message" to standard error.
-void __cimple_trace(const char* file, int line, const char* message);
+CIMPLE_EXPORT void __cimple_trace(const char* file, int line, const char* message);
 /// Writes "file(line): function(): assert: expression" to standard error and aborts.
-[[noreturn]] void __cimple_assert(const char* file, int line, const char* function, const char* expression);
+[[noreturn]] CIMPLE_EXPORT void __cimple_assert(const char* file, int line, const char* function,
+                                                const char* expression);
 }
 
 } // namespace cimple
