@@ -1,0 +1,54 @@
+/// The provider's settings, "/etc/norvane_fc_provider.conf": read when the agent is built, written back when it goes.
+///
+/// Any thread may read and set the values while the file is not being loaded. No fault in the file is an error: what it
+/// does not say validly keeps its default.
+#pragma once
+
+#include <string>
+
+#include "runtime/Mutex.h"
+#include "runtime/String.h"
+#include "runtime/Type.h"
+
+namespace cimple {
+
+class NvrConfigFile {
+public:
+    NvrConfigFile() = default;
+    /// Saves.
+    ~NvrConfigFile();
+    NvrConfigFile(const NvrConfigFile&) = delete;
+    NvrConfigFile& operator=(const NvrConfigFile&) = delete;
+
+    /// Stores the path and reads the file; not to be called while other threads use the object. For each key the first
+    /// valid line wins. Of the look-up of the file only `errno` is tested: a stale ENOENT ends the load.
+    void load(const char* path);
+    /// Writes the file anew at the stored path, if it can be opened.
+    void save();
+
+    /// Minutes, 1 to 30.
+    uint32 getCacheTimeout() const;
+    bool getRefreshAdapterData() const;
+    bool getRefreshSANData() const;
+
+    /// Results: 0, or -1 for a value out of range (1 to 30; 0 or 1), which changes nothing.
+    int setCacheTimeout(uint32 minutes);
+    int setRefreshAdapterData(uint32 flag);
+    int setRefreshSANData(uint32 flag);
+
+private:
+    bool m_refreshAdapterData = false;
+    bool m_refreshSANData = true;
+    uint32 m_cacheTimeout = 10;
+    String m_path;
+    mutable Mutex m_mutex{true};
+};
+
+/// The agent's settings file.
+extern const char* const provider_config_path;
+
+/// The URL of the management web launcher: the first line of "/etc/nvr_smis.conf" that is neither blank nor a comment,
+/// without its leading white space. Empty if there is none.
+std::string readWebLaunchURL();
+
+} // namespace cimple
