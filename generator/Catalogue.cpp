@@ -93,12 +93,18 @@ void Catalogue::read(const std::string& mof_folder, const std::string& catalogue
     if (providers_file.empty()) return;
     std::set<const mof::Class*> provided;
     for (const auto& row : read_list(providers_file)) {
+        if (row.size() == 2 && row[0] == "derived") {
+            derived_header = row[1];
+            continue;
+        }
         Provider provider;
         provider.target = mof.find_class(row[0]);
         if (!provider.target) throw Error(providers_file + ": no MOF file declares \"" + row[0] + "\"");
         if (!provided.insert(provider.target).second)
             throw Error(providers_file + ": \"" + row[0] + "\" is listed twice");
         if (row.size() == 2 && (row[1] == "plain" || row[1] == "san")) {
+            if (derived_header.empty())
+                throw Error(providers_file + ": say \"derived HEADER\" before the first of them");
             provider.kind = row[1] == "san" ? Provider_Kind::san : Provider_Kind::plain;
         } else if (row.size() == 3 && row[1] == "own") {
             provider.kind = Provider_Kind::own;

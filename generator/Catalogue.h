@@ -29,6 +29,7 @@ struct Catalogue {
     mof::Repository mof;
     std::vector<const mof::Class*> classes; ///< in repository order
     std::vector<Provider> providers;        ///< in order of registration
+    std::string derived_header;             ///< declares Derived_Provider, from the repository's root
 
     /// Reads the MOF folder and the two lists ("" for no providers). Throws Error: MOF that does not parse, a list that
     /// names an unknown class or one twice, a class that the list leaves out, an unknown kind of provider.

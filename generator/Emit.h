@@ -18,4 +18,11 @@ std::string emit_methods_header(const mof::Class& target);
 std::string emit_repository_header(const Catalogue& catalogue);
 std::string emit_records(const Catalogue& catalogue);
 
+/// One unit with the procs, tables and factories of the providers from `first` to before `last`.
+std::string emit_providers(const Catalogue& catalogue, std::size_t first, std::size_t last);
+/// The registration records, the list and `cimple_module`.
+std::string emit_registrations(const Catalogue& catalogue);
+/// The linker's version script: what the module exports.
+std::string emit_exports(const Catalogue& catalogue);
+
 } // namespace generator

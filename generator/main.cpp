@@ -3,11 +3,14 @@
 ///     norvane_generator classes MOF_FOLDER CATALOGUE PROVIDERS OUTPUT_FOLDER
 ///         writes classes/<Class>.h for every class, classes/<Class>_Methods.h for every class that has a provider,
 ///         classes/repository.h and records.cpp
+///     norvane_generator table MOF_FOLDER CATALOGUE PROVIDERS OUTPUT_FOLDER UNITS
+///         writes providers_<n>.cpp for n from 1 to UNITS, registrations.cpp and exports.map
 ///
 /// Exit status 0, or 1 with the reason on standard error.
 #include "generator/Emit.h"
 #include "generator/Output.h"
 
+#include <cstdlib>
 #include <iostream>
 
 namespace {
@@ -24,9 +27,20 @@ void write_classes(const generator::Catalogue& catalogue, const std::string& fol
     generator::write_file(folder + "/records.cpp", generator::emit_records(catalogue));
 }
 
+void write_table(const generator::Catalogue& catalogue, const std::string& folder, std::size_t units)
+{
+    const std::size_t count = catalogue.providers.size();
+    for (std::size_t unit = 0; unit < units; ++unit)
+        generator::write_file(folder + "/providers_" + std::to_string(unit + 1) + ".cpp",
+                              generator::emit_providers(catalogue, count * unit / units, count * (unit + 1) / units));
+    generator::write_file(folder + "/registrations.cpp", generator::emit_registrations(catalogue));
+    generator::write_file(folder + "/exports.map", generator::emit_exports(catalogue));
+}
+
 int usage()
 {
-    std::cerr << "usage: norvane_generator classes MOF_FOLDER CATALOGUE PROVIDERS OUTPUT_FOLDER\n";
+    std::cerr << "usage: norvane_generator classes MOF_FOLDER CATALOGUE PROVIDERS OUTPUT_FOLDER\n"
+                 "       norvane_generator table MOF_FOLDER CATALOGUE PROVIDERS OUTPUT_FOLDER UNITS\n";
     return 1;
 }
 
@@ -34,11 +48,18 @@ int usage()
 
 int main(int count, char** arguments)
 {
-    if (count != 6 || std::string(arguments[1]) != "classes") return usage();
+    const std::string what = count > 1 ? arguments[1] : "";
+    const bool is_table = what == "table" && count == 7;
+    if (!is_table && !(what == "classes" && count == 6)) return usage();
+    const unsigned long units = is_table ? std::strtoul(arguments[6], nullptr, 10) : 1;
+    if (units < 1 || units > 64) return usage();
     try {
         generator::Catalogue catalogue;
         catalogue.read(arguments[2], arguments[3], arguments[4]);
-        write_classes(catalogue, arguments[5]);
+        if (is_table)
+            write_table(catalogue, arguments[5], units);
+        else
+            write_classes(catalogue, arguments[5]);
     } catch (const std::exception& error) {
         std::cerr << error.what() << '\n';
         return 1;
