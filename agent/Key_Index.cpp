@@ -1,0 +1,161 @@
+#include "agent/Key_Index.h"
+
+#include <algorithm>
+#include <cstring>
+
+namespace cimple {
+
+namespace {
+
+constexpr std::size_t first_slots = 16;
+
+void mix(uint64& value, uint64 word)
+{
+    value = (value ^ word) * 0x9E3779B97F4A7C15u;
+    value ^= value >> 29;
+}
+
+void mix_text(uint64& value, const String& text)
+{
+    const char* bytes = text.c_str();
+    std::size_t left = text.size();
+    mix(value, left);
+    for (; left >= 8; left -= 8, bytes += 8) {
+        uint64 word;
+        std::memcpy(&word, bytes, 8);
+        mix(value, word);
+    }
+    uint64 tail = 0;
+    std::memcpy(&tail, bytes, left);
+    mix(value, tail);
+}
+
+/// Values that can be equal without the same bytes (reals, times) and arrays add nothing: key_eq decides there.
+void mix_property(uint64& value, const Instance* instance, const Meta_Property* property)
+{
+    mix(value, null_of(instance, property));
+    if (property->subscript != 0) return;
+    const void* place = feature_at(instance, property->offset);
+    switch (property->type) {
+    case STRING:
+        mix_text(value, *static_cast<const String*>(place));
+        break;
+    case REAL32:
+    case REAL64:
+    case DATETIME:
+        break;
+    default: {
+        uint64 word = 0;
+        std::memcpy(&word, place, type_sizes[property->type]);
+        mix(value, word);
+    }
+    }
+}
+
+/// Calls `visit` with each key feature that key_eq looks at; stops when it answers false.
+template <class Visit>
+bool for_each_key(const Meta_Class* meta_class, Visit visit)
+{
+    for (std::size_t i = 0; i < meta_class->num_meta_features; i++) {
+        const Meta_Feature* feature = meta_class->meta_features[i];
+        if (!is_key(feature)) continue;
+        if (is_reference(feature) && as_reference(feature)->subscript != 0) continue;
+        if (!visit(feature)) return false;
+    }
+    return true;
+}
+
+} // namespace
+
+bool Key_Index::walk(const Instance* instance, std::size_t& depth, uint64& value) const
+{
+    const Meta_Class* meta_class = instance ? instance->meta_class : nullptr;
+    if (depth == m_shape.size() || m_shape[depth] != meta_class) return false;
+    depth++;
+    if (!instance) return true;
+    return for_each_key(meta_class, [&](const Meta_Feature* feature) {
+        if (is_reference(feature)) return walk(reference_of(instance, as_reference(feature)), depth, value);
+        if (is_property(feature)) mix_property(value, instance, as_property(feature));
+        return true;
+    });
+}
+
+bool Key_Index::hash(const Instance* instance, uint64& value) const
+{
+    std::size_t depth = 0;
+    value = 0;
+    return walk(instance, depth, value);
+}
+
+void Key_Index::learn_shape(const Instance* instance)
+{
+    m_shape.push_back(instance ? instance->meta_class : nullptr);
+    if (!instance) return;
+    for_each_key(instance->meta_class, [&](const Meta_Feature* feature) {
+        if (is_reference(feature)) learn_shape(reference_of(instance, as_reference(feature)));
+        return true;
+    });
+}
+
+void Key_Index::append(const Array<Instance*>& list)
+{
+    const std::size_t position = list.size() - 1;
+    if (m_shape.empty()) learn_shape(list[position]);
+    Entry entry{0, false};
+    entry.strange = !hash(list[position], entry.hash);
+    std::vector<uint32> wider;
+    const bool grow = m_slots.size() < 2 * list.size();
+    if (grow) wider.resize(m_slots.empty() ? first_slots : 2 * m_slots.size());
+    m_entries.push_back(entry);
+    m_strangers += entry.strange;
+    if (grow) {
+        m_slots.swap(wider);
+        place_all();
+    } else if (!entry.strange)
+        place(position);
+}
+
+void Key_Index::place(std::size_t position)
+{
+    std::size_t slot = m_entries[position].hash & (m_slots.size() - 1);
+    while (m_slots[slot] != 0)
+        slot = (slot + 1) & (m_slots.size() - 1);
+    m_slots[slot] = static_cast<uint32>(position + 1);
+}
+
+void Key_Index::place_all()
+{
+    std::fill(m_slots.begin(), m_slots.end(), 0u);
+    for (std::size_t i = 0; i < m_entries.size(); i++)
+        if (!m_entries[i].strange) place(i);
+}
+
+void Key_Index::remove(std::size_t position)
+{
+    m_strangers -= m_entries[position].strange;
+    m_entries.erase(m_entries.begin() + static_cast<std::ptrdiff_t>(position));
+    place_all();
+}
+
+void Key_Index::clear()
+{
+    *this = Key_Index();
+}
+
+int Key_Index::find(const Instance* key, const Array<Instance*>& list) const
+{
+    uint64 value;
+    if (m_strangers != 0 || !hash(key, value)) {
+        for (std::size_t i = 0; i < list.size(); i++)
+            if (key_eq(key, list[i])) return static_cast<int>(i);
+        return -1;
+    }
+    for (std::size_t slot = value & (m_slots.size() - 1); m_slots[slot] != 0;
+         slot = (slot + 1) & (m_slots.size() - 1)) {
+        const std::size_t i = m_slots[slot] - 1;
+        if (m_entries[i].hash == value && key_eq(key, list[i])) return static_cast<int>(i);
+    }
+    return -1;
+}
+
+} // namespace cimple

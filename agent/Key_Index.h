@@ -1,0 +1,44 @@
+/// A hash index over the keys of a list of instances, beside the list that owns them.
+///
+/// key_eq is not symmetric across classes, so the index answers only where it can be exact: for a key and elements of
+/// one shape (the same classes in the instance and in all that its key references reach). A list that holds an
+/// instance of another shape, or is asked for one, is scanned. No locks: the owner of the list sees to that.
+#pragma once
+
+#include <cstddef>
+#include <vector>
+
+#include "runtime/Instance.h"
+
+namespace cimple {
+
+class Key_Index {
+public:
+    /// Notes the element that has just been appended to `list`. An exception leaves the index as it was.
+    void append(const Array<Instance*>& list);
+    /// Notes that the element at `position` has left the list.
+    void remove(std::size_t position);
+    void clear();
+
+    /// The position of the first element of `list` whose keys agree with `key`'s, or -1.
+    int find(const Instance* key, const Array<Instance*>& list) const;
+
+private:
+    /// The hash of an instance of this index's shape; false for another shape.
+    bool hash(const Instance* instance, uint64& value) const;
+    bool walk(const Instance* instance, std::size_t& depth, uint64& value) const;
+    void learn_shape(const Instance* instance);
+    void place(std::size_t position);
+    void place_all();
+
+    struct Entry {
+        uint64 hash;
+        bool strange; // of another shape, not in the slots
+    };
+    std::vector<const Meta_Class*> m_shape; // in walking order; of the first element
+    std::vector<Entry> m_entries;           // one an element
+    std::size_t m_strangers = 0;
+    std::vector<uint32> m_slots; // open addressing: position + 1, or 0; a power of two, at most half full
+};
+
+} // namespace cimple

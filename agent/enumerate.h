@@ -1,0 +1,30 @@
+/// The three ways to enumerate a map: copy it under the agent's locks, let go of them, hand the copies out.
+///
+/// The handler owns each instance it gets, and runs with no lock held. A copy that is refused ends the enumeration with
+/// a line in the log and nothing handed out. Nothing is thrown: an exception ends the enumeration with a line.
+#pragma once
+
+#include "agent/ProviderAgent.h"
+#include "runtime/Immortal.h"
+
+namespace cimple {
+
+/// For the classes of the adapter side.
+void enumeratePlain(ProviderAgent& agent, const Instance_Map& source, const Enum_Handler& handler);
+
+/// For the classes that the SAN phase fills: asks for that phase if they are not ready, and waits for it.
+void enumerateSAN(ProviderAgent& agent, const Instance_Map& source, const Enum_Handler& handler);
+
+/// For classes with live values: `refresh` writes them into the source map first, under `refresh_mutex`.
+void enumerateActive(ProviderAgent& agent, const Instance_Map& source, const Enum_Handler& handler,
+                     void (ProviderAgent::*refresh)(), Mutex& refresh_mutex);
+
+/// The same with a mutex of its own for each refresh.
+template <void (ProviderAgent::*refresh)()>
+void enumerateActive(ProviderAgent& agent, const Instance_Map& source, const Enum_Handler& handler)
+{
+    static Immortal<Mutex> refresh_mutex(true);
+    enumerateActive(agent, source, handler, refresh, *refresh_mutex);
+}
+
+} // namespace cimple

@@ -1,0 +1,17 @@
+#include "diagnostics/NVRHBA_HelpService_Provider.h"
+
+#include "agent/enumerate.h"
+#include "foundation/CLogger.h"
+
+namespace cimple {
+
+Enum_Instances_Status NVRHBA_HelpService_Provider::enum_instances(const NVRHBA_HelpService*,
+                                                                  const Enum_Handler& handler)
+{
+    ProviderAgent& agent = *ProviderAgent::GetInstance();
+    enumeratePlain(agent, agent.m_NVRHBA_HelpService_map, handler);
+    NVR_LOG("NVRHBA_HelpService_Provider::enum_instances()");
+    return ENUM_INSTANCES_OK;
+}
+
+} // namespace cimple

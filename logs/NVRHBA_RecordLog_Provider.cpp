@@ -1,0 +1,16 @@
+#include "logs/NVRHBA_RecordLog_Provider.h"
+
+#include "agent/enumerate.h"
+#include "foundation/CLogger.h"
+
+namespace cimple {
+
+Enum_Instances_Status NVRHBA_RecordLog_Provider::enum_instances(const NVRHBA_RecordLog*, const Enum_Handler& handler)
+{
+    ProviderAgent& agent = *ProviderAgent::GetInstance();
+    enumeratePlain(agent, agent.m_NVRHBA_RecordLog_map, handler);
+    NVR_LOG("NVRHBA_RecordLog_Provider::enum_instances()");
+    return ENUM_INSTANCES_OK;
+}
+
+} // namespace cimple

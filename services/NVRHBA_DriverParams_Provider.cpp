@@ -1,0 +1,21 @@
+#include "services/NVRHBA_DriverParams_Provider.h"
+
+#include "agent/enumerate.h"
+#include "foundation/CLogger.h"
+
+namespace cimple {
+
+Enum_Instances_Status NVRHBA_DriverParams_Provider::enum_instances(const NVRHBA_DriverParams*,
+                                                                   const Enum_Handler& handler)
+{
+    ProviderAgent& agent = *ProviderAgent::GetInstance();
+    if (!agent.m_bLoaded) {
+        NVR_LOG("RM Init failed for %s", __FILE__);
+        return ENUM_INSTANCES_OK;
+    }
+    enumerateActive<&ProviderAgent::UpdateDriverParams>(agent, agent.m_NVRHBA_DriverParams_map, handler);
+    NVR_LOG("NVRHBA_DriverParams_Provider::enum_instances()");
+    return ENUM_INSTANCES_OK;
+}
+
+} // namespace cimple

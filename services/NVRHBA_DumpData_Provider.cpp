@@ -1,0 +1,16 @@
+#include "services/NVRHBA_DumpData_Provider.h"
+
+#include "agent/enumerate.h"
+#include "foundation/CLogger.h"
+
+namespace cimple {
+
+Enum_Instances_Status NVRHBA_DumpData_Provider::enum_instances(const NVRHBA_DumpData*, const Enum_Handler& handler)
+{
+    ProviderAgent& agent = *ProviderAgent::GetInstance();
+    enumeratePlain(agent, agent.m_NVRHBA_DumpData_map, handler);
+    NVR_LOG("NVRHBA_DumpData_Provider::enum_instances()");
+    return ENUM_INSTANCES_OK;
+}
+
+} // namespace cimple
