@@ -42,7 +42,7 @@ void String::free_rep(Rep* rep) noexcept
     ::operator delete(rep);
 }
 
-// Fills `rep`, fresh and unshared, before the old rep goes: `text` may lie in it.
+// Fills `rep`, fresh and unshared, before the old rep goes: `text` may lie in that.
 void String::adopt(Rep* rep, const char* text, std::size_t size) noexcept
 {
     if (size) std::memcpy(bytes(rep), text, size);
@@ -98,10 +98,12 @@ void String::append(const char* text, std::size_t size)
         return;
     }
     Rep* rep = new_rep(old_size + size);
-    std::memcpy(bytes(rep) + old_size, text, size);
-    adopt(rep, bytes(m_rep), old_size);
-    m_rep->size = old_size + size;
-    bytes(m_rep)[old_size + size] = '\0';
+    std::memcpy(bytes(rep), bytes(m_rep), old_size);
+    std::memcpy(bytes(rep) + old_size, text, size); // may lie in the old rep
+    bytes(rep)[old_size + size] = '\0';
+    rep->size = old_size + size;
+    release(m_rep);
+    m_rep = rep;
 }
 
 void String::append(const char* text)
