@@ -1,5 +1,6 @@
 // Records and structures of the sample classes, as compiled code.
 #include "classes/Sample_Alert.h"
+#include "classes/Sample_Base.h"
 #include "classes/Sample_Derived.h"
 #include "classes/Sample_Link.h"
 #include "classes/Sample_Narrow_Link.h"
