@@ -32,12 +32,6 @@
 
 namespace host {
 
-class Broker;
-class Dispatcher;
-class Indications;
-class Modules;
-class Server_Log;
-
 /// A CMPI return code and its text; 0 is success.
 struct Status {
     int code = 0;
@@ -88,8 +82,6 @@ struct Host_Options {
     std::string principal;
     /// File that gets one line for each thing done with a module ("-" for standard error); empty: none.
     std::string log_file;
-    /// Directories for resolveFileName of modules, and for `add_module` of bare names.
-    std::vector<std::string> provider_directories;
 };
 
 /// An indication as it was delivered.
@@ -194,13 +186,8 @@ public:
     void on_request_thread(const std::function<void(const CMPIBroker*, const CMPIContext*)>& body);
 
 private:
-    std::shared_ptr<const Schema> m_schema;
-    Host_Options m_options;
-    std::unique_ptr<Server_Log> m_log;
-    std::unique_ptr<Broker> m_broker;
-    std::unique_ptr<Modules> m_modules;
-    std::unique_ptr<Indications> m_indications;
-    std::unique_ptr<Dispatcher> m_dispatcher;
+    struct Parts;
+    std::unique_ptr<Parts> m_parts;
 };
 
 } // namespace host

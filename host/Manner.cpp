@@ -26,7 +26,6 @@ constexpr Manner make_sfcb()
     m.object_version = 1;
     m.origin_and_error_absent = true;
     m.property_qualifier_absent = false;
-    m.other_qualifiers_absent = true;
     m.result_life_absent = false;
     m.wait_timed_out = 110;
     m.principal_has_null_chars = true;
@@ -44,6 +43,7 @@ constexpr Manner make_sfcb()
     m.host_name_in_paths = false;
     m.nobody_subscribed = 0;
     m.asks_before_activation = true;
+    m.enables_each_time = true;
     m.activation_flags_always = false;
     m.disable = Manner::Disable::never;
     return m;
@@ -80,7 +80,6 @@ constexpr Manner make_pegasus()
     m.object_version = 200;
     m.origin_and_error_absent = false;
     m.property_qualifier_absent = true;
-    m.other_qualifiers_absent = true;
     m.result_life_absent = true;
     m.wait_timed_out = 0;
     m.principal_has_null_chars = false;
@@ -98,6 +97,7 @@ constexpr Manner make_pegasus()
     m.host_name_in_paths = true;
     m.nobody_subscribed = 1;
     m.asks_before_activation = false;
+    m.enables_each_time = false;
     m.activation_flags_always = true;
     m.disable = Manner::Disable::after_last_deactivate;
     return m;
@@ -128,6 +128,7 @@ constexpr Manner make_strict()
     m.association_class_filled = false;
     m.host_name_in_paths = false;
     m.asks_before_activation = true;
+    m.enables_each_time = true;
     m.activation_flags_always = false;
     return m;
 }

@@ -38,7 +38,6 @@ struct Manner {
     int object_version;
     bool origin_and_error_absent; ///< setPropertyWithOrigin and returnError are null
     bool property_qualifier_absent;
-    bool other_qualifiers_absent;
     bool result_life_absent; ///< release and clone of results, clone of contexts are null
     int wait_timed_out;      ///< what a timed wait of xft that ran out answers
 
@@ -62,6 +61,7 @@ struct Manner {
 
     // Indications.
     bool asks_before_activation;  ///< authorizeFilter and mustPoll are called, and enabling runs on another thread
+    bool enables_each_time;       ///< enableIndications comes with every subscription, else with a provider's first
     bool activation_flags_always; ///< first and last activation are always 1
     Disable disable;
 

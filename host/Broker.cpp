@@ -1,0 +1,189 @@
+#include "host/Broker.h"
+
+#include "host/objects/ArgsObject.h"
+#include "host/objects/ArrayObject.h"
+#include "host/objects/DateTimeObject.h"
+#include "host/objects/EnumerationObject.h"
+#include "host/objects/ErrorObject.h"
+#include "host/objects/InstanceObject.h"
+#include "host/objects/PathObject.h"
+#include "host/objects/ResultObject.h"
+#include "host/objects/SelectExpObject.h"
+
+#include <algorithm>
+#include <unistd.h>
+
+namespace host {
+namespace {
+
+constexpr std::size_t most_retired = 256;
+
+std::string own_host_name()
+{
+    char name[256] = "";
+    if (gethostname(name, sizeof name - 1) != 0 || !*name) return "localhost";
+    return name;
+}
+
+} // namespace
+
+Broker::Broker(const Schema& schema, const Manner& manner, Server_Log& log)
+    : m_schema(schema), m_manner(manner), m_log(log), m_host_name(own_host_name()),
+      m_orphans(*this, Scope::Sort::orphans, "unknown threads"), m_explicit(*this, Scope::Sort::explicit_life, "clones")
+{
+    fill_object_tables();
+    fill_up_calls(m_bft, manner);
+    fill_encapsulation(m_eft, manner);
+    fill_threads(m_xft, manner);
+    m_face = {this, &m_bft, &m_eft, &m_xft, memory_table(manner)};
+}
+
+Broker::~Broker()
+{
+    for (Object* object : m_retired)
+        delete object;
+    for (Scope* scope : m_attached)
+        delete scope;
+}
+
+void Broker::connect(Request_Runner* requests, Indication_Taker* indications)
+{
+    m_requests = requests;
+    m_indications = indications;
+}
+
+void Broker::fill_object_tables()
+{
+    m_tables.instance = Instance_Object::table(m_manner);
+    m_tables.path = Path_Object::table(m_manner);
+    m_tables.args = Args_Object::table(m_manner);
+    m_tables.string = String_Object::table(m_manner);
+    m_tables.array = Array_Object::table(m_manner);
+    m_tables.datetime = Date_Time_Object::table(m_manner);
+    m_tables.enumeration = Enumeration_Object::table(m_manner);
+    m_tables.result = Result_Object::table(m_manner);
+    m_tables.context = Context_Object::table(m_manner);
+    m_tables.select_exp = Select_Exp_Object::table(m_manner);
+    m_tables.error = Error_Object::table(m_manner);
+}
+
+void Broker::adopt(Object& object)
+{
+    m_ledger.created(object.kind, object.origin);
+    if (object.origin == Origin::cloned) {
+        m_explicit.add(object);
+        return;
+    }
+    Scope* scope = Scope::current(*this);
+    if (!scope) {
+        violation(std::string(kind_name(object.kind)) + " made on a thread that has no request and is not attached");
+        scope = &m_orphans;
+    }
+    scope->add(object);
+}
+
+CMPIString* Broker::make_string(Origin origin, const std::string& text)
+{
+    return &make<String_Object>(origin, text)->face;
+}
+
+CMPIContext* Broker::make_request_context(const std::string& principal, const std::string& name_space)
+{
+    std::vector<Context_Object::Entry> entries;
+    entries.push_back({CMPIInvocationFlags, Value::uint32(0), false});
+    entries.push_back(
+        {CMPIPrincipal, Value::string(principal), principal.empty() && m_manner.principal_has_null_chars});
+    if (m_manner.language_entries) {
+        entries.push_back({CMPIInitNameSpace, Value::string(name_space), false});
+        entries.push_back({CMPIRole, Value::string(""), false});
+        entries.push_back({CMPIAcceptLanguage, Value::string("en"), false});
+    }
+    if (m_manner.session_entry) entries.push_back({"CMPISessionId", Value::uint32(1), false});
+    return &make<Context_Object>(Origin::lent, std::move(entries))->face;
+}
+
+CMPIContext* Broker::make_factory_context()
+{
+    std::vector<Context_Object::Entry> entries;
+    if (m_manner.factory_context_filled) {
+        entries.push_back({CMPIInvocationFlags, Value::uint32(0), false});
+        entries.push_back({CMPIPrincipal, Value::string("$$"), false});
+    }
+    return &make<Context_Object>(Origin::lent, std::move(entries))->face;
+}
+
+CMPIContext* Broker::prepare_context(const Context_Object& source)
+{
+    auto* context = new Context_Object(*this, Origin::made, source.entries);
+    context->prepared = true;
+    m_ledger.created(Object_Kind::context, Origin::made);
+    m_ledger.context_prepared(1);
+    m_explicit.add(*context);
+    return &context->face;
+}
+
+int Broker::attach(const CMPIContext* context)
+{
+    auto* object = unwrap<Context_Object>(context);
+    if (!object) return CMPI_RC_ERR_INVALID_HANDLE;
+    if (!object->prepared) violation("attachThread with a context that prepareAttachThread did not make");
+    if (Scope::current(*this)) violation("attachThread on a thread that has a request or is attached");
+    auto* scope = new Scope(*this, Scope::Sort::attached, "attached thread");
+    scope->context = context;
+    scope->enter();
+    std::lock_guard lock(m_mutex);
+    m_attached.push_back(scope);
+    return CMPI_RC_OK;
+}
+
+int Broker::detach(const CMPIContext* context)
+{
+    auto* object = unwrap<Context_Object>(context);
+    if (!object) return CMPI_RC_ERR_INVALID_HANDLE;
+    Scope* scope = Scope::current(*this);
+    if (!scope || scope->sort() != Scope::Sort::attached || scope->context != context) {
+        violation("detachThread on a thread that is not attached with this context");
+        return CMPI_RC_ERR_INVALID_PARAMETER;
+    }
+    {
+        std::lock_guard lock(m_mutex);
+        m_attached.erase(std::find(m_attached.begin(), m_attached.end(), scope));
+    }
+    scope->leave();
+    delete scope;
+    if (object->prepared) {
+        m_ledger.context_prepared(-1);
+        release_object(context->hdl, Object_Kind::context);
+    }
+    return CMPI_RC_OK;
+}
+
+void Broker::retire(Object& object)
+{
+    object.scope->remove(object);
+    m_ledger.released(object.kind, object.origin);
+    object.magic = Object::dead;
+    Object* oldest = nullptr;
+    {
+        std::lock_guard lock(m_mutex);
+        m_retired.push_back(&object);
+        if (m_retired.size() > most_retired) {
+            oldest = m_retired.front();
+            m_retired.pop_front();
+        }
+    }
+    delete oldest;
+}
+
+void Broker::violation(const std::string& text)
+{
+    m_ledger.violation(text);
+    m_log.line("broken rule: %s", text.c_str());
+}
+
+void Broker::expect_known_thread(const char* call)
+{
+    if (!Scope::current(*this)) violation(std::string(call) + " on a thread that has no request and is not attached");
+}
+
+} // namespace host

@@ -1,0 +1,92 @@
+#include "host/Scope.h"
+
+#include "host/Broker.h"
+
+namespace host {
+namespace {
+thread_local Scope* innermost = nullptr;
+}
+
+Scope::Scope(Broker& broker, Sort sort, std::string what) : m_broker(broker), m_sort(sort), m_what(std::move(what)) {}
+
+Scope::~Scope()
+{
+    while (Object* object = m_first) {
+        m_first = object->next;
+        bool held =
+            m_sort == Sort::attached && object->kind == Object_Kind::enumeration && object->origin == Origin::made;
+        if (held) m_broker.violation(m_what + ": an enumeration of an up-call is still held at the detach");
+        m_broker.ledger().settled(object->kind, object->origin);
+        delete object;
+    }
+}
+
+void Scope::enter()
+{
+    m_outer = innermost;
+    innermost = this;
+}
+
+void Scope::leave()
+{
+    // An attachment that ended out of order is somewhere below the innermost.
+    for (Scope** link = &innermost; *link; link = &(*link)->m_outer)
+        if (*link == this) {
+            *link = m_outer;
+            return;
+        }
+}
+
+Scope* Scope::current(const Broker& broker)
+{
+    for (Scope* scope = innermost; scope; scope = scope->m_outer)
+        if (&scope->m_broker == &broker) return scope;
+    return nullptr;
+}
+
+void Scope::add(Object& object)
+{
+    std::lock_guard lock(m_mutex);
+    object.scope = this;
+    object.serial = ++m_last_serial;
+    object.next = m_first;
+    object.previous = nullptr;
+    if (m_first) m_first->previous = &object;
+    m_first = &object;
+}
+
+void Scope::remove(Object& object)
+{
+    std::lock_guard lock(m_mutex);
+    if (object.previous)
+        object.previous->next = object.next;
+    else
+        m_first = object.next;
+    if (object.next) object.next->previous = object.previous;
+    object.previous = object.next = nullptr;
+    object.scope = nullptr;
+}
+
+std::uint64_t Scope::mark() const
+{
+    std::lock_guard lock(m_mutex);
+    return m_last_serial;
+}
+
+void Scope::release_since(std::uint64_t mark)
+{
+    for (;;) {
+        Object* object = nullptr;
+        {
+            // The list runs from the newest to the oldest.
+            std::lock_guard lock(m_mutex);
+            object = m_first;
+            while (object && object->serial > mark && object->origin == Origin::lent)
+                object = object->next;
+        }
+        if (!object || object->serial <= mark) return;
+        release_object(object, object->kind);
+    }
+}
+
+} // namespace host
