@@ -1,8 +1,8 @@
 /// What stands behind the CMPI calls of one provider: its MI tables, its provider object, its lock, its life.
 ///
 /// An MI_Table_Set is the static record of a provider, valid when all zero: it finds the adapter for calls that come
-/// through `hdl`. The adapter lives from the first factory call to the last clean-up, and on until no call runs in it and
-/// no thread context made from it is left. Any thread; `lock` makes one request after the other, `mutex` of the set
+/// through `hdl`. The adapter lives from the first factory call to the last clean-up, and on until no call runs in it
+/// and no thread context made from it is left. Any thread; `lock` makes one request after the other, `mutex` of the set
 /// guards what factories and clean-ups share.
 #pragma once
 
@@ -10,6 +10,8 @@
 
 #include <atomic>
 #include <pthread.h>
+#include <type_traits>
+#include <utility>
 
 #include "cmpi/Filter_Record.h"
 #include "runtime/Mutex.h"
@@ -62,12 +64,14 @@ public:
     /// Guards `filters` alone, and nothing else is taken under it.
     Mutex filters_lock;
 
-    /// Creates the provider and loads it, with a thread context in place. Called with the set's mutex held. What is
-    /// thrown leaves no provider behind.
-    CMPI_Adapter(MI_Table_Set* tables, const Registration* registration, const CMPIBroker* broker,
-                 const CMPIContext* context, const char* provider_name, int found_errno);
+    /// Creates the provider.
+    CMPI_Adapter(MI_Table_Set* tables, const Registration* registration, const CMPIBroker* broker);
     CMPI_Adapter(const CMPI_Adapter&) = delete;
     CMPI_Adapter& operator=(const CMPI_Adapter&) = delete;
+
+    /// Enters the tables and loads the provider, with a thread context in place and `errno` as `found_errno`. Called
+    /// once, with the set's mutex held.
+    void start(const CMPIContext* context, const char* provider_name, int found_errno);
 
     /// The provider's procedure; missing arguments are 0.
     template <class... Args>
@@ -91,7 +95,7 @@ private:
     ~CMPI_Adapter();
 
     template <class T>
-    static void* word(T* pointer)
+    static void* word(T* pointer) // an argument of the procedure
     {
         if constexpr (std::is_function_v<T>)
             return reinterpret_cast<void*>(pointer);
@@ -102,9 +106,10 @@ private:
     std::atomic<uint32> m_users;
 };
 
-/// The adapter of a table set for the length of one call, or none.
+/// One count of an adapter: of a table set's for the length of a call, or none.
 class Adapter_Use {
 public:
+    Adapter_Use() = default;
     explicit Adapter_Use(MI_Table_Set* tables);
     ~Adapter_Use() { give_back(); }
     Adapter_Use(const Adapter_Use&) = delete;
@@ -114,6 +119,9 @@ public:
     CMPI_Adapter* get() const { return m_adapter; }
     CMPI_Adapter* operator->() const { return m_adapter; }
     CMPI_Adapter& operator*() const { return *m_adapter; }
+    /// Takes over a count, resp. hands it over.
+    void adopt(CMPI_Adapter* adapter) { m_adapter = adapter; }
+    CMPI_Adapter* release() { return std::exchange(m_adapter, nullptr); }
     void give_back();
 
 private:

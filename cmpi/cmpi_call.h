@@ -1,13 +1,15 @@
 /// Calls of CMPI slots that survive a server which left them out.
 ///
-/// Servers in the field leave slots and whole tables null, so that the bridge never calls one directly: `ask` and `tell`
-/// look at the object, its table and the slot first, and answer as a call that failed would. No locks; an object is used
-/// on the thread that the server gave it to.
+/// Servers in the field leave slots and whole tables null, so that the bridge never calls one directly: `ask` and
+/// `tell` look at the object, its table and the slot first, and answer as a call that failed would. No locks; an object
+/// is used on the thread that the server gave it to.
 #pragma once
 
 #include <cmpift.h>
 
 #include <memory>
+#include <type_traits>
+#include <utility>
 
 namespace cimple {
 
@@ -36,19 +38,14 @@ Function slot_of(Object* object, Function Table::*slot)
 }
 
 /// A call that reports through a status argument, which is added here: `ask(status, path, &CMPIObjectPathFT::getKey,
-/// name)`. With an absent slot, or a null pointer for a result, `status` tells a failure and the result is zero.
+/// name)`. With an absent slot `status` tells a failure and the result is zero. Brokers may answer a null pointer with
+/// an OK, so look at both.
 template <class Object, class Table, class Function, class... Args>
 auto ask(CMPIStatus& status, Object* object, Function Table::*slot, Args... args)
 {
     using Result = decltype((*std::declval<Function>())(object, args..., &status));
     status = {CMPI_RC_OK, nullptr};
-    if (Function function = slot_of(object, slot)) {
-        Result result = function(object, args..., &status);
-        if constexpr (std::is_pointer_v<Result>) {
-            if (!result && status.rc == CMPI_RC_OK) status.rc = CMPI_RC_ERR_FAILED;
-        }
-        return result;
-    }
+    if (Function function = slot_of(object, slot)) return function(object, args..., &status);
     status.rc = CMPI_RC_ERR_FAILED;
     return Result{};
 }

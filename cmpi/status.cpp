@@ -76,7 +76,6 @@ constexpr Status_Row invoke_method_rows[] = {
 constexpr Status_Row enable_indications_rows[] = {{ENABLE_INDICATIONS_FAILED, CMPI_RC_ERR_FAILED}};
 constexpr Status_Row disable_indications_rows[] = {{DISABLE_INDICATIONS_FAILED, CMPI_RC_ERR_FAILED}};
 constexpr Status_Row enum_associators_rows[] = {
-    {ENUM_ASSOCIATORS_OK, CMPI_RC_OK},
     {ENUM_ASSOCIATORS_FAILED, CMPI_RC_ERR_FAILED},
     {ENUM_ASSOCIATORS_ACCESS_DENIED, CMPI_RC_ERR_ACCESS_DENIED},
 };

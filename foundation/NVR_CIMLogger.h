@@ -16,7 +16,7 @@ struct NVR_CIMLogEntry {
     char text[200] = {}; ///< the message in square brackets, cut to the field
 };
 
-class NVR_CIMLogger : public NVR_LoggerInterface {
+class NVR_CIMLogger final : public NVR_LoggerInterface {
 public:
     NVR_CIMLogger();
     ~NVR_CIMLogger() override;

@@ -11,7 +11,7 @@
 
 namespace cimple {
 
-class NVR_FileLogger : public NVR_LoggerInterface {
+class NVR_FileLogger final : public NVR_LoggerInterface {
 public:
     NVR_FileLogger();
     ~NVR_FileLogger() override;

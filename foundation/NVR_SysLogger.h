@@ -8,7 +8,7 @@
 
 namespace cimple {
 
-class NVR_SysLogger : public NVR_LoggerInterface {
+class NVR_SysLogger final : public NVR_LoggerInterface {
 public:
     NVR_SysLogger();
     ~NVR_SysLogger() override;

@@ -7,13 +7,21 @@
 #include <iterator>
 
 namespace generator {
+namespace {
+
+bool holds(const std::string& path, const std::string& text)
+{
+    std::error_code error;
+    if (!std::filesystem::is_regular_file(path, error)) return false;
+    std::ifstream stream(path, std::ios::binary);
+    return std::string((std::istreambuf_iterator<char>(stream)), std::istreambuf_iterator<char>()) == text;
+}
+
+} // namespace
 
 void write_file(const std::string& path, const std::string& text)
 {
-    {
-        std::ifstream old(path, std::ios::binary);
-        if (old && std::string((std::istreambuf_iterator<char>(old)), std::istreambuf_iterator<char>()) == text) return;
-    }
+    if (holds(path, text)) return;
     std::error_code error;
     std::filesystem::create_directories(std::filesystem::path(path).parent_path(), error);
     std::ofstream stream(path, std::ios::binary | std::ios::trunc);

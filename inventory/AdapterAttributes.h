@@ -3,6 +3,7 @@
 
 #include <string>
 
+#include "foundation/management_api.h"
 #include "runtime/Type.h"
 
 namespace cimple {
@@ -69,7 +70,9 @@ public:
 
 private:
     std::string readRecords(const Adapter& adapter);
+    void takeRecord(const HBA_ADAPTERATTRIBUTES& record);
     void readBlock(const std::string& wwpn);
+    void readDriverType(const HBA_WWN& wwn);
 };
 
 class AdapterStatistics {

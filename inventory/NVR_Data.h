@@ -41,6 +41,7 @@ public:
 
 private:
     void buildAdapter(uint32 index);
+    void leaveOutAdapter();
 
     std::vector<Adapter*> m_adapters;
     std::vector<Port*> m_ports;

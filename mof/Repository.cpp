@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
 #include <utility>
 
 namespace mof {
@@ -72,9 +71,9 @@ bool Repository::read_file_at_depth(const std::string& path, unsigned depth, con
         return false;
     }
     if (!files_read_.emplace(canonical.string(), true).second) return true;
+    std::string text(static_cast<std::size_t>(size), '\0');
     std::ifstream stream(canonical, std::ios::binary);
-    const std::string text((std::istreambuf_iterator<char>(stream)), std::istreambuf_iterator<char>());
-    if (!stream.good() && !stream.eof()) {
+    if (!text.empty() && !stream.read(text.data(), static_cast<std::streamsize>(text.size()))) {
         add_fault(from, "cannot read the file " + in_quotes(path));
         return false;
     }

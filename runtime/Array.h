@@ -60,7 +60,8 @@ private:
     static Rep* new_rep(const Array_Traits& traits, std::size_t capacity);
     static Rep* empty_rep(const Array_Traits& traits) noexcept;
     static void free_rep(Rep* rep) noexcept;
-    static Rep* copy_rep(const Rep& source, std::size_t capacity);
+    static bool is_shared(const Rep* rep) noexcept;
+    static Rep* copy_rep(const Rep& source, std::size_t capacity, std::size_t gap, std::size_t left_out);
     Rep* m_rep;
 };
 

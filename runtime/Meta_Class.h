@@ -119,6 +119,18 @@ const Meta_Feature* find_feature(const Meta_Record* record, const char* name, ui
 /// `super_meta_class` meets `ancestor` by pointer or by name. A null `meta_class` is a subclass of the root only.
 bool is_subclass(const Meta_Class* ancestor, const Meta_Class* meta_class);
 
+/// The features of a record, for range-based walks.
+struct Feature_Range {
+    const Meta_Feature* const* first;
+    std::size_t count;
+    const Meta_Feature* const* begin() const { return first; }
+    const Meta_Feature* const* end() const { return first + count; }
+};
+inline Feature_Range features_of(const Meta_Record* record)
+{
+    return {record->meta_features, record->num_meta_features};
+}
+
 inline bool is_property(const Meta_Feature* feature)
 {
     return feature->flags & META_FLAG_PROPERTY;

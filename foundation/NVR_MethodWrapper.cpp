@@ -1,0 +1,141 @@
+#include "foundation/NVR_MethodWrapper.h"
+
+#include <cerrno>
+#include <cstdint>
+#include <exception>
+#include <fcntl.h>
+#include <semaphore.h>
+#include <string>
+#include <unistd.h>
+
+#include "foundation/CLogger.h"
+#include "foundation/NVR_Common.h"
+#include "foundation/management_binding.h"
+#include "runtime/Immortal.h"
+#include "runtime/Mutex.h"
+
+namespace cimple {
+
+namespace {
+
+// What all instances share. The names carry the process id, so that each process guards its own copy of the library.
+struct Session {
+    Mutex mutex{false};     // guards the rest; never held while waiting for the guard
+    sem_t* guard = nullptr; // null: not open
+    int openings = 0;       // of the guard by this process, each of which needs a close
+    sem_t* done = nullptr;  // made by the initialiser, used by nobody, left behind
+    bool initialising = false;
+};
+
+Session& session()
+{
+    static Immortal<Session> session;
+    return *session;
+}
+
+std::string name_for_process(const char* prefix)
+{
+    return prefix + std::to_string(static_cast<uint32>(::getpid()));
+}
+
+std::string guard_name()
+{
+    return name_for_process("/NVR_RM_INIT_LIB_");
+}
+
+sem_t* open_guard(const std::string& name)
+{
+    sem_t* guard = ::sem_open(name.c_str(), O_CREAT, 0644, 2);
+    if (guard == SEM_FAILED) return nullptr;
+    Auto_Mutex lock(session().mutex);
+    session().guard = guard;
+    session().openings++;
+    return guard;
+}
+
+void close_guard(sem_t* guard, const std::string& name)
+{
+    Auto_Mutex lock(session().mutex);
+    ::sem_close(guard);
+    ::sem_unlink(name.c_str());
+    if (--session().openings == 0) session().guard = nullptr;
+}
+
+void wait_for(sem_t* semaphore)
+{
+    while (::sem_wait(semaphore) != 0 && errno == EINTR) {
+    }
+}
+
+void initialise(sem_t* guard, const std::string& name)
+{
+    NVR_LOG("Aquired Semaphore.. Running RM_InitLib %s ", name.c_str());
+    const std::string done_name = name_for_process("/NVR_RM_INIT_LIB_DONE_");
+    sem_t* done = ::sem_open(done_name.c_str(), O_CREAT, 0644, 0);
+    {
+        Auto_Mutex lock(session().mutex);
+        session().initialising = true;
+        session().done = done;
+    }
+    NVR_LOG("Aquired Completed Semaphore.. Running RM_InitLib %s", done_name.c_str());
+    const int status = RM_InitLib();
+    if (status > 0) {
+        NVR_LOG("Error : Initialization of RMLib:: RM_InitLib failed with[%d]", status);
+        ::sem_post(guard);
+        close_guard(guard, name);
+        throw std::exception();
+    }
+    NVR_LOG("Signalling Completed Semaphore.. Running RM_InitLib");
+    ::sem_post(guard);
+    NVR_LOG("Signaled Completed Semaphore.. Running RM_InitLib");
+}
+
+} // namespace
+
+// The guard is made with the value 2. Who finds 2 initialises, with 1 in between, and puts it back to 2; who finds less
+// takes what is left and waits for that.
+NVR_MethodWrapper::NVR_MethodWrapper()
+{
+    NVR_LOG("Constructor");
+    NVR_LOG("Setting Up for FIFO.. ");
+    const std::string name = guard_name();
+    if (sem_t* guard = open_guard(name)) {
+        int value = 0;
+        ::sem_getvalue(guard, &value);
+        wait_for(guard);
+        if (value == 2) {
+            initialise(guard, name);
+        } else {
+            NVR_LOG("Waiting on Completed Semaphore.. To issue RM Calls..%s.. sem = %ul", name.c_str(),
+                    static_cast<unsigned>(reinterpret_cast<std::uintptr_t>(guard)));
+            wait_for(guard);
+            NVR_LOG("Recieved signal on Completed Semaphore.. To issue RM Calls");
+        }
+    }
+    NVR_LOG("RMLIB initialized");
+}
+
+NVR_MethodWrapper::~NVR_MethodWrapper()
+{
+    NVR_LOG("Destructor");
+    sem_t* guard = nullptr;
+    {
+        Auto_Mutex lock(session().mutex);
+        guard = session().guard;
+    }
+    if (guard) {
+        ::sem_post(guard);
+        int value = 0;
+        ::sem_getvalue(guard, &value);
+        NVR_LOG("Value of Sem in destructor=%d", value);
+        close_guard(guard, guard_name());
+    }
+    NVR_LOG("RMLIB uninitialzed");
+}
+
+int NVR_MethodWrapper::string2HBAName(HBA_WWN* wwn, const char* text)
+{
+    return cimple::string2HBAName(wwn, text);
+}
+
+} // namespace cimple

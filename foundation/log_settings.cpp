@@ -1,0 +1,104 @@
+// The log's settings file: "mode,level,enabled", and behind the line's end the trace file's path.
+
+#include <cstdlib>
+#include <cstring>
+#include <sys/stat.h>
+
+#include "foundation/CLogger.h"
+#include "foundation/Keep_Errno.h"
+#include "foundation/NVR_FileLogger.h"
+#include "foundation/open_file.h"
+
+namespace cimple {
+
+const char* const log_settings_path = "/etc/norvane_fc_provider.dmp";
+
+std::string CLogger::tracePath() const
+{
+    Hold hold;
+    for (NVR_LoggerInterface* logger : m_loggers)
+        if (auto* file = dynamic_cast<NVR_FileLogger*>(logger)) return file->getPath().c_str();
+    return "";
+}
+
+bool CLogger::setTracePath(const char* path)
+{
+    Hold hold;
+    for (NVR_LoggerInterface* logger : m_loggers)
+        if (auto* file = dynamic_cast<NVR_FileLogger*>(logger)) return file->setPath(path) == 0;
+    return true;
+}
+
+void CLogger::saveSettings()
+{
+    Keep_Errno keep_errno;
+    const std::string path = tracePath();
+    File file = open_file(log_settings_path, "w");
+    if (!file) {
+        NVR_LOG("Unable to open file for storing config data");
+        return;
+    }
+    std::fprintf(file.get(), "%d,%d,%d\n", static_cast<int>(getMode()), getLevel(), isEnabled() ? 1 : 0);
+    std::fputs(path.c_str(), file.get());
+    std::fflush(file.get());
+}
+
+void CLogger::loadSettings()
+{
+    Keep_Errno keep_errno;
+    struct stat status;
+    if (::stat(log_settings_path, &status) != 0) return;
+    File file = open_file(log_settings_path, "r");
+    if (!file) {
+        NVR_LOG("Unable to open config data file - %s", log_settings_path);
+        return;
+    }
+
+    char line[20];
+    if (!std::fgets(line, sizeof line, file.get())) return;
+    char* rest = nullptr;
+    const char* token = ::strtok_r(line, ",", &rest);
+    if (!token) {
+        NVR_LOG("Unable to read Log Mode from config data file - %s", log_settings_path);
+        return;
+    }
+    const auto mode = static_cast<uint32>(std::strtol(token, nullptr, 10));
+    if (mode > 4) {
+        NVR_LOG("Invalid value for Log Mode from config data file -%s-%u", log_settings_path, mode);
+        return;
+    }
+    token = ::strtok_r(nullptr, ",", &rest);
+    if (!token) {
+        NVR_LOG("Unable to read Log Level from config data file - %s", log_settings_path);
+        return;
+    }
+    const auto level = static_cast<uint32>(std::strtol(token, nullptr, 10));
+    if (level > 5) {
+        NVR_LOG("Invalid value for Log Level from config data file -%s-%u", log_settings_path, level);
+        return;
+    }
+    token = ::strtok_r(nullptr, ",", &rest);
+    if (!token) {
+        NVR_LOG("Unable to read Log Enabled from config data file - %s", log_settings_path);
+        return;
+    }
+    const auto enabled = static_cast<sint32>(std::strtol(token, nullptr, 10));
+    m_enabled = enabled; // a negative value stays, and counts as enabled
+    if (enabled < 0) {
+        NVR_LOG("Invalid value for Log Enabled from config data file - %s", log_settings_path);
+        return;
+    }
+
+    char path[256] = "";
+    if (mode == 2 || mode == 4) {
+        if (!std::fgets(path, sizeof path, file.get())) return;
+        if (char* end = std::strrchr(path, '\r')) *end = '\0';
+        if (char* end = std::strrchr(path, '\n')) *end = '\0';
+    }
+    file.reset();
+    if (!setTracePath(path)) return; // always so for the other modes, whose empty path no file has
+    setLevel(static_cast<sint32>(level));
+    setMode(mode);
+}
+
+} // namespace cimple

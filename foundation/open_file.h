@@ -1,0 +1,18 @@
+/// Opens files so that no caller is ever blocked, whatever stands at the path: a FIFO, a full pipe, a terminal.
+#pragma once
+
+#include <cstdio>
+#include <memory>
+
+namespace cimple {
+
+struct Close_File {
+    void operator()(std::FILE* file) const { std::fclose(file); }
+};
+using File = std::unique_ptr<std::FILE, Close_File>;
+
+/// As fopen with mode "r", "w" or "a+"; empty on failure, with errno set. A read that would wait ends the file, a write
+/// that would wait fails. The file is closed in programs that the process starts.
+File open_file(const char* path, const char* mode);
+
+} // namespace cimple

@@ -1,0 +1,41 @@
+#include "runtime/Mutex.h"
+
+#include <cassert>
+#include <cerrno>
+
+namespace cimple {
+
+void Mutex::lock()
+{
+    const int status = pthread_mutex_lock(&_rep.mutex);
+    if (status != 0)
+        __assert_fail("pthread_mutex_lock(&((MutexRep*)_rep)->mutex) == 0", __FILE__, __LINE__, __PRETTY_FUNCTION__);
+}
+
+void Mutex::unlock()
+{
+    pthread_mutex_unlock(&_rep.mutex);
+}
+
+int Mutex::try_lock()
+{
+    const int status = pthread_mutex_trylock(&_rep.mutex);
+    return status == 0 || status == EBUSY ? status : -1;
+}
+
+void Cond::wait(Mutex& mutex)
+{
+    pthread_cond_wait(&m_cond, &mutex._rep.mutex);
+}
+
+void Cond::signal()
+{
+    pthread_cond_signal(&m_cond);
+}
+
+void Cond::broadcast()
+{
+    pthread_cond_broadcast(&m_cond);
+}
+
+} // namespace cimple

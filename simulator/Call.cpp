@@ -1,0 +1,152 @@
+#include "simulator/Call.h"
+
+#include <algorithm>
+#include <chrono>
+#include <cstdio>
+#include <thread>
+
+namespace nvrsim {
+
+namespace {
+
+constexpr size_t longestLog = 20000;
+
+} // namespace
+
+Call::Call(Call_Id id, const Subject& subject) : m_simulator(Simulator::instance()), m_lock(m_simulator.mutex), m_id(id)
+{
+    resolve(subject);
+    ++m_simulator.counters[static_cast<size_t>(id)];
+    const char* name = to_text(id);
+    bool hit = false;
+    for (Fault& fault : m_simulator.faults) {
+        if (!matches(fault, name, subject)) continue;
+        ++fault.seen;
+        if (hit || fault.seen < fault.from || fault.seen - fault.from >= fault.times) continue;
+        ++fault.hits;
+        m_fault = fault;
+        hit = true;
+    }
+    if (m_fault.delay) {
+        m_lock.unlock();
+        std::this_thread::sleep_for(std::chrono::milliseconds(m_fault.delay));
+        m_lock.lock();
+        resolve(subject); // the host may be another one now
+    }
+    if (m_port) m_wwpn = m_port->current.wwpn;
+}
+
+Call::~Call()
+{
+    try {
+        m_simulator.log.push_back({m_id, m_wwpn, m_result});
+        if (m_simulator.log.size() > longestLog) m_simulator.log.pop_front();
+    } catch (const std::exception&) {
+        // A log without this line is all that is lost.
+    }
+}
+
+void Call::resolve(const Subject& subject)
+{
+    m_adapter = nullptr;
+    m_port = nullptr;
+    switch (subject.kind) {
+    case Subject::nothing:
+        break;
+    case Subject::port:
+        m_port = m_simulator.host.find(subject.wwpn, &m_adapter);
+        break;
+    case Subject::adapterHandle:
+        m_adapter = m_simulator.adapter_of(subject.handle);
+        break;
+    case Subject::adapterPort:
+        m_adapter = m_simulator.adapter_of(subject.handle);
+        if (m_adapter && subject.portIndex < m_adapter->ports.size()) m_port = &m_adapter->ports[subject.portIndex];
+        break;
+    case Subject::adapterIndex:
+        m_adapter = m_simulator.present(subject.handle);
+        break;
+    case Subject::adapterName:
+        m_adapter = subject.name ? m_simulator.host.find(subject.name) : nullptr;
+        break;
+    case Subject::tagHandle:
+        m_adapter = m_simulator.adapter_of(subject.handle, true);
+        break;
+    }
+}
+
+bool Call::matches(const Fault& fault, const char* name, const Subject& subject) const
+{
+    if (!fault.concerns(name)) return false;
+    if (fault.number && *fault.number != subject.number) return false;
+    if (!fault.ordinal && !fault.wwpn) return true;
+    const auto isIt = [&](const Port& port) {
+        return fault.ordinal ? port.ordinal == *fault.ordinal : port.current.wwpn == *fault.wwpn;
+    };
+    if (m_port) return isIt(*m_port);
+    // A call about a whole adapter concerns each of its ports.
+    return m_adapter && std::any_of(m_adapter->ports.begin(), m_adapter->ports.end(), isIt);
+}
+
+void Call::bytes(void* target, const void* source, size_t size)
+{
+    if (!target || !size) return;
+    switch (m_fault.damage) {
+    case Damage::none:
+    case Damage::unterminated:
+        std::memcpy(target, source, size);
+        return;
+    case Damage::truncated:
+        std::memcpy(target, source, std::min<size_t>(size, m_fault.keep));
+        return;
+    case Damage::ones:
+        std::memset(target, 0xFF, size);
+        return;
+    case Damage::zeros:
+        std::memset(target, 0, size);
+        return;
+    case Damage::null:
+        return;
+    case Damage::garbage:
+        for (size_t i = 0; i < size; ++i) {
+            m_noise = m_noise * 1664525 + 1013904223;
+            static_cast<unsigned char*>(target)[i] = static_cast<unsigned char>(m_noise >> 24);
+        }
+        return;
+    }
+}
+
+void Call::fill(char* target, size_t capacity, const std::string& text, bool terminated)
+{
+    if (!capacity) return;
+    if (m_fault.damage == Damage::unterminated) {
+        for (size_t i = 0; i < capacity; ++i)
+            target[i] = text.empty() ? 'X' : text[i % text.size()];
+        return;
+    }
+    const size_t size = std::min(text.size(), terminated ? capacity - 1 : capacity);
+    std::memcpy(target, text.data(), size);
+    std::memset(target + size, 0, capacity - size);
+}
+
+void Call::text(char* target, size_t capacity, const std::string& text)
+{
+    if (!target || !capacity) return;
+    std::string whole(capacity, '\0');
+    fill(&whole[0], capacity, text);
+    const size_t used = m_fault.damage == Damage::unterminated ? capacity : std::min(text.size() + 1, capacity);
+    bytes(target, whole.data(), m_fault.damage == Damage::none ? used : capacity);
+}
+
+uint32_t Call::block(const Bytes& data, void* target, uint32_t* size)
+{
+    if (!size || !target) return RM_STATUS_ARGUMENT;
+    uint32_t capacity;
+    std::memcpy(&capacity, size, sizeof capacity);
+    number(size, data.size());
+    if (capacity < data.size()) return RM_STATUS_MORE_DATA;
+    bytes(target, data.data(), data.size());
+    return RM_STATUS_OK;
+}
+
+} // namespace nvrsim

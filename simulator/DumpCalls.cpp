@@ -1,0 +1,128 @@
+// Dumps: real files, small ones, in the port's dump directory.
+#include "simulator/Call.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <sys/stat.h>
+#include <unistd.h>
+
+using namespace nvrsim;
+
+namespace {
+
+/// The scenario's directory, or one for this process under the system's temporary one; made when it is first needed.
+std::string directory_of(const Port& port)
+{
+    if (!port.dumpDirectory.empty()) return port.dumpDirectory;
+    const char* base = std::getenv("TMPDIR");
+    return std::string(base && *base ? base : "/tmp") + "/nvrsim-dumps-" + std::to_string(::getpid());
+}
+
+void remove_dump(const Port& port, const std::string& name)
+{
+    std::remove((directory_of(port) + "/" + name).c_str());
+}
+
+uint32_t generate(Port& port, const char* kind)
+{
+    const std::string directory = directory_of(port);
+    ::mkdir(directory.c_str(), 0700); // may be there already
+    char name[sizeof(RM_DUMPNAME::name)];
+    std::snprintf(name, sizeof name, "NVR_%s_%s_%04u.dmp", to_text(port.current.wwpn).c_str(), kind, ++port.dumpsMade);
+    const std::string path = directory + "/" + name;
+    std::FILE* file = std::fopen(path.c_str(), "wb");
+    if (!file) return RM_STATUS_DIRECTORY_NOT_OPENED;
+    const bool printed = std::fprintf(file, "dump %s of port %s\n", kind, to_text(port.current.wwpn).c_str()) > 0;
+    if (std::fclose(file) != 0 || !printed) {
+        std::remove(path.c_str());
+        return RM_STATUS_ERROR;
+    }
+    port.dumps.push_back(name);
+    while (port.dumps.size() > port.retention) {
+        remove_dump(port, port.dumps.front());
+        port.dumps.erase(port.dumps.begin());
+    }
+    return RM_STATUS_OK;
+}
+
+} // namespace
+
+uint32_t nvrsim_RM_GenerateDump(HBA_WWN, HBA_WWN wwn)
+{
+    return run_on_port(Call_Id::RM_GenerateDump, wwn, [](Call&, Port& port) { return generate(port, "dump"); });
+}
+
+uint32_t nvrsim_RM_GenerateEfdDump(HBA_WWN wwn, uint32_t, uint32_t)
+{
+    return run_on_port(Call_Id::RM_GenerateEfdDump, wwn, [](Call&, Port& port) { return generate(port, "efd"); });
+}
+
+uint32_t nvrsim_RM_GetDumpDirectoryA(HBA_WWN wwn, char* buffer, uint32_t size)
+{
+    return run_on_port(Call_Id::RM_GetDumpDirectoryA, wwn, [&](Call& call, Port& port) {
+        if (!buffer || !size) return RM_STATUS_ARGUMENT;
+        call.text(buffer, size, directory_of(port));
+        return RM_STATUS_OK;
+    });
+}
+
+uint32_t nvrsim_RM_SetDumpDirectory(HBA_WWN wwn, const char* path)
+{
+    return run_on_port(Call_Id::RM_SetDumpDirectory, wwn, [&](Call&, Port& port) {
+        struct stat status;
+        if (!path || std::strlen(path) >= RM_DUMP_DIRECTORY_SIZE) return RM_STATUS_ARGUMENT;
+        if (::stat(path, &status) != 0 || !S_ISDIR(status.st_mode)) return RM_STATUS_DIRECTORY_NOT_OPENED;
+        port.dumpDirectory = path;
+        return RM_STATUS_OK;
+    });
+}
+
+uint32_t nvrsim_RM_GetDumpFileNames(HBA_WWN wwn, void* list)
+{
+    return run_on_port(Call_Id::RM_GetDumpFileNames, wwn, [&](Call& call, Port& port) {
+        if (!list) return RM_STATUS_ARGUMENT;
+        auto* names = static_cast<RM_DUMPLIST*>(list);
+        const uint32_t capacity = names->count ? names->count : port.dumpNeed;
+        call.number(&names->count, port.dumps.size());
+        if (capacity < port.dumps.size()) {
+            port.dumpNeed = static_cast<uint32_t>(port.dumps.size());
+            return RM_STATUS_LIST_TOO_LONG;
+        }
+        for (size_t i = 0; i < port.dumps.size(); ++i) {
+            RM_DUMPNAME entry;
+            call.field(entry.name, port.dumps[i]);
+            call.bytes(names->entry + i, &entry, sizeof entry);
+        }
+        return RM_STATUS_OK;
+    });
+}
+
+uint32_t nvrsim_RM_DeleteDumpFiles(HBA_WWN wwn)
+{
+    return run_on_port(Call_Id::RM_DeleteDumpFiles, wwn, [](Call&, Port& port) {
+        for (const std::string& name : port.dumps)
+            remove_dump(port, name);
+        port.dumps.clear();
+        if (port.dumpDirectory.empty()) ::rmdir(directory_of(port).c_str()); // goes when nobody's dumps are left
+        return RM_STATUS_OK;
+    });
+}
+
+uint32_t nvrsim_RM_GetDumpRetentionCount(HBA_WWN wwn, uint32_t* count)
+{
+    return run_on_port(Call_Id::RM_GetDumpRetentionCount, wwn, [&](Call& call, Port& port) {
+        call.number(count, port.retention);
+        return count ? RM_STATUS_OK : RM_STATUS_ARGUMENT;
+    });
+}
+
+uint32_t nvrsim_RM_SetDumpRetentionCount(HBA_WWN wwn, uint32_t count)
+{
+    return run_on_port(Call_Id::RM_SetDumpRetentionCount, wwn, [&](Call&, Port& port) {
+        if (count < RM_DUMP_RETENTION_MIN || count > RM_DUMP_RETENTION_MAX) return RM_STATUS_ARGUMENT;
+        port.retention = count;
+        return RM_STATUS_OK;
+    });
+}

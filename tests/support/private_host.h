@@ -1,0 +1,32 @@
+/// A host of a test's own: the fixed paths of the module under /etc, /var/log and /dev/shm, without the machine's.
+///
+/// Programs that link `norvane_private_main` (instead of GTest::gtest_main) run in a mount namespace where /etc is a
+/// writable folder of links to the machine's entries, /var/log and /dev/shm are empty, and the loader looks for
+/// libraries first in a folder that the test fills. Nothing reaches the machine; it all goes with the process. Needs
+/// root, or leave to make a user namespace.
+#pragma once
+
+#include <string>
+
+namespace nvrtest {
+
+/// The folder that the loader searches first. Empty at the start.
+std::string library_folder();
+
+/// Makes the file (instead of what was there) with this content.
+void write_file(const std::string& path, const std::string& content);
+/// The content, or "(none)" for what cannot be read.
+std::string read_file(const std::string& path);
+bool exists(const std::string& path);
+/// Removes a file or an empty folder, if it is there.
+void remove(const std::string& path);
+void make_folder(const std::string& path);
+/// `path` becomes a link to `target`.
+void link(const std::string& target, const std::string& path);
+
+/// Covers an existing file that cannot be written, such as one of /proc, by this content; or so that it cannot be
+/// opened.
+void cover_file(const std::string& path, const std::string& content);
+void make_unopenable(const std::string& path);
+
+} // namespace nvrtest

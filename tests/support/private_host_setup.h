@@ -1,0 +1,15 @@
+/// How a test program gets its private host: for main() alone.
+#pragma once
+
+#include <string>
+
+namespace nvrtest {
+
+/// Makes the host and starts the program anew in it; in that second life, returns. Throws std::runtime_error if the
+/// machine does not allow it.
+void enter_private_host(char** argv);
+
+/// The folder that carries the host's own parts. Throws outside of one.
+std::string private_root();
+
+} // namespace nvrtest

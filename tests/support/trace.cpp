@@ -1,0 +1,45 @@
+#include "tests/support/trace.h"
+
+#include <fstream>
+
+namespace nvrtest {
+
+std::vector<std::string> trace_file_words(const std::string& path)
+{
+    std::vector<std::string> words;
+    std::ifstream file(path);
+    for (std::string line; std::getline(file, line);) {
+        if (line.rfind("[threadid =", 0) != 0) {
+            if (!words.empty()) words.back() += "\n" + line;
+            continue;
+        }
+        // Three groups, "[thread] [time] [file:line]", then the level's, directly behind the third.
+        std::size_t end = 0;
+        for (int group = 0; group < 4 && end != std::string::npos; group++)
+            end = line.find(']', end + 1);
+        words.push_back(end == std::string::npos || end + 2 > line.size() ? line : line.substr(end + 2));
+    }
+    return words;
+}
+
+bool Contains_In_Order::MatchAndExplain(const std::vector<std::string>& words, std::ostream* explanation) const
+{
+    auto wanted = m_wanted.begin();
+    for (const std::string& word : words)
+        if (wanted != m_wanted.end() && word == *wanted) ++wanted;
+    if (wanted == m_wanted.end()) return true;
+    if (explanation) *explanation << "which lacks, from there on: " << testing::PrintToString(*wanted);
+    return false;
+}
+
+void Contains_In_Order::DescribeTo(std::ostream* os) const
+{
+    *os << "has in order: " << testing::PrintToString(m_wanted);
+}
+
+void Contains_In_Order::DescribeNegationTo(std::ostream* os) const
+{
+    *os << "lacks, or has in another order: " << testing::PrintToString(m_wanted);
+}
+
+} // namespace nvrtest
