@@ -38,6 +38,16 @@ void answer(int connection)
     }
 }
 
+bool is_answered(const sockaddr_un& address)
+{
+    const int connection = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    if (connection < 0) return true; // not known, so nothing is removed
+    const bool answered = ::connect(connection, reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0 ||
+                          errno != ECONNREFUSED;
+    ::close(connection);
+    return answered;
+}
+
 void serve(int listener)
 {
     for (;;) {
@@ -59,8 +69,12 @@ void serve(int listener)
 
 void start_socket()
 {
-    const char* path = std::getenv("NVRSIM_SOCKET");
-    if (!path || !*path) return;
+    const char* name = std::getenv("NVRSIM_SOCKET");
+    if (!name || !*name) return;
+    std::string whole = name;
+    const size_t place = whole.find("%p"); // the process id, where several processes share an environment
+    if (place != std::string::npos) whole.replace(place, 2, std::to_string(::getpid()));
+    const char* const path = whole.c_str();
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
     if (std::strlen(path) >= sizeof address.sun_path) {
@@ -68,10 +82,11 @@ void start_socket()
         return;
     }
     std::strcpy(address.sun_path, path);
-    // Only a socket that an earlier process left behind is removed, never a file that somebody needs.
+    // What an earlier process left behind is removed; never a socket that somebody answers at, never another file.
     struct stat status;
-    if (::lstat(path, &status) == 0 && S_ISSOCK(status.st_mode)) ::unlink(path);
     const int listener = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    if (listener >= 0 && ::lstat(path, &status) == 0 && S_ISSOCK(status.st_mode) && !is_answered(address))
+        ::unlink(path);
     if (listener >= 0) ::fchmod(listener, 0600);
     if (listener < 0 || ::bind(listener, reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0 ||
         ::chmod(path, 0600) != 0 || ::listen(listener, 8) != 0) {
