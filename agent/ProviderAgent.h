@@ -330,6 +330,7 @@ private:
     bool nothingLeftToFetch();
     void runAdapterPhase();
     void runSANPhase();
+    static bool rateLimitPassed(Datetime& last, uint32 interval);
 };
 
 } // namespace cimple
