@@ -13,8 +13,8 @@ namespace cimple {
 
 namespace {
 
-// Deeper nesting of references than any class asks for; a longer text is some client's.
-constexpr int deepest_nesting = 64;
+// Far deeper than the references of any class nest; each level doubles the backslashes of the text.
+constexpr int deepest_nesting = 16;
 
 int append_model_path(const Instance* instance, String& text);
 
