@@ -13,15 +13,16 @@ namespace cimple {
 /// What the three have in common. `name_space` stands in for instances that have none of their own; it may be null
 /// where nothing is written, and must outlive the container.
 class CMPI_Container : public Container {
+public:
+    std::size_t get_size() final;
+    int get_name(std::size_t index, const char*& name) final;
+    int get_value(std::size_t index, int expected_type, Value& value) final;
+
 protected:
     CMPI_Container(const CMPIBroker* broker, const Meta_Repository* repository, const char* name_space, unsigned depth)
         : Container(repository, depth), m_broker(broker), m_name_space(name_space)
     {
     }
-
-    std::size_t get_size() final;
-    int get_name(std::size_t index, const char*& name) final;
-    int get_value(std::size_t index, int expected_type, Value& value) final;
 
     /// The number of elements of the CMPI object; asked once.
     virtual std::size_t count() = 0;

@@ -3,7 +3,6 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <regex>
 
 namespace cimple {
 
@@ -21,14 +20,22 @@ Runtime_Log::~Runtime_Log()
     std::filesystem::remove_all(m_folder, ignored);
 }
 
+// "<date> <time> LEVEL: file(line): message"
+static std::string without_time_and_place(const std::string& line)
+{
+    const std::size_t level = line.find(' ', line.find(' ') + 1) + 1;
+    const std::size_t level_end = line.find(": ", level);
+    const std::size_t place_end = line.find("): ", level_end);
+    if (place_end == std::string::npos) return line;
+    return line.substr(level, level_end - level) + " " + line.substr(place_end + 3);
+}
+
 std::vector<std::string> Runtime_Log::lines() const
 {
-    static const std::regex form("^\\S+ \\S+ (\\w+): [^(]*\\(\\d+\\): (.*)$");
     std::ifstream file(m_folder + "/.cimple/messages");
     std::vector<std::string> lines;
-    std::smatch parts;
     for (std::string line; std::getline(file, line);)
-        lines.push_back(std::regex_match(line, parts, form) ? parts[1].str() + " " + parts[2].str() : line);
+        lines.push_back(without_time_and_place(line));
     return lines;
 }
 

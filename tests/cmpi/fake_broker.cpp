@@ -408,9 +408,12 @@ void note(const CMPIBroker* mb, const CMPIContext* ctx, Broker::Up_Call call)
 {
     Broker& broker = of(mb);
     if (ctx) whole<Context_Object>(ctx);
-    std::lock_guard<std::recursive_mutex> lock(broker.mutex);
-    broker.up_calls.push_back(std::move(call));
-    if (broker.on_up_call) broker.on_up_call(broker.up_calls.back().name);
+    const std::string name = call.name;
+    {
+        std::lock_guard<std::recursive_mutex> lock(broker.mutex);
+        broker.up_calls.push_back(std::move(call));
+    }
+    if (broker.on_up_call) broker.on_up_call(name); // may come back
 }
 
 const Path& path_content(const CMPIObjectPath* op)

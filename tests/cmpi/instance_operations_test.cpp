@@ -357,25 +357,17 @@ TEST_F(Instances, QueriesAreNotSupported)
               CMPI_RC_ERR_NOT_SUPPORTED);
 }
 
-TEST(InstanceOperationLog, NamesOperationAndCode)
+class InstanceLog : public Runtime_Log, public Instances {};
+
+TEST_F(InstanceLog, NamesOperationAndCode)
 {
-    Runtime_Log log;
-    struct Test : Instances {
-        void TestBody() override
-        {
-            names(class_path());
-            get(thing_path("none", 1));
-            mi->ft->execQuery(mi, context, result, broker.path(class_path()), "", "");
-        }
-    };
-    {
-        Test test;
-        test.TestBody();
-    }
+    names(class_path());
+    get(thing_path("none", 1));
+    mi->ft->execQuery(mi, context, result, broker.path(class_path()), "", "");
     for (const char* line : {"DBG enter: enumInstanceNames()", "DBG return: enumInstanceNames(): CMPI_RC_OK",
                              "DBG return: getInstance(): CMPI_RC_ERR_NOT_FOUND", "DBG enter: execQuery()",
                              "DBG return: execQuery(): CMPI_RC_ERR_NOT_SUPPORTED"})
-        EXPECT_TRUE(log.has(line)) << line;
+        EXPECT_TRUE(has(line)) << line;
 }
 
 // --- Methods
@@ -519,27 +511,19 @@ TEST_F(Methods, ReferencesGoBothWays)
     EXPECT_EQ(target.path->name_space, "root/test");
 }
 
-TEST(MethodOperationLog, HasAWordForEachFailure)
+class MethodLog : public Runtime_Log, public Methods {};
+
+TEST_F(MethodLog, HasAWordForEachFailure)
 {
-    Runtime_Log log;
-    struct Test : Methods {
-        void TestBody() override
-        {
-            call("Nothing");
-            call("Echo", {}, class_path("TEST_Nothing"));
-            call("Echo", {{"Number", fake::string("7")}, {"Unknown", fake::uint16(1)}, {"Text", fake::uint16(1)}});
-        }
-    };
-    {
-        Test test;
-        test.TestBody();
-    }
+    call("Nothing");
+    call("Echo", {}, class_path("TEST_Nothing"));
+    call("Echo", {{"Number", fake::string("7")}, {"Unknown", fake::uint16(1)}, {"Text", fake::uint16(1)}});
     for (const char* line :
          {"DBG return: invokeMethod(): CMPI_RC_ERR_METHOD_NOT_FOUND Nothing",
           "DBG return: invokeMethod(): CMPI_RC_ERR_FAILED MetaClass not found",
           "WARN converting string to registered parameter type", "WARN unknown feature: Echo.Unknown",
           "WARN type mismatch on Text: uint16/string", "WARN conversion error: Echo.Text"})
-        EXPECT_TRUE(log.has(line)) << line;
+        EXPECT_TRUE(has(line)) << line;
 }
 
 } // namespace
