@@ -65,7 +65,10 @@ void NVR_SysLogger::logMessage(sint32 level, const char*, uint32, const char* te
     if (std::strncmp(record, "GetInterfaceState", 15) == 0 || std::strncmp(record, "GetIPAddressType", 13) == 0) return;
     char format[2 * sizeof record];
     make_format(format, record);
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wformat-security" // safe: make_format leaves no conversion that takes an argument
     ::syslog(priorities[level], format);
+#pragma GCC diagnostic pop
 }
 
 } // namespace cimple

@@ -10,10 +10,10 @@ namespace {
 
 using Operation = Request::Operation;
 
-Answer failed(int code, std::string message)
+Answer failed(int code, std::string message, Fault fault = Fault::request)
 {
     Answer answer;
-    answer.status = {code, std::move(message)};
+    answer.status = {code, std::move(message), fault};
     return answer;
 }
 
@@ -61,7 +61,7 @@ Answer Dispatcher::run(const Request& request)
 {
     if (request.up_call)
         m_broker.log().line("up-call %s %s", operation_name(request.operation), request.path.to_text().c_str());
-    if (m_modules.stopped() && !request.up_call) return failed(CMPI_RC_ERR_FAILED, "the server has stopped");
+    if (m_modules.stopped() && !request.up_call) return failed(CMPI_RC_ERR_FAILED, "the server has stopped", Fault::server);
     if (!knows(request.path.name_space))
         return failed(CMPI_RC_ERR_INVALID_NAMESPACE, "the server has no namespace " + request.path.name_space);
     if (!m_broker.schema().find(request.path.class_name))
@@ -125,7 +125,7 @@ Answer Dispatcher::one_instance(const Request& request, Mi kind)
     }
     Answer answer = ask(request, {{*served, served->registration.class_name}}, kind);
     bool nothing = answer.ok() && request.operation == Operation::get && answer.instances.empty();
-    if (nothing) answer.status = {CMPI_RC_ERR_FAILED, "the provider answered OK without an instance"};
+    if (nothing) answer.status = {CMPI_RC_ERR_FAILED, "the provider answered OK without an instance", Fault::provider};
     return answer;
 }
 
@@ -182,7 +182,7 @@ Answer Dispatcher::ask(const Request& request, const std::vector<Target>& target
     std::vector<Answer> answers(targets.size());
     std::vector<std::function<void()>> works;
     for (std::size_t i = 0; i < targets.size(); ++i) {
-        answers[i].status = {CMPI_RC_ERROR_SYSTEM, "the server has no thread for the request"};
+        answers[i].status = {CMPI_RC_ERROR_SYSTEM, "the server has no thread for the request", Fault::server};
         works.push_back([&, i] { ask_one(request, targets[i], kind, answers[i]); });
     }
     if (!works.empty()) m_workers.run_all(works, m_broker.manner().parallel_subclasses);
@@ -202,7 +202,7 @@ void Dispatcher::ask_one(const Request& request, const Target& target, Mi kind, 
     Provider& provider = *target.served.provider;
     Modules::Visit visit(m_modules, provider.module(), request.up_call);
     if (!visit) {
-        answer.status = {CMPI_RC_ERR_FAILED, "the server has stopped"};
+        answer.status = {CMPI_RC_ERR_FAILED, "the server has stopped", Fault::server};
         return;
     }
     const auto start = std::chrono::steady_clock::now();

@@ -32,10 +32,20 @@
 
 namespace host {
 
+/// Whose fault a failure is.
+enum class Fault {
+    nobody,
+    request,  ///< asked for what is not there
+    server,   ///< the host itself: no thread, already stopped
+    module,   ///< cannot be loaded, a factory failed, an exception came out of it
+    provider  ///< answered with this status
+};
+
 /// A CMPI return code and its text; 0 is success.
 struct Status {
     int code = 0;
     std::string message;
+    Fault fault = Fault::nobody;
 
     bool ok() const { return code == 0; }
 };

@@ -35,7 +35,7 @@ Status Indications::make_call(CMPIIndicationMI* mi, Call what, const Served_Clas
                               const Subscription& subscription, bool edge)
 {
     CMPIIndicationMIFT* ft = mi->ft;
-    if (!ft) return {CMPI_RC_ERR_FAILED, "the provider has no table"};
+    if (!ft) return {CMPI_RC_ERR_FAILED, "the provider has no table", Fault::module};
     const Manner& manner = m_broker.manner();
     const CMPIContext* context = m_broker.make_request_context("", subscription.name_space);
     Path path;
@@ -77,16 +77,16 @@ Status Indications::make_call(CMPIIndicationMI* mi, Call what, const Served_Clas
 
 Status Indications::call(const Served_Class& served, Call what, const Subscription& subscription, bool edge, bool load)
 {
-    Status status{CMPI_RC_ERROR_SYSTEM, "the server has no thread for the request"};
+    Status status{CMPI_RC_ERROR_SYSTEM, "the server has no thread for the request", Fault::server};
     m_workers.run([&] {
         Modules::Visit visit(m_modules, served.provider->module(), false);
         if (!visit) {
-            status = {CMPI_RC_ERR_FAILED, "the server has stopped"};
+            status = {CMPI_RC_ERR_FAILED, "the server has stopped", Fault::server};
             return;
         }
         Call_Scope scope(m_broker, name_of(what));
         void* mi = served.provider->made(Mi::indication);
-        status = mi ? Status{} : Status{CMPI_RC_ERR_FAILED, "the provider is not loaded"};
+        status = mi ? Status{} : Status{CMPI_RC_ERR_FAILED, "the provider is not loaded", Fault::server};
         if (!mi && load) status = served.provider->ready(Mi::indication, mi);
         if (mi && status.ok()) status = make_call(static_cast<CMPIIndicationMI*>(mi), what, served, subscription, edge);
         m_broker.log().line("%s %s in %s: %s", name_of(what), served.registration.class_name.c_str(),
@@ -118,9 +118,9 @@ Status Indications::subscribe(const std::string& name_space, const std::string& 
                               const std::string& query, int& id)
 {
     const Class_Record* record = m_broker.schema().find(class_name);
-    if (!record) return {CMPI_RC_ERR_INVALID_CLASS, "the server has no class " + class_name};
+    if (!record) return {CMPI_RC_ERR_INVALID_CLASS, "the server has no class " + class_name, Fault::request};
     if (!m_modules.has_name_space(name_space))
-        return {CMPI_RC_ERR_INVALID_NAMESPACE, "the server has no namespace " + name_space};
+        return {CMPI_RC_ERR_INVALID_NAMESPACE, "the server has no namespace " + name_space, Fault::request};
     auto subscription = std::make_shared<Subscription>();
     subscription->name_space = name_space;
     subscription->class_name = record->name;
@@ -135,7 +135,7 @@ Status Indications::subscribe(const std::string& name_space, const std::string& 
         m_subscriptions[id] = subscription;
     }
     Status status{CMPI_RC_ERR_NOT_SUPPORTED,
-                  "no indication provider is registered for " + class_name + " in " + name_space};
+                  "no indication provider is registered for " + class_name + " in " + name_space, Fault::request};
     for (const Served_Class& served : m_modules.serving(name_space, Mi::indication)) {
         if (!served.record || !served.record->is_a(record->name)) continue;
         status = activate(served, subscription);
@@ -171,7 +171,7 @@ Status Indications::unsubscribe(int id)
     {
         std::lock_guard lock(m_mutex);
         auto found = m_subscriptions.find(id);
-        if (found == m_subscriptions.end()) return {CMPI_RC_ERR_NOT_FOUND, "there is no subscription of that number"};
+        if (found == m_subscriptions.end()) return {CMPI_RC_ERR_NOT_FOUND, "there is no subscription of that number", Fault::request};
         subscription = found->second;
     }
     Status status;

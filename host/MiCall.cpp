@@ -143,7 +143,7 @@ private:
     {
         if (!table || !(table->*slot))
             return {CMPI_RC_ERR_NOT_SUPPORTED,
-                    std::string("the provider has no ") + operation_name(m_request.operation)};
+                    std::string("the provider has no ") + operation_name(m_request.operation), Fault::provider};
         CMPIStatus status = status_of(CMPI_RC_OK);
         Status guarded = guard(m_broker, operation_name(m_request.operation),
                                [&] { status = (table->*slot)(mi, m_context, result, arguments...); });

@@ -51,7 +51,7 @@ Status Provider::open()
                         : error   ? error
                                   : "failed");
     if (m_library) return {};
-    return {CMPI_RC_ERR_FAILED, "the module cannot be loaded: " + std::string(error ? error : module())};
+    return {CMPI_RC_ERR_FAILED, "the module cannot be loaded: " + std::string(error ? error : module()), Fault::module};
 }
 
 Status Provider::make(Mi kind)
@@ -63,7 +63,7 @@ Status Provider::make(Mi kind)
     auto call = reinterpret_cast<Factory>(dlsym(m_library, factory.c_str()));
     if (!call) {
         m_broker.log().line("factory %s: missing", factory.c_str());
-        return {CMPI_RC_ERR_FAILED, "the module " + module() + " has no factory " + factory};
+        return {CMPI_RC_ERR_FAILED, "the module " + module() + " has no factory " + factory, Fault::module};
     }
     CMPIStatus status = status_of(CMPI_RC_OK);
     void* mi = nullptr;
@@ -74,7 +74,8 @@ Status Provider::make(Mi kind)
                         told.ok() ? "" : (", " + status_name(told.code)).c_str());
     if (!told.ok() || !mi)
         return {CMPI_RC_ERR_FAILED, "the factory " + factory + " of the module failed" +
-                                        (told.ok() ? " (no MI)" : ": " + status_name(told.code) + " " + told.message)};
+                                        (told.ok() ? " (no MI)" : ": " + status_name(told.code) + " " + told.message),
+                Fault::module};
     slot = mi;
     m_age = ++factories_called;
     return {};
@@ -84,7 +85,8 @@ Status Provider::ready(Mi kind, void*& mi)
 {
     std::lock_guard lock(m_mutex);
     if (!(m_registration.kinds & kind_bit(kind)))
-        return {CMPI_RC_ERR_NOT_SUPPORTED, name() + " is not registered as " + mi_name(kind) + " provider"};
+        return {CMPI_RC_ERR_NOT_SUPPORTED, name() + " is not registered as " + mi_name(kind) + " provider",
+                Fault::request};
     Status status = open();
     for (Mi each : all_mi_kinds) {
         bool wanted = each == kind || m_broker.manner().factories_by_class;

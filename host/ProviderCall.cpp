@@ -1,10 +1,16 @@
 #include "host/ProviderCall.h"
 
+#include <cstring>
+
 namespace host {
 
 Status read_status(const CMPIStatus& status)
 {
-    Status result{static_cast<int>(status.rc), ""};
+    Status result;
+    static_assert(sizeof status.rc == sizeof result.code);
+    // A module may answer with any number, also one that the enumeration does not have.
+    std::memcpy(&result.code, &status.rc, sizeof result.code);
+    if (result.code != CMPI_RC_OK) result.fault = Fault::provider;
     if (auto* text = unwrap<String_Object>(status.msg)) {
         result.message = text->to_text();
         // A status hands its text over: the module cannot release it.

@@ -26,7 +26,7 @@ Status guard(Broker& broker, const std::string& what, Call call)
         throw;
     } catch (...) {
         broker.violation("an exception came out of " + what);
-        return {CMPI_RC_ERR_FAILED, "an exception came out of the provider's " + what};
+        return {CMPI_RC_ERR_FAILED, "an exception came out of " + what, Fault::module};
     }
 }
 

@@ -27,4 +27,18 @@ inline std::vector<Row> rows(const std::string& name)
     return result;
 }
 
+/// An MI kind: its word in a factory's name, and the letter that the bridge is given.
+struct Mi_Kind {
+    const char* word;
+    char letter;
+};
+
+/// What the providers of a kind of class ("plain", "association", "indication") export.
+inline std::vector<Mi_Kind> mi_kinds(const std::string& kind)
+{
+    if (kind == "association") return {{"Instance", 'I'}, {"Method", 'M'}, {"Association", 'A'}};
+    if (kind == "indication") return {{"Indication", 'N'}, {"Method", 'M'}};
+    return {{"Instance", 'I'}, {"Method", 'M'}};
+}
+
 } // namespace cimple::expected

@@ -144,6 +144,27 @@ TEST(Records, ClassFlagsAreOfTheKnownMasks)
         EXPECT_EQ(counts.count(mask), mask == 0x80C0 ? 0u : 1u) << std::hex << mask;
 }
 
+TEST(Records, ASubclassIsOfItsSuperclassesKind)
+{
+    const uint32 kinds =
+        META_FLAG_CLASS | META_FLAG_ASSOCIATION | META_FLAG_INDICATION | META_FLAG_AGGREGATION | META_FLAG_COMPOSITION;
+    for (const Meta_Class* at : all_classes()) {
+        // An association may be the first aggregation of its line, not the last.
+        const uint32 inherited = at->super_meta_class ? at->super_meta_class->flags & kinds : 0u;
+        EXPECT_EQ(at->flags & inherited, inherited) << at->name;
+    }
+}
+
+TEST(Records, ANarrowedEndKeepsItsPartInTheAssociation)
+{
+    const uint32 parts = META_FLAG_AGGREGATE | META_FLAG_WEAK;
+    for (const auto& row : rows("references.txt")) {
+        const Meta_Class& owner = class_named(row[0]);
+        const Meta_Feature& end = feature_named(owner, row[1]);
+        EXPECT_EQ(end.flags & parts, feature_named(*owner.super_meta_class, row[1]).flags & parts) << row[0] << row[1];
+    }
+}
+
 TEST(Records, KindsOfTheSchemasIndicationsAreAsPublished)
 {
     EXPECT_EQ(class_named("CIM_Error").flags, META_FLAG_INDICATION);

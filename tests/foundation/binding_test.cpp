@@ -2,6 +2,7 @@
 
 #include <cstring>
 #include <dlfcn.h>
+#include <thread>
 
 #include <gmock/gmock.h>
 
@@ -270,6 +271,26 @@ TEST_F(Binding, BindsAfreshAfterAnUnload)
         fake::install({"rmapi_short=rmapi"});
         EXPECT_EQ(loadLibraries(), 1);
         EXPECT_THAT(library_of_vpd(), ElementsAre("rmapi:RM_GetVPD"));
+        unloadLibraries();
+    }
+}
+
+TEST_F(Binding, IsUsedByManyThreads)
+{
+    for (const auto& libraries : {std::vector<std::string>{"HBAAPI", "lrmapi", "tssdm"}, {"rmapi_short=rmapi"}}) {
+        fake::install(libraries);
+        loadLibraries();
+        std::vector<std::thread> threads;
+        for (int t = 0; t < 4; t++)
+            threads.emplace_back([] {
+                for (int i = 0; i < 100; i++) {
+                    EXPECT_EQ(cimple::RM_InitLib(), 0);
+                    EXPECT_EQ(cimple::HBA_GetNumberOfAdapters(), 0u);
+                    EXPECT_EQ(cimple::CPQFC_OpenAdapter("x"), 0u);
+                }
+            });
+        for (std::thread& thread : threads)
+            thread.join();
         unloadLibraries();
     }
 }

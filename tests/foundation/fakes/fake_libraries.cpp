@@ -1,5 +1,7 @@
 #include "tests/foundation/fakes/fake_libraries.h"
 
+#include <mutex>
+
 namespace fake {
 
 #define NVR_VISIBLE __attribute__((visibility("default")))
@@ -18,6 +20,8 @@ NVR_VISIBLE std::vector<std::string>& calls()
 
 NVR_VISIBLE void record_call(const char* call)
 {
+    static std::mutex mutex;
+    std::lock_guard<std::mutex> lock(mutex);
     calls().push_back(call);
 }
 

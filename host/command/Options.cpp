@@ -1,0 +1,105 @@
+#include "host/command/Options.h"
+
+#include "host/Manner.h"
+
+#include <CLI/CLI.hpp>
+
+#include <iostream>
+
+namespace host {
+namespace {
+
+constexpr const char* description =
+    "nvrcim asks the Fibre Channel provider module as a CIM server would: it loads the module, calls it through CMPI,\n"
+    "and shows what came back. No server is needed; with --scenario no adapter either.";
+
+constexpr const char* footer =
+    "Object paths are the usual WBEM text: [namespace:]Class.Key=value,Key=\"text\"\n"
+    "Without a namespace, root/norvane is meant. Inside quotes write \\\" and \\\\; a reference is a quoted path.\n"
+    "\n"
+    "Arguments are name=value, read by the type that the class declares: number=5, mode=0x1F, name=\"any text\",\n"
+    "ports=[1,2], state=OK (a word of the class), target=NVRHBA_FCPort.DeviceID=\"...\", gone=NULL.\n"
+    "\n"
+    "Examples:\n"
+    "  nvrcim --scenario typical.toml enum NVRHBA_FCPort\n"
+    "  nvrcim enum NVRHBA_FCPort --properties DeviceID,Speed --json\n"
+    "  nvrcim get 'NVRHBA_ProviderConfigSetting.InstanceID=\"Norvane HBA Provider:cachetimeout\"'\n"
+    "  nvrcim set 'NVRHBA_ProviderConfigSetting.InstanceID=\"Norvane HBA Provider:cachetimeout\"' current=20\n"
+    "  nvrcim --manner pegasus --server-log - names NVRHBA_Product\n"
+    "\n"
+    "Exit status: 0 done; a CIM status code (1 failed, 2 access denied, 3 no such namespace, 4 bad parameter,\n"
+    "5 no such class, 6 not found, 7 not supported, ...); 64 for a command that cannot be understood.\n"
+    "Environment: NVRCIM_MODULE, NVRCIM_MOF, NVRCIM_SIMULATOR name the places that are otherwise found beside nvrcim.";
+
+std::string manners()
+{
+    std::string names;
+    for (const Manner* manner : Manner::all())
+        names += (names.empty() ? "" : ", ") + std::string(manner->name);
+    return names;
+}
+
+} // namespace
+
+int read_options(int count, char** arguments, Options& options)
+{
+    CLI::App app(description, "nvrcim");
+    app.footer(footer);
+    app.require_subcommand(1);
+    app.fallthrough();
+    app.get_formatter()->column_width(34);
+
+    app.add_option("--scenario", options.scenario, "Run over the simulated host of this file (TOML)");
+    app.add_option("--manner", options.manner, "Behave like this server: " + manners())
+        ->check([](const std::string& name) { return Manner::find(name) ? "" : "the manners are " + manners(); })
+        ->type_name("NAME")
+        ->capture_default_str();
+    app.add_option("-n,--namespace", options.name_space, "Namespace where an object names none")->capture_default_str();
+    app.add_option("--server-log", options.server_log,
+                   "Append to this file what the server did with the module (- for standard error)");
+    app.add_option("--module", options.module, "The provider module to load");
+    app.add_option("--mof", options.mof, "Folder with the class files");
+    app.add_option("--user", options.user, "Name of the user that the requests come from");
+    app.add_flag("--json", options.json, "Print JSON");
+
+    CLI::App* classes = app.add_subcommand("classes", "List the classes that the module serves");
+    classes->add_option("pattern", options.object, "Only classes with this in their name");
+    classes->add_flag("--all", options.all, "All classes known, also those that nobody serves");
+
+    CLI::App* enumerate = app.add_subcommand("enum", "Show the instances of a class and its subclasses");
+    enumerate->add_option("class", options.object, "The class")->required();
+
+    CLI::App* names = app.add_subcommand("names", "Show the object paths of a class's instances");
+    names->add_option("class", options.object, "The class")->required();
+
+    CLI::App* get = app.add_subcommand("get", "Show one instance, every property on a line");
+    get->add_option("path", options.object, "Its object path")->required();
+
+    for (CLI::App* verb : {enumerate, get}) {
+        verb->add_flag("--all", options.all,
+                       verb == get ? "Also properties without a value" : "Every property, one on a line");
+        verb->add_option("-p,--properties", options.properties, "Only these properties (a,b,c)")->delimiter(',');
+    }
+
+    CLI::App* set = app.add_subcommand("set", "Change properties of an instance");
+    set->add_option("path", options.object, "Its object path")->required();
+    set->add_option("property=value", options.arguments, "The properties, with their new values")->required();
+
+    CLI::App* call = app.add_subcommand("call", "Invoke a method");
+    call->add_option("path", options.object, "Object path of the instance, or the class of a static method")
+        ->required();
+    call->add_option("method", options.method, "The method")->required();
+    call->add_option("name=value", options.arguments, "Its arguments");
+
+    try {
+        app.parse(count, arguments);
+    } catch (const CLI::ParseError& error) {
+        if (error.get_exit_code() == 0) return app.exit(error);
+        std::cerr << "nvrcim: wrong command: " << error.what() << "\nTry nvrcim --help.\n";
+        return usage_error;
+    }
+    options.verb = app.get_subcommands().front()->get_name();
+    return -1;
+}
+
+} // namespace host

@@ -1,0 +1,29 @@
+/// What the user asked of nvrcim, read from its command line.
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace host {
+
+struct Options {
+    std::string verb;                    ///< classes, enum, names, get, set, call
+    std::string object;                  ///< a class or an object path; of `classes` a pattern
+    std::string method;                  ///< of `call`
+    std::vector<std::string> arguments;  ///< name=value, of `set` and `call`
+    std::vector<std::string> properties; ///< of `enum` and `get`: only these
+    bool all = false;
+    bool json = false;
+
+    std::string manner = "strict";
+    std::string name_space = "root/norvane";
+    std::string module, mof, scenario, server_log, user;
+};
+
+/// Reads the arguments. Result: -1 to go on, else the exit status (help was shown: 0, a usage error was told: 64).
+int read_options(int count, char** arguments, Options& options);
+
+/// Exit status for a command that cannot be understood.
+constexpr int usage_error = 64;
+
+} // namespace host

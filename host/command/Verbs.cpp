@@ -1,0 +1,300 @@
+#include "host/command/Verbs.h"
+
+#include "host/PathText.h"
+#include "host/command/Arguments.h"
+#include "host/command/Table.h"
+#include "host/command/Views.h"
+
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+
+namespace host {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+/// One run of the command; each verb prints and answers the exit status.
+class Run {
+public:
+    Run(Host& server, const Options& options, std::ostream& out, std::ostream& complaints)
+        : m_server(server), m_options(options), m_out(out), m_complaints(complaints)
+    {
+    }
+
+    int verb()
+    {
+        if (m_options.verb == "classes") return classes();
+        Path_Parse object = parse_path(m_options.object, &m_server.schema(), m_options.name_space);
+        if (!object.ok) return wrong(quote(m_options.object) + ": " + object.error);
+        m_path = object.path;
+        m_class = m_server.schema().find(m_path.class_name);
+        if (!m_class)
+            return failed({CMPI_RC_ERR_INVALID_CLASS, "there is no class " + m_path.class_name, Fault::request});
+        if (m_options.verb == "enum") return enumerate();
+        if (m_options.verb == "names") return names();
+        if (m_options.verb == "get") return get();
+        if (m_options.verb == "set") return set();
+        return call();
+    }
+
+private:
+    int wrong(const std::string& text)
+    {
+        m_complaints << "nvrcim: wrong command: " << printable(text) << "\n";
+        return usage_error;
+    }
+
+    /// The exit status of a failure; with --json the failure is told in JSON too.
+    int failed(const Status& status)
+    {
+        m_complaints << printable(complaint(status)) << "\n";
+        if (m_options.json)
+            m_out << json_text(
+                {{"status", status.code}, {"name", status_name(status.code)}, {"message", status.message}});
+        return status.code < 0 || status.code > 255 ? 255 : status.code;
+    }
+
+    Property_List wanted() const
+    {
+        if (m_options.properties.empty()) return std::nullopt;
+        return m_options.properties;
+    }
+
+    /// Properties that the class does not have are told before anything is loaded. Empty if all are known.
+    std::string unknown_property() const
+    {
+        for (const std::string& name : m_options.properties) {
+            bool known = m_class->property(name);
+            for (const Class_Record* each : m_server.schema().family(*m_class))
+                known = known || each->property(name);
+            if (!known) return m_class->name + " has no property " + name;
+        }
+        return "";
+    }
+
+    int classes();
+    int enumerate();
+    int names();
+    int get();
+    int set();
+    int call();
+    /// Keys that the path lacks, for verbs that need an instance. Empty if none.
+    std::string missing_keys() const;
+
+    Host& m_server;
+    const Options& m_options;
+    std::ostream& m_out;
+    std::ostream& m_complaints;
+    Path m_path;
+    const Class_Record* m_class = nullptr;
+};
+
+std::string kinds_text(unsigned kinds)
+{
+    std::string text;
+    constexpr std::pair<unsigned, const char*> names[] = {{instance_kind, "instance"},
+                                                          {association_kind, "association"},
+                                                          {method_kind, "method"},
+                                                          {property_kind, "property"},
+                                                          {indication_kind, "indication"}};
+    for (const auto& [bit, name] : names)
+        if (kinds & bit) text += (text.empty() ? "" : " ") + std::string(name);
+    return text;
+}
+
+int Run::classes()
+{
+    const std::string pattern = lower_case(m_options.object);
+    const std::vector<Registration> served = m_server.registrations();
+    Table table({"CLASS", "SUPERCLASS", "SERVED AS", "NAMESPACES"});
+    Json json = Json::array();
+    for (const Class_Record* record : m_server.schema().classes()) {
+        if (lower_case(record->name).find(pattern) == std::string::npos) continue;
+        auto found = std::find_if(served.begin(), served.end(),
+                                  [&](const Registration& each) { return same_name(each.class_name, record->name); });
+        if (found == served.end() && !m_options.all) continue;
+        std::string spaces, kinds;
+        Json space_list = Json::array();
+        if (found != served.end()) {
+            kinds = kinds_text(found->kinds);
+            for (const std::string& space : found->name_spaces) {
+                spaces += (spaces.empty() ? "" : " ") + space;
+                space_list.push_back(space);
+            }
+        }
+        const std::string super = record->super ? record->super->name : "";
+        table.add({record->name, super, kinds, spaces});
+        json.push_back({{"class", record->name}, {"superclass", super}, {"kinds", kinds}, {"namespaces", space_list}});
+    }
+    if (m_options.json)
+        m_out << json_text({{"status", 0}, {"classes", json}});
+    else if (table.empty())
+        m_out << "no class has " << quote(m_options.object) << " in its name\n";
+    else
+        m_out << table.to_text(page_width);
+    return 0;
+}
+
+int Run::enumerate()
+{
+    if (std::string unknown = unknown_property(); !unknown.empty()) return wrong(unknown);
+    Answer answer = m_server.enumerate(m_path.name_space, m_class->name, wanted());
+    if (m_options.json) {
+        if (!answer.ok()) return failed(answer.status);
+        Json instances = Json::array();
+        for (const Instance& instance : answer.instances)
+            instances.push_back(to_json(instance));
+        m_out << json_text({{"status", 0}, {"instances", instances}});
+        return 0;
+    }
+    if (m_options.all) {
+        const char* between = "";
+        for (const Instance& instance : answer.instances) {
+            m_out << between << property_list(instance, m_server.schema(), false);
+            between = "\n";
+        }
+    } else {
+        m_out << instance_table(answer.instances, m_server.schema(), m_options.properties);
+    }
+    // What came before a failure is shown, and then the failure.
+    if (!answer.ok()) return failed(answer.status);
+    if (answer.instances.empty()) m_out << "no instances of " << m_class->name << " in " << m_path.name_space << "\n";
+    return 0;
+}
+
+int Run::names()
+{
+    Answer answer = m_server.names(m_path.name_space, m_class->name);
+    if (m_options.json) {
+        if (!answer.ok()) return failed(answer.status);
+        Json paths = Json::array();
+        for (const Path& path : answer.paths)
+            paths.push_back(path.to_text());
+        m_out << json_text({{"status", 0}, {"paths", paths}});
+        return 0;
+    }
+    for (const Path& path : answer.paths)
+        m_out << printable(path.to_text()) << "\n";
+    if (!answer.ok()) return failed(answer.status);
+    if (answer.paths.empty()) m_out << "no instances of " << m_class->name << " in " << m_path.name_space << "\n";
+    return 0;
+}
+
+std::string Run::missing_keys() const
+{
+    std::string missing;
+    for (const Element_Record& property : m_class->properties)
+        if (property.key && !m_path.find(property.name)) missing += (missing.empty() ? "" : ", ") + property.name;
+    if (missing.empty()) return "";
+    return "an object path of " + m_class->name + " also needs " + missing + " (nvrcim names " + m_class->name +
+           " shows whole paths)";
+}
+
+int Run::get()
+{
+    if (std::string missing = missing_keys(); !missing.empty()) return wrong(missing);
+    if (std::string unknown = unknown_property(); !unknown.empty()) return wrong(unknown);
+    Answer answer = m_server.get(m_path, wanted());
+    if (!answer.ok()) return failed(answer.status);
+    const Instance& instance = answer.instances.front();
+    if (m_options.json)
+        m_out << json_text({{"status", 0}, {"instance", to_json(instance)}});
+    else
+        m_out << property_list(instance, m_server.schema(), m_options.all);
+    return 0;
+}
+
+int Run::set()
+{
+    if (std::string missing = missing_keys(); !missing.empty()) return wrong(missing);
+    Instance instance;
+    instance.path = m_path;
+    instance.properties = m_path.keys;
+    std::vector<std::string> names;
+    for (const std::string& text : m_options.arguments) {
+        std::string name, value;
+        if (!split_argument(text, name, value)) return wrong(quote(text) + " is not property=value");
+        const Element_Record* property = m_class->property(name);
+        if (!property) return wrong(m_class->name + " has no property " + name);
+        if (property->key) return wrong(property->name + " is a key, and keys cannot change");
+        Argument_Parse argument = parse_argument(*property, value, m_server.schema(), m_path.name_space);
+        if (!argument.ok) return wrong(argument.error);
+        instance.set(property->name, argument.argument.value);
+        names.push_back(property->name);
+    }
+    Answer answer = names.size() == 1 ? m_server.set_property(m_path, names[0], instance.get(names[0]))
+                                      : m_server.modify(instance, names);
+    if (!answer.ok()) return failed(answer.status);
+    if (m_options.json) m_out << json_text({{"status", 0}});
+    for (const std::string& name : names)
+        if (!m_options.json)
+            m_out << m_class->name << "." << name << " = "
+                  << printable(value_text_with_number(m_class->property(name), instance.get(name))) << "\n";
+    return 0;
+}
+
+int Run::call()
+{
+    const Method_Record* method = m_class->method(m_options.method);
+    if (!method) {
+        std::string known;
+        for (const Method_Record& each : m_class->methods)
+            known += (known.empty() ? "" : ", ") + each.name;
+        return wrong(m_class->name + " has no method " + m_options.method +
+                     (known.empty() ? "; it has none at all" : "; it has " + known));
+    }
+    if (std::string missing = missing_keys(); !missing.empty() && !method->is_static) return wrong(missing);
+    std::vector<Named_Value> in;
+    for (const std::string& text : m_options.arguments) {
+        std::string name, value;
+        if (!split_argument(text, name, value)) return wrong(quote(text) + " is not name=value");
+        const Element_Record* parameter = method->find_parameter(name);
+        if (!parameter) return wrong(method->name + " has no parameter " + name);
+        if (!parameter->in) return wrong(parameter->name + " is an output of " + method->name);
+        Argument_Parse argument = parse_argument(*parameter, value, m_server.schema(), m_path.name_space);
+        if (!argument.ok) return wrong(argument.error);
+        in.push_back(argument.argument);
+    }
+    Answer answer = m_server.call(m_path, method->name, in);
+    if (!answer.ok()) return failed(answer.status);
+    if (m_options.json) {
+        Json out = Json::object();
+        for (const Named_Value& each : answer.out)
+            out[each.name] = to_json(each.value);
+        m_out << json_text({{"status", 0}, {"returnValue", to_json(answer.value)}, {"out", out}});
+        return 0;
+    }
+    Element_Record result;
+    result.words = method->words;
+    m_out << method->name << " returned " << printable(value_text_with_number(&result, answer.value)) << "\n";
+    for (const Named_Value& each : answer.out)
+        m_out << "  " << each.name << " = "
+              << printable(value_text_with_number(method->find_parameter(each.name), each.value)) << "\n";
+    return 0;
+}
+
+} // namespace
+
+std::string complaint(const Status& status)
+{
+    const std::string name = status_name(status.code) + " (" + std::to_string(status.code) + ")";
+    const std::string tail = status.message.empty() ? "" : ": " + status.message;
+    switch (status.fault) {
+    case Fault::request:
+        return "nvrcim: wrong request" + (tail.empty() ? ": " + name : tail);
+    case Fault::module:
+        return "nvrcim: the module fails" + tail;
+    case Fault::server:
+        return "nvrcim: the server fails" + tail;
+    default:
+        return "nvrcim: the provider answers " + name + tail;
+    }
+}
+
+int run_verb(Host& server, const Options& options, std::ostream& out, std::ostream& complaints)
+{
+    return Run(server, options, out, complaints).verb();
+}
+
+} // namespace host

@@ -1,0 +1,18 @@
+/// What nvrcim does: one request on a host, and its answer printed.
+#pragma once
+
+#include "host/Host.h"
+#include "host/command/Options.h"
+
+#include <ostream>
+
+namespace host {
+
+/// Runs the verb of the options on a server that has its module. Results go to `out`, complaints to `complaints`,
+/// each beginning with whose fault it is. The result is the exit status.
+int run_verb(Host& server, const Options& options, std::ostream& out, std::ostream& complaints);
+
+/// "nvrcim: the provider answered CMPI_RC_ERR_NOT_FOUND (6): ..." and so on.
+std::string complaint(const Status& status);
+
+} // namespace host

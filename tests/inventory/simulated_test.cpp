@@ -1,0 +1,166 @@
+// The inventory over the simulated adapters: whole hosts, missing libraries, damaged answers.
+
+#include <gmock/gmock.h>
+
+#include "foundation/NVR_MethodWrapper.h"
+#include "foundation/management_binding.h"
+#include "inventory/Adapter.h"
+#include "inventory/AdapterAttributes.h"
+#include "inventory/NVR_Data.h"
+#include "inventory/Port.h"
+#include "inventory/PortAttributes.h"
+#include "inventory/PortStatistics.h"
+#include "inventory/Target.h"
+#include "tests/support/log_capture.h"
+#include "tests/support/simulator.h"
+
+using namespace cimple;
+using namespace nvrtest;
+using testing::Contains;
+
+namespace {
+
+// What a scan found: "adapters/ports/targets".
+std::string scan(NVR_Data& data)
+{
+    data.buildAdapterData();
+    data.buildSANData();
+    std::size_t targets = 0;
+    for (Port* port : data.getPorts())
+        targets += port->getNumberOfTargets();
+    return std::to_string(data.getAdapters().size()) + "/" + std::to_string(data.getPorts().size()) + "/" +
+           std::to_string(targets);
+}
+
+struct Loaded {
+    Loaded() : result(loadLibraries()) {}
+    ~Loaded() { unloadLibraries(); }
+    int result;
+};
+
+} // namespace
+
+TEST(SimulatedHost, IsFoundWhole)
+{
+    Simulator sim;
+    Loaded libraries;
+    EXPECT_EQ(libraries.result, 0);
+    NVR_MethodWrapper session;
+    NVR_Data data;
+    EXPECT_EQ(scan(data), "1/1/3");
+    auto& attributes = dynamic_cast<FCAdapterAttributes&>(*data.getAdapters()[0]->getAttributes());
+    EXPECT_NE(attributes._KERNEL_VERSION, "");
+    EXPECT_NE(attributes._DeviceID, 0u);
+    auto* port = dynamic_cast<FCPort*>(data.getPorts()[0]);
+    EXPECT_EQ(port->portName(), sim.get("0", "wwpn"));
+    EXPECT_EQ(port->nodeName(), sim.get("0", "wwnn"));
+    EXPECT_NE(port->getTarget(2)->SerialNumber, "Unknown");
+    EXPECT_GT(port->getTarget(2)->LastBlock, 0u);
+    sim.set("0", "statistic:1040", 77);
+    EXPECT_EQ(dynamic_cast<FCPortStatistics&>(*port->getStatistics()).LinkFailures, 77u);
+    EXPECT_EQ(sim.open_handles(), 0u);
+}
+
+TEST(SimulatedHost, OfADataCentreIsFoundWhole)
+{
+    Simulator sim;
+    sim.load_shipped("typical");
+    Loaded libraries;
+    NVR_MethodWrapper session;
+    NVR_Data data;
+    EXPECT_EQ(scan(data), "4/4/64");
+}
+
+TEST(SimulatedHost, ShowsWhatChanged)
+{
+    Simulator sim;
+    Loaded libraries;
+    NVR_MethodWrapper session;
+    NVR_Data data;
+    EXPECT_EQ(scan(data), "1/1/3");
+    sim.set("0", "present", 0);
+    EXPECT_EQ(scan(data), "0/0/0");
+    sim.set("0", "present", 1);
+    EXPECT_EQ(scan(data), "1/1/3");
+}
+
+namespace {
+
+struct Variant {
+    const char* libraries;
+    int result;
+    bool session;
+    const char* found;
+};
+
+struct SimulatedLibraries : testing::TestWithParam<Variant> {};
+
+} // namespace
+
+TEST_P(SimulatedLibraries, ThatAreMissingCostWhatTheyMust)
+{
+    const Variant& variant = GetParam();
+    Simulator sim(Simulator::one_port, variant.libraries);
+    Loaded libraries;
+    EXPECT_EQ(libraries.result, variant.result);
+    if (variant.session)
+        EXPECT_NO_THROW(NVR_MethodWrapper());
+    else
+        EXPECT_THROW(NVR_MethodWrapper(), std::exception);
+    NVR_Data data;
+    EXPECT_EQ(scan(data), variant.found);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    EachVariant, SimulatedLibraries,
+    testing::Values(Variant{"rmapi-only", 1, true, "1/1/3"}, Variant{"rmapi-both-names", 1, true, "1/1/3"},
+                    Variant{"nothing", 1, false, "0/0/0"}, Variant{"hba-only", 1, false, "0/0/0"},
+                    Variant{"no-management", 0, false, "0/0/0"}, Variant{"no-tssdm", 1, true, "1/1/3"},
+                    Variant{"no-hba", 0, true, "0/0/0"}, Variant{"lrm-without-LRM_GetVPD", 0, true, "1/1/3"},
+                    Variant{"lrm-without-LRM_InitLib", 0, false, "1/1/3"},
+                    Variant{"hba-without-symbols", 0, true, "0/0/0"}, Variant{"hba-without-load", 0, true, "1/1/3"},
+                    Variant{"hba-without-mapping", 0, true, "1/1/0"}),
+    [](const auto& info) {
+        std::string name = info.param.libraries;
+        for (char& c : name)
+            if (!std::isalnum(static_cast<unsigned char>(c))) c = '_';
+        return name;
+    });
+
+namespace {
+
+struct SimulatedDamage : testing::TestWithParam<std::tuple<const char*, const char*>> {};
+
+} // namespace
+
+TEST_P(SimulatedDamage, EndsWithTheScan)
+{
+    const auto [operation, damage] = GetParam();
+    Simulator sim;
+    Loaded libraries;
+    NVR_MethodWrapper session;
+    NVR_Data data;
+    sim.fail(operation).damaged(damage);
+    scan(data);
+    for (Port* port : data.getPorts()) {
+        try {
+            port->getStatistics();
+        } catch (const std::exception&) {
+        }
+    }
+    EXPECT_GT(sim.calls(operation), 0u);
+    sim.clear_faults();
+    sim.fail(operation).counting(0xFFFFFFFF);
+    scan(data);
+    sim.clear_faults();
+    EXPECT_EQ(scan(data), "1/1/3");
+    EXPECT_EQ(sim.open_handles(), 0u);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    EachCall, SimulatedDamage,
+    testing::Combine(testing::Values("HBA_GetAdapterName", "HBA_OpenAdapter", "HBA_GetAdapterAttributes",
+                                     "HBA_GetAdapterPortAttributes", "HBA_GetFcpTargetMapping", "HBA_SendScsiInquiry",
+                                     "HBA_SendReadCapacity", "RM_GetHBAAttributes", "RM_GetPortAttributes",
+                                     "RM_GetPortStatistics", "RM_GetAttributeValue", "RM_GetDriverType"),
+                     testing::Values("garbage", "truncated", "ones", "zeros", "null", "unterminated")));
