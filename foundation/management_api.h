@@ -134,6 +134,16 @@ enum {
     RM_ATTR_PORT_STATE = 802        /* number, as HBA_PORTATTRIBUTES.PortState and 20, 21, 22 */
 };
 
+/* Of the block of RM_GetLunAttributes. */
+enum {
+    RM_LUN_DEVICE_TYPE = 1, /* number, as a standard inquiry has it */
+    RM_LUN_VENDOR = 2,      /* text */
+    RM_LUN_PRODUCT = 3,     /* text */
+    RM_LUN_REVISION = 4,    /* text */
+    RM_LUN_BLOCKS = 5,      /* 64 bits, 0 for a unit without capacity */
+    RM_LUN_BLOCK_SIZE = 6   /* number, bytes */
+};
+
 /* Of the block of RM_GetPortStatistics: 64-bit numbers, all ones for a counter that the hardware does not have. */
 enum {
     RM_STAT_FIRST = 1025,

@@ -295,12 +295,12 @@ uint32_t nvrsim_RM_GetLunAttributes(HBA_WWN host, HBA_WWN target, HBA_UINT64 lun
         const Target* found = target_of(port, target);
         const Lun* unit = found ? found->find(static_cast<uint64_t>(lun)) : nullptr;
         if (!unit) return found ? HBA_STATUS_ERROR_INVALID_LUN : static_cast<uint32_t>(RM_STATUS_ILLEGAL_WWN);
-        const Attributes attributes = {{1, encode32(unit->deviceType)},
-                                       {2, unit->vendor},
-                                       {3, unit->product},
-                                       {4, unit->revision},
-                                       {5, encode64(unit->blocks)},
-                                       {6, encode32(unit->blockSize)}};
+        const Attributes attributes = {{RM_LUN_DEVICE_TYPE, encode32(unit->deviceType)},
+                                       {RM_LUN_VENDOR, unit->vendor},
+                                       {RM_LUN_PRODUCT, unit->product},
+                                       {RM_LUN_REVISION, unit->revision},
+                                       {RM_LUN_BLOCKS, encode64(unit->blocks)},
+                                       {RM_LUN_BLOCK_SIZE, encode32(unit->blockSize)}};
         return call.block(build_block(attributes), block, size);
     });
 }

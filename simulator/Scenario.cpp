@@ -4,8 +4,6 @@
 
 #include <algorithm>
 #include <cstring>
-#include <fstream>
-#include <sstream>
 
 namespace nvrsim {
 
@@ -287,15 +285,6 @@ Scenario parse_scenario(const std::string& text, const std::string& name)
     } catch (const toml::parse_error& error) {
         scenario_fault(name, error.source(), std::string(error.description()));
     }
-}
-
-Scenario load_scenario(const std::string& path)
-{
-    std::ifstream file(path, std::ios::binary);
-    std::ostringstream text;
-    if (file) text << file.rdbuf();
-    if (!file || file.bad()) throw Scenario_Error(path + ":0: cannot read the file");
-    return parse_scenario(text.str(), path);
 }
 
 Fault parse_fault(const std::string& text)

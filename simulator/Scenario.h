@@ -23,7 +23,6 @@ struct Scenario {
 
 /// `name` stands in messages for the text's file. Throws Scenario_Error.
 Scenario parse_scenario(const std::string& text, const std::string& name);
-Scenario load_scenario(const std::string& path);
 
 /// A fault from the inside of a TOML inline table: `call = "RM_GetVPD", status = 7`. Throws Scenario_Error.
 Fault parse_fault(const std::string& text);

@@ -1,4 +1,4 @@
-// The faces as a process meets them: by name, with their symbols, over one state that outlives them.
+// The faces as a process meets them: by name, with their symbols, over one state.
 #include "Sim.h"
 
 #include <dlfcn.h>
@@ -68,7 +68,7 @@ TEST(Faces, NamesAreTheirSonames)
     }
 }
 
-TEST(Faces, StateIsOneForAllAndOutlivesTheirUnloading)
+TEST(Faces, StateIsOneForAll)
 {
     ASSERT_EQ(0, nvrsim_load_text("[[adapter]]", "test"));
     {

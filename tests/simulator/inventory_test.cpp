@@ -283,6 +283,9 @@ TEST_F(Inventory, LunListsAndLunsByTheManagementApi)
     EXPECT_EQ(0u, nvrsim_RM_ScsiReadCapacity(wire(port0), wire(target0), fcp_lun(2), response, 32, sense, 255));
     Block block(512);
     EXPECT_EQ(0u, nvrsim_RM_GetLunAttributes(wire(port0), wire(target0), fcp_lun(2), block.bytes.data(), &block.size));
+    uint64_t blocks = 0;
+    ASSERT_TRUE(block.read(RM_LUN_BLOCKS, blocks));
+    EXPECT_EQ(0x03000000u, blocks);
     std::vector<char> targets(RM_TARGETLIST_SIZE(3));
     auto* mapping = reinterpret_cast<RM_TARGETLIST*>(targets.data());
     mapping->count = 3;

@@ -81,6 +81,43 @@ TEST(Scenario, RefusedOneLeavesNoAdaptersAndTheLibraryDown)
     EXPECT_EQ(-1, nvrsim_load("/tmp")) << "a directory";
 }
 
+/// Each in a process of its own, since the environment is read at the first call.
+TEST(ScenarioOfTheEnvironment, BadOneIsToldOnStandardErrorAndTheLibraryIsDown)
+{
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(
+        {
+            setenv("NVRSIM_SCENARIO", "/no/such/host.toml", 1);
+            exit(nvrsim_RM_InitLib() == 1 && nvrsim_HBA_GetNumberOfAdapters() == 0 &&
+                         sim_text(nvrsim_error) == "/no/such/host.toml:0: cannot read the file"
+                     ? 0
+                     : 9);
+        },
+        testing::ExitedWithCode(0), "nvrsim: /no/such/host.toml:0: cannot read the file");
+}
+
+TEST(ScenarioOfTheEnvironment, IsReadAtTheFirstCall)
+{
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(
+        {
+            setenv("NVRSIM_SCENARIO", NVRSIM_SCENARIOS "/typical.toml", 1);
+            exit(static_cast<int>(nvrsim_HBA_GetNumberOfAdapters()));
+        },
+        testing::ExitedWithCode(4), "");
+}
+
+TEST(ScenarioOfTheEnvironment, WithoutOneTheHostHasNoAdapters)
+{
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(
+        {
+            unsetenv("NVRSIM_SCENARIO");
+            exit(nvrsim_RM_InitLib() == 0 && nvrsim_HBA_GetNumberOfAdapters() == 0 ? 0 : 9);
+        },
+        testing::ExitedWithCode(0), "");
+}
+
 TEST(Scenario, EmptyOneIsAHostWithoutAdapters)
 {
     ASSERT_EQ(0, nvrsim_load_text("", "empty"));
