@@ -1,0 +1,198 @@
+#include "tests/agent/Simulated_Host.h"
+
+#include <cerrno>
+#include <pthread.h>
+#include <unistd.h>
+
+#include "agent/Clock.h"
+#include "runtime/Instance.h"
+#include "simulator/nvrsim.h"
+#include "tests/support/private_host.h"
+
+namespace nvrtest {
+
+using namespace cimple;
+
+std::function<void(ProviderAgent&)> on_driver_log;
+bool no_more_threads = false;
+
+namespace {
+
+constexpr uint64 start_of_time = 1700000000000000;
+std::atomic<uint64> now{start_of_time};
+
+uint64 test_clock()
+{
+    return now;
+}
+
+uint32 driverLog(ProviderAgent& agent)
+{
+    if (on_driver_log) on_driver_log(agent);
+    return 0;
+}
+
+std::string scalar(const void* place, uint16 type)
+{
+    switch (type) {
+    case BOOLEAN:
+        return *static_cast<const bool*>(place) ? "true" : "false";
+    case UINT8:
+        return std::to_string(*static_cast<const uint8*>(place));
+    case UINT16:
+        return std::to_string(*static_cast<const uint16*>(place));
+    case UINT32:
+        return std::to_string(*static_cast<const uint32*>(place));
+    case SINT32:
+        return std::to_string(*static_cast<const sint32*>(place));
+    case UINT64:
+        return std::to_string(*static_cast<const uint64*>(place));
+    case STRING:
+        return static_cast<const String*>(place)->c_str();
+    default:
+        return "?";
+    }
+}
+
+} // namespace
+
+void advance_clock(uint64 usec)
+{
+    now += usec;
+}
+
+SimulatedHost::SimulatedHost()
+{
+    agent_clock = &test_clock;
+    on_driver_log = nullptr;
+    no_more_threads = false;
+    install();
+    scenario("[[adapter]]\n[[target]]\nluns = 2\n");
+    CLogger::instance()->enable();
+    log.reset(new Log_Capture);
+}
+
+SimulatedHost::~SimulatedHost()
+{
+    log.reset();
+}
+
+void SimulatedHost::install(const std::vector<std::string>& only)
+{
+    for (const char* name : {"HBAAPI", "lrmapi", "rmapi", "tssdm"}) {
+        const std::string file = std::string("/lib") + name + ".so";
+        remove(library_folder() + file);
+        // A file that is no library keeps the loader from one that the machine may have.
+        if (std::find(only.begin(), only.end(), name) == only.end())
+            write_file(library_folder() + file, "no library");
+        else
+            link(NVRSIM_LIB_DIR + file, library_folder() + file);
+    }
+}
+
+void SimulatedHost::scenario(const std::string& toml)
+{
+    char reason[512] = {};
+    if (nvrsim_load_text(toml.c_str(), "test") != 0) nvrsim_error(reason, sizeof reason);
+    ASSERT_STREQ(reason, "");
+}
+
+void SimulatedHost::fault(const std::string& table)
+{
+    char reason[512] = {};
+    if (nvrsim_fault(table.c_str()) <= 0) nvrsim_error(reason, sizeof reason);
+    ASSERT_STREQ(reason, "");
+}
+
+int SimulatedHost::load()
+{
+    return ProviderAgent::load();
+}
+
+void SimulatedHost::unload()
+{
+    ProviderAgent::unload();
+}
+
+void SimulatedHost::settle()
+{
+    while (agent().m_bDataFetchRunning)
+        usleep(1000);
+}
+
+void SimulatedHost::refresh()
+{
+    agent().m_bAdapterRefreshPending.ask();
+    agent().BuildCimpleInfo();
+    settle();
+}
+
+SimulatedHost::Instances SimulatedHost::plain(const Instance_Map& map)
+{
+    Instances all;
+    enumeratePlain(agent(), map, {collect, &all});
+    settle();
+    return all;
+}
+
+SimulatedHost::Instances SimulatedHost::san(const Instance_Map& map)
+{
+    Instances all;
+    enumerateSAN(agent(), map, {collect, &all});
+    settle();
+    return all;
+}
+
+std::vector<std::string> SimulatedHost::words()
+{
+    std::vector<std::string> all = log->words();
+    CLogger::Hold hold;
+    log->clear();
+    return all;
+}
+
+bool collect(Instance* instance, int status, void* data)
+{
+    EXPECT_EQ(status, 0);
+    static_cast<std::vector<Ref<Instance>>*>(data)->emplace_back(instance);
+    return true;
+}
+
+std::string value(const Instance* instance, const char* name)
+{
+    const Meta_Feature* feature = find_feature(instance->meta_class, name, META_FLAG_PROPERTY);
+    if (!feature) return "no such property";
+    const Meta_Property* property = as_property(feature);
+    if (null_of(instance, property)) return "null";
+    if (property->subscript == 0) return scalar(feature_at(instance, property->offset), property->type);
+    const Array_Base& array = array_of(instance, property);
+    std::string text;
+    for (std::size_t i = 0; i < array.size(); i++)
+        text += (i ? "," : "") + scalar(array.at(i), property->type);
+    return "{" + text + "}";
+}
+
+std::string end(const Instance* association, const char* reference, const char* property)
+{
+    const Meta_Feature* feature = find_feature(association->meta_class, reference, META_FLAG_REFERENCE);
+    if (!feature) return "no such reference";
+    const Instance* target = reference_of(association, as_reference(feature));
+    return target ? value(target, property) : "null";
+}
+
+} // namespace nvrtest
+
+namespace cimple {
+
+const Agent_Builders agent_builders = {nullptr, nullptr, nullptr, &nvrtest::driverLog, nullptr, nullptr, nullptr};
+
+} // namespace cimple
+
+// The linker sends every call of pthread_create in this program here.
+extern "C" int __real_pthread_create(pthread_t*, const pthread_attr_t*, void* (*)(void*), void*);
+extern "C" int __wrap_pthread_create(pthread_t* thread, const pthread_attr_t* attributes, void* (*procedure)(void*),
+                                     void* argument)
+{
+    if (nvrtest::no_more_threads) return EAGAIN;
+    return __real_pthread_create(thread, attributes, procedure, argument);
+}

@@ -1,0 +1,75 @@
+/// The agent over the simulated libraries: what the tests of this room stand on.
+///
+/// Each test has a process and an /etc of its own. The trace holds the log's words since the last agent began; the
+/// agent's clock is the test's.
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include "agent/Agent_Builders.h"
+#include "agent/ProviderAgent.h"
+#include "agent/enumerate.h"
+#include "tests/support/log_capture.h"
+
+namespace nvrtest {
+
+using cimple::Instance;
+using cimple::Ref;
+
+/// What the refresh reaches on higher floors: nothing, until a test says so.
+extern std::function<void(cimple::ProviderAgent&)> on_driver_log;
+
+/// True: the next threads cannot be created.
+extern bool no_more_threads;
+
+/// Simulated minutes go by.
+void advance_clock(cimple::uint64 usec);
+constexpr cimple::uint64 second = 1000000;
+constexpr cimple::uint64 minute = 60 * second;
+
+class SimulatedHost : public testing::Test {
+protected:
+    SimulatedHost();
+    ~SimulatedHost() override;
+
+    /// The simulator's folder of libraries becomes the loader's first; `only` names the faces that are there.
+    static void install(const std::vector<std::string>& only = {"HBAAPI", "lrmapi", "rmapi", "tssdm"});
+    /// Loads a scenario text.
+    static void scenario(const std::string& toml);
+    static void fault(const std::string& table);
+
+    /// One provider's load and unload.
+    int load();
+    void unload();
+    cimple::ProviderAgent& agent() { return *cimple::ProviderAgent::GetInstance(); }
+
+    /// Enumerates as a provider of the map's class does, and waits for what it started.
+    using Instances = std::vector<Ref<Instance>>;
+    Instances plain(const cimple::Instance_Map& map);
+    Instances san(const cimple::Instance_Map& map);
+    /// Waits until no refresh runs.
+    void settle();
+    /// A whole refresh of the adapter side, as a change of the hardware asks for it.
+    void refresh();
+
+    /// The log's words so far, and forgets them.
+    std::vector<std::string> words();
+
+    std::unique_ptr<Log_Capture> log;
+};
+
+/// The value of a property as text: arrays as "{a,b}", null as "null".
+std::string value(const Instance* instance, const char* property);
+/// The same of a key of the end that a reference names.
+std::string end(const Instance* association, const char* reference, const char* property);
+
+bool collect(Instance* instance, int status, void* data);
+
+constexpr const char* first_wwpn = "10000000C9A00001";
+
+} // namespace nvrtest

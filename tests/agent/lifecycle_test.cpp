@@ -1,0 +1,201 @@
+#include <atomic>
+#include <thread>
+#include <unistd.h>
+
+#include "foundation/NVR_MethodWrapper.h"
+#include "inventory/NVR_Data.h"
+#include "simulator/nvrsim.h"
+#include "tests/agent/Simulated_Host.h"
+#include "tests/support/private_host.h"
+
+using namespace cimple;
+using namespace nvrtest;
+using testing::Contains;
+using testing::Not;
+
+namespace {
+
+class Lifecycle : public SimulatedHost {};
+
+std::string guard_name()
+{
+    return "/dev/shm/sem.NVR_RM_INIT_LIB_" + std::to_string(getpid());
+}
+
+} // namespace
+
+TEST_F(Lifecycle, TheFirstLoadBuildsTheAgentAndTheLastUnloadEndsIt)
+{
+    ASSERT_EQ(load(), 0);
+    EXPECT_TRUE(agent().m_bLoaded);
+    const std::string loaded = "Norvane Provider v2.5.19-1 Loaded[" + std::to_string(getpid()) + "]";
+    EXPECT_THAT(words(), contains_in_order({"Initializing RM API ", "Constructor", "RMLIB initialized",
+                                            "Initializing Data Pointer ", "Data Pointer Constructed.", loaded,
+                                            "ProviderAgent::addRef[0]"}));
+    ASSERT_EQ(load(), 0);
+    unload();
+    EXPECT_TRUE(exists(guard_name()));
+    EXPECT_THAT(words(), Not(Contains("Entering the function ~ProviderAgent()")));
+    unload();
+    EXPECT_THAT(words(),
+                contains_in_order({"ProviderAgent::releaseRef[1]", "Entering the function ~ProviderAgent()",
+                                   "Deleting Data pointer", "Data Pointer deleted.", "MethodWrapper", "Destructor",
+                                   "RMLIB uninitialzed", "Entered ClearMaps()", "PERF: Entered clearAdapterMaps()",
+                                   "Exiting clearAdapterMaps()", "PERF: Entered clearDriverMaps: Entry",
+                                   "PERF: Entered clearSANMaps()", "Exiting clearSANMaps()", "Exiting ClearMaps()",
+                                   "Norvane Provider Unloaded"}));
+    EXPECT_FALSE(exists(guard_name()));
+    EXPECT_THAT(read_file("/etc/norvane_fc_provider.conf"), testing::HasSubstr("NVR_PROVIDER_CACHE_TIMEOUT = 10"));
+}
+
+TEST_F(Lifecycle, TheDestructorWaitsForNothingWhereNoRefreshRan)
+{
+    ASSERT_EQ(load(), 0);
+    unload();
+    EXPECT_THAT(words(), Not(Contains("PERF: Waiting for m_bIsAdapterDataReady")));
+}
+
+TEST_F(Lifecycle, SettingsComeFromTheFileAndGoBackToIt)
+{
+    write_file("/etc/norvane_fc_provider.conf", "NVR_PROVIDER_CACHE_TIMEOUT = 7\nNVR_PROVIDER_REFRESH_SANDATA = FALSE\n"
+                                                "NVR_PROVIDER_REFRESH_ADAPTERDATA = TRUE\n");
+    errno = 0;
+    ASSERT_EQ(load(), 0);
+    EXPECT_EQ(agent().m_cacheTimeout, 7u);
+    EXPECT_FALSE(agent().m_bRefreshSANData);
+    EXPECT_TRUE(agent().m_bRefreshAdapterData);
+    agent().m_config.setCacheTimeout(8);
+    unload();
+    EXPECT_THAT(read_file("/etc/norvane_fc_provider.conf"), testing::HasSubstr("NVR_PROVIDER_CACHE_TIMEOUT = 8"));
+}
+
+TEST_F(Lifecycle, OnlyTheCallersStaleErrnoDecidesAboutTheSettingsFile)
+{
+    write_file("/etc/norvane_fc_provider.conf", "NVR_PROVIDER_CACHE_TIMEOUT = 7\n");
+    errno = ENOENT;
+    ASSERT_EQ(load(), 0);
+    EXPECT_EQ(agent().m_cacheTimeout, 10u);
+    unload();
+}
+
+TEST_F(Lifecycle, AMissingManagementLibraryRefusesEveryLoadAndTheNextAgentRecovers)
+{
+    install({"HBAAPI", "tssdm"});
+    EXPECT_EQ(load(), 30);
+    EXPECT_THAT(words(), Contains("Norvane CIM Provider load failure"));
+    EXPECT_FALSE(agent().m_bLoaded);
+    EXPECT_EQ(load(), 30);
+    unload();
+    EXPECT_THAT(words(), Not(Contains("Entering the function ~ProviderAgent()")));
+    install();
+    EXPECT_EQ(load(), 30); // the same agent, since one provider still holds it
+    unload();
+    unload();
+    EXPECT_THAT(words(), contains_in_order({"ProviderAgent::releaseRef[0]", "Entering the function ~ProviderAgent()",
+                                            "Norvane Provider Unloaded"}));
+    log.reset(new Log_Capture);
+    EXPECT_EQ(load(), 0);
+    EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
+    unload();
+}
+
+TEST_F(Lifecycle, AnAgentThatFailedToLoadEnumeratesNothingAndHangsNobody)
+{
+    install({"HBAAPI", "tssdm"});
+    ASSERT_EQ(load(), 30);
+    EXPECT_TRUE(plain(agent().m_NVRHBA_FCPort_map).empty());
+    EXPECT_TRUE(san(agent().m_NVRHBA_StorageVolume_map).empty());
+    EXPECT_THAT(words(),
+                contains_in_order({"PERF: ---BuildCimpleInfo BEGIN---",
+                                   "Norvane Provider dependent library load has failed..do nothing is the only option",
+                                   "PERF: DataFetch_Handler Thread BEGIN", "PERF: Building Adapter Data...",
+                                   "PERF: DataFetch_Handler Thread END"}));
+    unload();
+}
+
+TEST_F(Lifecycle, AnUnloadWithoutALoadNeverCountsBelowZero)
+{
+    unload();
+    unload();
+    EXPECT_EQ(words(), (std::vector<std::string>{"ProviderAgent::releaseRef[0]", "ProviderAgent::releaseRef[0]"}));
+    ASSERT_EQ(load(), 0);
+    unload();
+    EXPECT_THAT(words(), Contains("Norvane Provider Unloaded"));
+}
+
+TEST_F(Lifecycle, TenRoundsEachLoadBindAndShowThePortAgain)
+{
+    for (int round = 0; round < 10; round++) {
+        ASSERT_EQ(load(), 0);
+        EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
+        EXPECT_EQ(san(agent().m_NVRHBA_SCSIProtocolEndpoint_map).size(),
+                  agent().m_NVRHBA_SCSIProtocolEndpoint_map.size());
+        unload();
+        EXPECT_EQ(nvrsim_open_handles(), 0u);
+        EXPECT_FALSE(exists(guard_name()));
+        log.reset(new Log_Capture);
+    }
+}
+
+TEST_F(Lifecycle, TheLastReleaseWaitsForARunningRefresh)
+{
+    fault("call = \"HBA_GetAdapterAttributes\", delay_ms = 200");
+    ASSERT_EQ(load(), 0);
+    agent().BuildCimpleInfo();
+    unload();
+    EXPECT_THAT(words(), contains_in_order({"PERF: Clearing the previous thread...with join",
+                                            "PERF: DataFetch_Handler Thread END",
+                                            "Entering the function ~ProviderAgent()", "Norvane Provider Unloaded"}));
+}
+
+TEST_F(Lifecycle, ALoadDuringTheLastReleaseKeepsTheAgent)
+{
+    fault("call = \"HBA_GetAdapterAttributes\", delay_ms = 300");
+    ASSERT_EQ(load(), 0);
+    agent().BuildCimpleInfo();
+    ProviderAgent* before = &agent();
+    std::thread last([this] { unload(); });
+    usleep(100000);
+    ASSERT_EQ(load(), 0); // not held up by the release that waits
+    last.join();
+    EXPECT_EQ(&agent(), before);
+    EXPECT_THAT(words(), Not(Contains("Entering the function ~ProviderAgent()")));
+    EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
+    unload();
+    EXPECT_THAT(words(), Contains("Norvane Provider Unloaded"));
+}
+
+TEST_F(Lifecycle, ManyThreadsLoadAndUnloadAtOnce)
+{
+    std::atomic<int> refused{0};
+    std::vector<std::thread> threads;
+    for (int i = 0; i < 8; i++)
+        threads.emplace_back([&] {
+            for (int round = 0; round < 5; round++) {
+                if (load() != 0) refused++;
+                std::vector<Ref<Instance>> all;
+                enumeratePlain(agent(), agent().m_NVRHBA_FCPort_map, {collect, &all});
+                EXPECT_EQ(all.size(), 1u);
+                unload();
+            }
+        });
+    for (std::thread& thread : threads)
+        thread.join();
+    EXPECT_EQ(refused, 0);
+    EXPECT_EQ(nvrsim_open_handles(), 0u);
+    EXPECT_FALSE(exists(guard_name()));
+}
+
+TEST_F(Lifecycle, AThreadThatCannotBeCreatedLeavesEmptyAnswersAndTheNextCallTriesAgain)
+{
+    ASSERT_EQ(load(), 0);
+    no_more_threads = true;
+    EXPECT_TRUE(plain(agent().m_NVRHBA_FCPort_map).empty());
+    EXPECT_TRUE(san(agent().m_NVRHBA_StorageVolume_map).empty());
+    EXPECT_FALSE(agent().m_bDataFetchRunning);
+    no_more_threads = false;
+    agent().BuildCimpleInfo();
+    settle();
+    EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
+    unload();
+}
