@@ -2,10 +2,10 @@
 
 #include <cassert>
 #include <cerrno>
-#include <cxxabi.h>
 #include <memory>
 #include <new>
 
+#include "runtime/Forced_Unwind.h"
 #include "runtime/Thread_Context.h"
 
 namespace cimple {
@@ -89,9 +89,8 @@ void quietly(Action action)
 {
     try {
         action();
-    } catch (const abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (is_forced_unwind()) throw;
     }
 }
 
