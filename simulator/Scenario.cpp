@@ -161,9 +161,11 @@ private:
     void add_lun(Target& target, uint32_t number, const toml::table& table, Lun_Numbers& numbers)
     {
         Lun lun = default_lun(target, number);
-        Fields fields(m_file, table, m_lunDefaults);
-        read_lun(fields, lun);
-        fields.refuse_unknown();
+        if (&table != &m_nothing || m_lunDefaults) { // plain units, of which there can be many, are as they are
+            Fields fields(m_file, table, m_lunDefaults);
+            read_lun(fields, lun);
+            fields.refuse_unknown();
+        }
         const auto [place, isNew] = numbers.emplace(number, target.luns.size());
         if (isNew)
             target.luns.push_back(std::move(lun));

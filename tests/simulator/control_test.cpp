@@ -51,7 +51,7 @@ protected:
         ASSERT_NE(nullptr, std::getenv("NVRSIM_SOCKET"));
         Simulated::SetUp();
     }
-    void TearDown() override { unlink(socket_path().c_str()); }
+    static void TearDownTestSuite() { unlink(socket_path().c_str()); }
 };
 
 TEST_F(Control, SocketBelongsToItsOwnerAlone)
