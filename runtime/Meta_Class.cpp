@@ -4,8 +4,8 @@
 
 namespace cimple {
 
-// The generated records and the records of other languages' tools rely on these places. The tail padding of a base
-// takes a derived record's first member, which is what puts return_type directly behind size.
+// The places that the records promise. The tail padding of a base takes a derived record's first member, which is what
+// puts return_type directly behind size, and locals at the next multiple of a pointer.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Winvalid-offsetof"
 static_assert(offsetof(Meta_Feature, refs) == 0);

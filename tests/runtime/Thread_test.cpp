@@ -234,6 +234,14 @@ TEST_F(ThreadsUnderAContext, HooksThatThrowEndNothingButTheThread)
     expect_attached_once();
 }
 
+TEST_F(ThreadsUnderAContext, AHookThatThrowsDoesNotStopAnExit)
+{
+    context.exit_throws = true;
+    int value = 0;
+    EXPECT_EQ(run_joined([](void* arg) -> void* { Thread::exit(arg); }, &value), &value);
+    expect_attached_once();
+}
+
 TEST_F(ThreadsUnderAContext, RunDetachedToTheirEnd)
 {
     static std::atomic<int> arrived;
