@@ -41,7 +41,7 @@ MI_Table_Set* tables_of(const MI* mi)
     return mi ? static_cast<MI_Table_Set*>(const_cast<void*>(mi->hdl)) : nullptr;
 }
 
-/// `steps(adapter)` gives an Outcome (or throws); what it throws becomes CMPI_RC_ERR_FAILED.
+/// `steps()` gives the code; what it throws becomes CMPI_RC_ERR_FAILED.
 template <class Steps>
 CMPIStatus guarded(Steps steps)
 {
@@ -54,7 +54,7 @@ CMPIStatus guarded(Steps steps)
     }
 }
 
-/// The frame; `steps(adapter)` gives the Outcome.
+/// The frame itself; `steps(adapter)` gives the Outcome.
 template <class MI, class Steps>
 CMPIStatus operate(const MI* mi, const CMPIContext* context, const char* label, Steps steps)
 {

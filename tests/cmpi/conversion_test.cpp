@@ -27,7 +27,6 @@ protected:
     {
         Made<CMPIInstance> made;
         EXPECT_EQ(make_CMPI_instance(&broker.cmpi, thing, "root/test", nullptr, properties, made), 0);
-        fake::Value copy = fake::embedded({});
         if (made) {
             CMPIResult* result = broker.result();
             result->ft->returnInstance(result, made.get());
@@ -239,9 +238,7 @@ TEST_F(Conversion, WhatGoesOutComesBackTheSame)
     elements_left = 6;
     Ref<TEST_Thing> back = in(made.properties);
     set_name_space_recursive(thing.get(), "root/test", true);
-    unref(thing->Other->Label.null ? nullptr : clone(thing->Other)); // a reference brings its keys alone:
-    nullify_properties(thing->Other, false, true, 1);
-    thing->Other->Label.value = String();
+    thing->Other->Label = {String(), 1}; // a reference brings its keys alone
     EXPECT_TRUE(identical(thing.get(), back.get()));
 }
 

@@ -97,12 +97,16 @@ const Meta_Reference link_dependent = REFERENCE(TEST_Link, Dependent, TEST_Part,
 const Meta_Property link_note = SCALAR(TEST_Link, Note, STRING, 0);
 const Meta_Feature* const link_features[] = {&link_antecedent, &link_dependent, &link_note};
 
+const Meta_Reference pair_left = REFERENCE(TEST_Pair, Left, TEST_Base, key);
+const Meta_Reference pair_right = REFERENCE(TEST_Pair, Right, TEST_Base, key);
+const Meta_Feature* const pair_features[] = {&pair_left, &pair_right};
+
 const Meta_Property event_text = SCALAR(TEST_Event, Text, STRING, 0);
 const Meta_Property event_notes = ARRAY(TEST_Event, Notes, STRING, 0);
 const Meta_Feature* const event_features[] = {&event_text, &event_notes};
 
-const Meta_Class* const classes[] = {&TEST_Base::meta, &TEST_Part::meta, &TEST_Thing::meta, &TEST_Link::meta,
-                                     &TEST_Event::meta};
+const Meta_Class* const classes[] = {&TEST_Base::meta, &TEST_Part::meta, &TEST_Thing::meta,
+                                     &TEST_Link::meta, &TEST_Pair::meta, &TEST_Event::meta};
 
 template <class T>
 void give(Property<T>& place, const T& value)
@@ -113,7 +117,7 @@ void give(Property<T>& place, const T& value)
 
 } // namespace
 
-const Meta_Repository test_repository = {classes, 5};
+const Meta_Repository test_repository = {classes, 6};
 
 const Meta_Class TEST_Base::meta = {
     {HEAD(META_FLAG_CLASS, "TEST_Base"), RECORD(TEST_Base, base_features, 1)}, locals, nullptr, 1, &test_repository};
@@ -125,6 +129,11 @@ const Meta_Class TEST_Thing::meta = {{HEAD(META_FLAG_CLASS, "TEST_Thing"), RECOR
                                      2,
                                      &test_repository};
 const Meta_Class TEST_Link::meta = {{HEAD(META_FLAG_ASSOCIATION, "TEST_Link"), RECORD(TEST_Link, link_features, 3)},
+                                    locals,
+                                    nullptr,
+                                    2,
+                                    &test_repository};
+const Meta_Class TEST_Pair::meta = {{HEAD(META_FLAG_ASSOCIATION, "TEST_Pair"), RECORD(TEST_Pair, pair_features, 2)},
                                     locals,
                                     nullptr,
                                     2,

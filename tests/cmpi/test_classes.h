@@ -1,7 +1,8 @@
 /// A few classes with hand-written records, and a provider for them that a test scripts.
 ///
 /// TEST_Base (key Name) < TEST_Thing (key Number, a property of most types, methods); TEST_Part (key Id);
-/// TEST_Link, an association of a TEST_Base and a TEST_Part; TEST_Event, an indication.
+/// TEST_Link, an association of a TEST_Base and a TEST_Part; TEST_Pair, one of two TEST_Base; TEST_Event, an
+/// indication.
 #pragma once
 
 #include <atomic>
@@ -70,6 +71,12 @@ struct TEST_Link : Instance {
     TEST_Base* Antecedent;
     TEST_Part* Dependent;
     Property<String> Note;
+    static const Meta_Class meta;
+};
+
+struct TEST_Pair : Instance {
+    TEST_Base* Left;
+    TEST_Base* Right;
     static const Meta_Class meta;
 };
 
