@@ -1,7 +1,7 @@
 /// Runs a step whose exceptions end there: true if it ran through. Forced unwinding (a cancelled thread) goes on.
 #pragma once
 
-#include <cxxabi.h>
+#include "runtime/Forced_Unwind.h"
 
 namespace cimple {
 
@@ -11,9 +11,8 @@ bool guarded(Step step)
     try {
         step();
         return true;
-    } catch (abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (is_forced_unwind()) throw;
         return false;
     }
 }

@@ -1,5 +1,4 @@
 // The rebuild of all adapter-side maps: the order of its steps, and how each kind of failure ends it.
-#include <cxxabi.h>
 
 #include "agent/Adapter_Update.h"
 #include "agent/Agent_Builders.h"
@@ -7,6 +6,7 @@
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
 #include "inventory/NVR_Data.h"
+#include "runtime/Forced_Unwind.h"
 
 namespace cimple {
 
@@ -78,9 +78,8 @@ uint32 ProviderAgent::updateAdapterMaps()
         buildHigherFloors(*this);
     } catch (const Update_Ended&) {
         return NVR_FAILURE;
-    } catch (abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (is_forced_unwind()) throw;
         NVR_LOG("No FC card found");
         if (m_CIM_ComputerSystem_map.empty()) return NVR_FAILURE;
     }

@@ -3,12 +3,12 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <cxxabi.h>
 #include <new>
 
 #include "cmpi/CMPI_Thread_Context.h"
 #include "cmpi/operation.h"
 #include "cmpi/operations.h"
+#include "runtime/Forced_Unwind.h"
 
 namespace cimple {
 
@@ -195,9 +195,8 @@ extern "C" int cimple_cmpi_adapter(char, MI_Table_Set* tables, Registration* reg
         log_enter("cimple_cmpi_adapter");
         if (void* mi = mi_of(tables, kind)) *result = mi;
         log_return("cimple_cmpi_adapter");
-    } catch (abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (is_forced_unwind()) throw;
         *result = nullptr;
     }
     return 0;

@@ -1,12 +1,12 @@
 #include "cmpi/CMPI_Containers.h"
 
 #include <cstdlib>
-#include <cxxabi.h>
 #include <strings.h>
 
 #include "cmpi/cmpi_call.h"
 #include "cmpi/cmpi_data.h"
 #include "cmpi/warnings.h"
+#include "runtime/Forced_Unwind.h"
 
 namespace cimple {
 
@@ -175,9 +175,8 @@ int CMPIInstance_Container::read(std::size_t index, CMPIString*& name, CMPIData&
         data = ask(status, m_instance, &CMPIInstanceFT::getPropertyAt, static_cast<CMPICount>(index), &name);
         if (status.rc == CMPI_RC_OK) return 0;
         CONVERSION_WARN("CMGetPropertyAt() failed");
-    } catch (abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (is_forced_unwind()) throw;
         CONVERSION_WARN("CMGetPropertyAt() threw exception: index=%u size=%u", static_cast<unsigned>(index),
                         static_cast<unsigned>(get_size()));
     }

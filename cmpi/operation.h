@@ -6,11 +6,10 @@
 /// touches nothing.
 #pragma once
 
-#include <cxxabi.h>
-
 #include "cmpi/CMPI_Adapter.h"
 #include "cmpi/CMPI_Thread_Context.h"
 #include "cmpi/status.h"
+#include "runtime/Forced_Unwind.h"
 #include "runtime/log.h"
 
 namespace cimple {
@@ -47,9 +46,8 @@ CMPIStatus guarded(Steps steps)
 {
     try {
         return status_of(steps());
-    } catch (abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (is_forced_unwind()) throw;
         return status_of(CMPI_RC_ERR_FAILED);
     }
 }

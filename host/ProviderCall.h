@@ -5,7 +5,7 @@
 #include "host/Host.h"
 
 #include <cmpift.h>
-#include <cxxabi.h>
+#include <exception>
 
 #include <string>
 
@@ -22,9 +22,8 @@ Status guard(Broker& broker, const std::string& what, Call call)
     try {
         call();
         return {};
-    } catch (abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (!std::current_exception()) throw; // the thread is being ended
         broker.violation("an exception came out of " + what);
         return {CMPI_RC_ERR_FAILED, "an exception came out of " + what, Fault::module};
     }

@@ -1,9 +1,8 @@
 /// The inventory's catch-alls: a part of the tree that fails costs only itself.
 #pragma once
 
-#include <cxxabi.h>
-
 #include "foundation/CLogger.h"
+#include "runtime/Forced_Unwind.h"
 
 namespace cimple {
 
@@ -15,9 +14,8 @@ bool attempt(Body body, Words words)
     try {
         body();
         return true;
-    } catch (abi::__forced_unwind&) {
-        throw;
     } catch (...) {
+        if (is_forced_unwind()) throw;
         words();
         return false;
     }
