@@ -5,8 +5,8 @@
 #include "host/Host.h"
 
 #include <cmpift.h>
-#include <exception>
 
+#include <exception>
 #include <string>
 
 namespace host {

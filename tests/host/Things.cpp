@@ -2,6 +2,7 @@
 
 #include <map>
 #include <mutex>
+#include <stdexcept>
 
 namespace {
 
@@ -23,6 +24,11 @@ extern "C" __attribute__((visibility("default"))) long test_setting(const char* 
     std::lock_guard lock(mutex);
     auto found = settings.find(name);
     return found == settings.end() ? 0 : found->second;
+}
+
+extern "C" __attribute__((visibility("default"))) void test_throw()
+{
+    throw std::runtime_error("thrown by a test");
 }
 
 namespace things {

@@ -116,6 +116,18 @@ TEST_P(Misbehaviour, AnOkWithoutAnInstanceBecomesAFailure)
     EXPECT_EQ("the provider answered OK without an instance", answer.status.message);
 }
 
+TEST_P(Misbehaviour, AnExceptionEndsTheRequestAndNotTheServer)
+{
+    things::set("throw", 1);
+    Answer answer = enumerate();
+    EXPECT_EQ(1, answer.status.code);
+    EXPECT_EQ("an exception came out of enumerateInstances", answer.status.message);
+    EXPECT_EQ(Fault::module, answer.status.fault);
+    EXPECT_THAT(violations(), ElementsAre("an exception came out of enumerateInstances"));
+    things::set("throw", 0);
+    EXPECT_EQ(3u, enumerate().instances.size());
+}
+
 TEST_P(Misbehaviour, AnyStatusComesThroughAsItIs)
 {
     for (int code : {2, 7, 61, 100, 4711}) {

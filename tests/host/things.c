@@ -12,8 +12,10 @@
 
 __attribute__((weak)) void test_event(const char* text);
 __attribute__((weak)) long test_setting(const char* name);
+__attribute__((weak)) void test_throw(void);
 
-static const CMPIBroker* broker;
+/* Each factory writes it, while other providers of the module may be running. */
+static const CMPIBroker* _Atomic broker;
 
 static void event(const char* format, const char* a, const char* b, long n)
 {
@@ -236,6 +238,7 @@ static CMPIStatus enumerate(CMPIInstanceMI* mi, const CMPIContext* ctx, const CM
     (void)ctx;
     event("%s %s %ld", class_of(mi->hdl), "enumerate on another thread", 0);
     if (setting("sleep_ms")) usleep((useconds_t)setting("sleep_ms") * 1000);
+    if (setting("throw") && test_throw) test_throw();
     if (setting("return_wrong_kind")) {
         CMPIObjectPath* path = make_path(name_space_of(op), class_of(mi->hdl), 1);
         rslt->ft->returnObjectPath(rslt, path);
