@@ -5,6 +5,7 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
+#include <cstdio>
 
 namespace host {
 namespace {
@@ -135,6 +136,14 @@ std::string inline_text(const Instance& instance)
     return instance.path.class_name + " {" + text + "}";
 }
 
+/// A fabric address as people of the field write it: domain, area and port in hexadecimal.
+std::string address_text(std::uint64_t address)
+{
+    char text[24];
+    std::snprintf(text, sizeof text, "0x%06llX", static_cast<unsigned long long>(address));
+    return text;
+}
+
 std::string joined(const Element_Record* property, const Value& value,
                    std::string (*text)(const Element_Record*, const Value&))
 {
@@ -175,6 +184,7 @@ std::string value_text(const Element_Record* property, const Value& value)
     if (const Instance* instance = value.as_instance()) return inline_text(*instance);
     if (property && (same_name(property->name, "Speed") || same_name(property->name, "MaxSpeed")))
         return speed_text(value.as_uint());
+    if (property && same_name(property->name, "FCID")) return address_text(value.as_uint());
     return value.to_text();
 }
 

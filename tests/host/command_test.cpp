@@ -120,6 +120,17 @@ TEST(CommandViews, NoTableIsWiderThanThePage)
     EXPECT_GT(count, 20) << "null properties too";
 }
 
+TEST(CommandViews, SpeedsAndFabricAddressesReadAsInTheField)
+{
+    Element_Record property;
+    property.name = "FCID";
+    EXPECT_EQ("0x010100", value_text(&property, Value::uint32(65792)));
+    property.name = "Speed";
+    EXPECT_EQ("16 Gbit/s", value_text(&property, Value::uint64(16000000000)));
+    EXPECT_EQ("-", value_text(&property, Value::uint64(0)));
+    EXPECT_EQ("1234 bit/s", value_text(&property, Value::uint64(1234)));
+}
+
 TEST(CommandViews, JsonKeepsNumbersAndReplacesBrokenText)
 {
     Instance instance;
