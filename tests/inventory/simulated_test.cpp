@@ -11,12 +11,11 @@
 #include "inventory/PortAttributes.h"
 #include "inventory/PortStatistics.h"
 #include "inventory/Target.h"
-#include "tests/support/log_capture.h"
+#include "tests/support/private_host.h"
 #include "tests/support/simulator.h"
 
 using namespace cimple;
 using namespace nvrtest;
-using testing::Contains;
 
 namespace {
 
@@ -82,6 +81,22 @@ TEST(SimulatedHost, ShowsWhatChanged)
     EXPECT_EQ(scan(data), "0/0/0");
     sim.set("0", "present", 1);
     EXPECT_EQ(scan(data), "1/1/3");
+}
+
+// The system's own libHBAAPI, which finds an adapter only after it was told to load its vendors' libraries.
+TEST(SimulatedHost, IsFoundThroughTheSystemsLibrary)
+{
+    Simulator sim(Simulator::one_port, "real-hba");
+    write_file("/etc/hba.conf", read_file(std::string(NVRSIM_BUILD) + "/hba.conf"));
+    for (int round = 0; round < 2; round++) {
+        Loaded libraries;
+        EXPECT_EQ(libraries.result, 0);
+        NVR_MethodWrapper session;
+        NVR_Data data;
+        EXPECT_EQ(scan(data), "1/1/3");
+        EXPECT_EQ(data.getPorts()[0]->portName(), sim.get("0", "wwpn"));
+        EXPECT_EQ(sim.open_handles(), 0u);
+    }
 }
 
 namespace {
