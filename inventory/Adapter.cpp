@@ -36,7 +36,7 @@ FCAdapter::FCAdapter(const std::string& name, uint32 number) : Adapter(name, num
             [&] {
                 auto port = std::make_unique<FCPort>(this, index);
                 m_ports.push_back(port.get());
-                port.release();
+                static_cast<void>(port.release()); // owned by the list now
             },
             [&] {
                 NVR_LOG("Failed to fetch information for port: [%d] on adapter: [%s]", static_cast<int>(index),

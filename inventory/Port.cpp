@@ -91,7 +91,7 @@ void FCPort::rescanTargets(Adapter* adapter)
             [&] {
                 auto target = std::make_unique<Target>(*adapter, *entry);
                 m_targets.push_back(target.get());
-                target.release();
+                static_cast<void>(target.release()); // owned by the list now
             },
             [] { NVR_LOG("target creation failed - moving to the next target"); });
     }

@@ -105,7 +105,7 @@ void readIdentifier(const Path& path, Target& target)
     if (!path.inquire(command, 1, 0x83)) {
         if (command.status != HBA_STATUS_SCSI_CHECK_CONDITION) return;
         char text[24 * 3 + 1];
-        for (unsigned i = 0; i < 24; i++)
+        for (std::size_t i = 0; i < 24; i++)
             std::snprintf(text + 3 * i, 4, "%02x ", command.sense[i]);
         NVR_LOG("Sense Data: %s", text);
         return;
