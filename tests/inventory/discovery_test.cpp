@@ -1,7 +1,9 @@
 // Adapters and ports: what is read, and what each failing call costs.
 
 #include <cstring>
+#include <pthread.h>
 #include <stdexcept>
+#include <thread>
 
 #include <gmock/gmock.h>
 
@@ -431,6 +433,23 @@ TEST_F(Discovery, GivesPortsByPositionOnly)
             EXPECT_STREQ(error.what(), "vector::_M_range_check");
         }
     }
+}
+
+TEST_F(Discovery, LetsACancelledThreadEnd)
+{
+    host.faults["HBA_GetAdapterAttributes"] = [](int, uint32 index) -> uint32 {
+        if (index == 1) ::pthread_exit(nullptr);
+        return 0;
+    };
+    bool ended = true;
+    std::thread([&] {
+        data.buildAdapterData();
+        ended = false;
+    }).join();
+    EXPECT_TRUE(ended) << "no catch-all holds it up";
+    EXPECT_EQ(host.open_handles, 0);
+    host.faults.clear();
+    EXPECT_EQ(build(), whole_tree);
 }
 
 TEST_F(Discovery, FreesInOrderAndSaysSo)
