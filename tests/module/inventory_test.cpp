@@ -1,0 +1,256 @@
+// The main job: what a client reads of a host's adapters and ports, class by class and value by value.
+#include <algorithm>
+#include <set>
+#include <string>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include "tests/module/support/Expected.h"
+#include "tests/module/support/Instance_Text.h"
+#include "tests/module/support/Rig.h"
+#include "tests/module/support/Simulated_Hardware.h"
+
+using namespace nvrtest;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+namespace {
+
+std::vector<std::string> texts(const host::Answer& answer, const std::string& property)
+{
+    std::vector<std::string> all;
+    for (const host::Instance& instance : answer.instances)
+        all.push_back(instance.get(property).to_text());
+    return all;
+}
+
+} // namespace
+
+class Inventory : public Every_Manner {};
+NVR_IN_EVERY_MANNER(Inventory);
+
+TEST_P(Inventory, OfTheTypicalHostIsAsItsHardwareSays)
+{
+    Rig rig({*GetParam()});
+    const std::string expected = expected_text("typical.txt");
+    const std::vector<std::string> classes = rig.classes();
+    for (const auto& row : expected_rows("providers.txt")) {
+        const std::string& name = row.front();
+        if (name == "NVRHBA_AlertIndication") continue;
+        ASSERT_NE(std::find(classes.begin(), classes.end(), name), classes.end()) << name;
+        const host::Answer answer = rig.enumerate(name);
+        EXPECT_THAT(answer, succeeded()) << name;
+        const std::string wrong = difference(lines_of_class(expected, name), to_lines(name, answer.instances));
+        EXPECT_TRUE(wrong.empty()) << wrong;
+    }
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
+}
+
+TEST_P(Inventory, NamesAreThePathsOfTheInstancesInTheSameOrder)
+{
+    Rig rig({*GetParam()});
+    for (const auto& row : expected_rows("providers.txt")) {
+        const std::string& name = row.front();
+        if (name == "NVRHBA_AlertIndication") continue;
+        const host::Answer instances = rig.enumerate(name);
+        const host::Answer names = rig.names(name);
+        EXPECT_THAT(names, succeeded()) << name;
+        std::vector<std::string> wanted, found;
+        for (const host::Instance& instance : instances.instances)
+            wanted.push_back(instance.path.to_text());
+        for (const host::Path& path : names.paths)
+            found.push_back(path.to_text());
+        EXPECT_EQ(found, wanted) << name;
+        EXPECT_EQ(std::set<std::string>(found.begin(), found.end()).size(), found.size()) << name << " repeats a name";
+    }
+}
+
+// Each reference leads to an instance that the module itself gives, but for the host, which other providers publish.
+TEST(InventoryEnds, LeadToInstances)
+{
+    Rig rig;
+    std::set<std::string> known;
+    std::vector<std::pair<std::string, std::string>> ends;
+    for (const std::string& name : rig.classes()) {
+        if (name == "NVRHBA_AlertIndication") continue;
+        for (const host::Instance& instance : rig.enumerate(name).instances) {
+            host::Path path = instance.path;
+            path.name_space.clear();
+            known.insert(path.to_text());
+            for (const host::Named_Value& property : instance.properties)
+                if (const host::Path* end = property.value.as_path()) {
+                    host::Path bare = *end;
+                    bare.name_space.clear();
+                    if (bare.class_name != "CIM_ComputerSystem") ends.emplace_back(name, bare.to_text());
+                }
+        }
+    }
+    EXPECT_GT(ends.size(), 50u);
+    for (const auto& [name, end] : ends)
+        EXPECT_TRUE(known.count(end)) << name << " leads to " << end;
+}
+
+// This hardware gives each port an adapter name of its own; an adapter of two ports is shown as one.
+TEST(InventoryOfADualPortCard, HasOnePackageForBothPorts)
+{
+    Rig rig({host::Manner::strict(), "dual-port"});
+    const host::Answer ports = rig.enumerate("NVRHBA_FCPort");
+    EXPECT_THAT(texts(ports, "DeviceID"), ElementsAre("10000000C9A00001", "10000000C9A00002"));
+    EXPECT_THAT(texts(ports, "AdapterName"), ElementsAre("Norvane-FC2162-0", "Norvane-FC2162-0"));
+    EXPECT_EQ(rig.enumerate("NVRHBA_PhysicalPackage").instances.size(), 1u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_Product").instances.size(), 1u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_LogicalPortGroup").instances.size(), 1u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_ProductPhysicalComponent").instances.size(), 1u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_MemberOfCollection").instances.size(), 2u);
+    EXPECT_THAT(texts(rig.enumerate("NVRHBA_PortController"), "MaxNumberControlled"), ElementsAre("2", "2"));
+    EXPECT_THAT(texts(rig.enumerate("NVRHBA_SCSIProtocolController"), "MaxUnitsControlled"), ElementsAre("2", "2"));
+    EXPECT_THAT(texts(rig.enumerate("NVRHBA_PCIDevice"), "ElementName"),
+                ElementsAre("Norvane:FCAdapter0", "Norvane:FCAdapter0"));
+    for (const std::string& word : rig.words())
+        EXPECT_EQ(word.find("Insert Failed"), std::string::npos) << word;
+}
+
+TEST(InventoryOfAnEmptyHost, HasProfilesAndNothingElse)
+{
+    Rig rig({host::Manner::strict(), "# no adapters\n"});
+    EXPECT_EQ(rig.enumerate("NVRHBA_RegisteredProfile").instances.size(), 13u);
+    for (const char* name : {"NVRHBA_FCPort", "NVRHBA_PhysicalPackage", "NVRHBA_PortController",
+                             "NVRHBA_FCPortStatistics", "NVRHBA_LogicalDisk", "NVRHBA_SCSIProtocolEndpoint"}) {
+        const host::Answer answer = rig.enumerate(name);
+        EXPECT_THAT(answer, succeeded()) << name;
+        EXPECT_THAT(answer.instances, IsEmpty()) << name;
+    }
+    EXPECT_EQ(rig.count_words("HBAAPI reports that there are NO HBAs in the system."), 1u);
+    EXPECT_EQ(rig.count_words("FC Adapter Not present !!!!, throw error !!!"), 1u);
+    EXPECT_EQ(rig.count_words("No FC card found"), 1u);
+}
+
+namespace {
+
+// Ports with the values that the tables of a port's properties tell apart.
+constexpr char odd_ports[] = R"(
+[[adapter]]
+name = "odd"
+[[adapter.port]]
+state = 3
+speed = 3
+supported_speed = 0
+class_of_service = 0x20
+supported_fc4 = []
+type = 20
+[[adapter.port]]
+state = 8
+speed = 4
+supported_speed = 7
+class_of_service = 0x5F
+supported_fc4 = [88, 4]
+type = 21
+[[adapter.port]]
+state = 7
+speed = 1
+supported_speed = 3
+type = 2
+[[adapter.port]]
+state = 1
+speed = 16
+supported_speed = 0x18
+type = 99
+)";
+
+} // namespace
+
+TEST(InventoryOfOddPorts, FollowsTheTablesOfPortValues)
+{
+    Rig rig({host::Manner::strict(), odd_ports});
+    const host::Answer ports = rig.enumerate("NVRHBA_FCPort");
+    EXPECT_THAT(texts(ports, "PortType"), ElementsAre("1", "1", "1", "0"));
+    EXPECT_THAT(texts(ports, "OtherPortType"), ElementsAre("Private Loop", "Point to Point", "Other", "NULL"));
+    EXPECT_THAT(texts(ports, "OtherNetworkPortType"), ElementsAre("Private Loop", "Point to Point", "Other", "NULL"));
+    EXPECT_THAT(texts(ports, "MaxSpeed"), ElementsAre("0", "10000000000", "2000000000", "8000000000"));
+    EXPECT_THAT(texts(ports, "OperationalStatus"), ElementsAre("{10}", "{32776}", "{6}", "{0}"));
+    EXPECT_THAT(texts(ports, "StatusDescriptions"), ElementsAre("{Stopped}", "{InService}", "{Error}", "{Unknown}"));
+    EXPECT_EQ(texts(ports, "SupportedCOS")[0], "{0}");
+    EXPECT_EQ(texts(ports, "SupportedCOS")[1], "{7, 1, 2, 3, 4, 5}");
+    EXPECT_EQ(texts(ports, "ActiveCOS"), texts(ports, "SupportedCOS"));
+    EXPECT_EQ(texts(ports, "SupportedFC4Types")[0], "{0}");
+    // Type 88 shares its byte with types that have no number of their own.
+    EXPECT_EQ(texts(ports, "SupportedFC4Types")[1], "{4, 88, 1}");
+    // The controllers' shorter table knows no loopback value of its own.
+    EXPECT_THAT(texts(rig.enumerate("NVRHBA_PortController"), "OperationalStatus"),
+                ElementsAre("{10}", "{11}", "{6}", "{0}"));
+    EXPECT_THAT(texts(rig.enumerate("NVRHBA_ControlledBy"), "AccessState"), ElementsAre("2", "2", "2", "0"));
+}
+
+TEST(InventoryOfPorts, TranslatesTheCodesOfTheirSpeed)
+{
+    std::string host = "# speeds\n";
+    for (const char* code : {"0", "1", "2", "3", "4", "8", "16", "32", "64"})
+        host += std::string("[[adapter]]\n[[adapter.port]]\nspeed = ") + code + "\n";
+    Rig rig({host::Manner::strict(), host});
+    EXPECT_THAT(texts(rig.enumerate("NVRHBA_FCPort"), "Speed"),
+                ElementsAre("0", "1000000000", "2000000000", "0", "10000000000", "4000000000", "8000000000",
+                            "16000000000", "0"));
+}
+
+TEST(InventoryOfBrokenSensors, LeavesTemperaturesNull)
+{
+    Rig rig({host::Manner::strict(), "[[adapter]]\n[[adapter.port]]\nattributes = { 551 = 0 }\n"});
+    const host::Answer packages = rig.enumerate("NVRHBA_PhysicalPackage");
+    ASSERT_EQ(packages.instances.size(), 1u);
+    for (const char* name : {"BoardTemperature", "ThresholdCriticalTemp", "ThresholdWarningTemp"})
+        EXPECT_TRUE(packages.instances[0].get(name).is_null()) << name;
+    EXPECT_EQ(packages.instances[0].get("TemperatureUnit").as_text(), "Celsius");
+}
+
+TEST(InventoryWithoutPCIRegisters, PublishesADeviceOfZeros)
+{
+    Rig rig;
+    rig.stop();
+    add_fault("call = \"RM_DiagReadPCIRegistersV2\", status = 1");
+    rig.restart();
+    const host::Answer devices = rig.enumerate("NVRHBA_PCIDevice");
+    ASSERT_EQ(devices.instances.size(), 4u);
+    EXPECT_EQ(devices.instances[0].get("DeviceID").as_text(), "10000000C9A00001:0x0000");
+    EXPECT_EQ(devices.instances[0].get("VendorID").to_text(), "0");
+    EXPECT_EQ(devices.instances[0].get("BusNumber").to_text(), "4");
+    EXPECT_EQ(rig.count_words("RM_DiagReadPCIRegistersV2 call failed"), 4u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+}
+
+TEST(InventoryOfConvergedCards, LeavesThemOut)
+{
+    Rig rig({host::Manner::strict(), R"(
+[[adapter]]
+name = "Norvane-O1"
+[[adapter]]
+name = "Norvane-FC-plain"
+[[adapter]]
+name = "Norvane-N2"
+[[adapter]]
+name = "converged function"
+[[adapter.port]]
+attributes = { 556 = 2 }
+)"});
+    EXPECT_THAT(texts(rig.enumerate("NVRHBA_FCPort"), "AdapterName"), ElementsAre("Norvane-FC-plain"));
+    EXPECT_EQ(rig.count_words("Found VCNA Card, AdapterName = Norvane-O1. skipping this card"), 1u);
+    EXPECT_EQ(rig.count_words("Found VCNA Card, AdapterName = Norvane-N2. skipping this card"), 1u);
+    EXPECT_EQ(rig.count_words("Found VCNA Card, AdapterName = converged function. skipping this card"), 1u);
+}
+
+TEST(InventoryOfTwoPortsOfOneName, ShowsOneAndEndsTheUpdate)
+{
+    Rig rig({host::Manner::strict(), R"(
+allow_twins = true
+[[adapter]]
+name = "first"
+[[adapter]]
+name = "second"
+[[adapter.port]]
+wwpn = "10000000C9A00001"
+)"});
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 1u);
+    // The twin's device is the first thing of it that is refused.
+    EXPECT_EQ(rig.count_words("Insert Failed : m_NVRHBA_PCIDevice_map"), 1u);
+    EXPECT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+}

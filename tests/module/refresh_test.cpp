@@ -1,0 +1,368 @@
+// When the module looks at the hardware again, what clients see meanwhile, and what it says of it.
+#include <atomic>
+#include <chrono>
+#include <cstdio>
+#include <set>
+#include <string>
+#include <thread>
+#include <unistd.h>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include "simulator/nvrsim.h"
+#include "tests/module/support/Rig.h"
+#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/module/support/Test_Clock.h"
+#include "tests/support/trace.h"
+
+using namespace nvrtest;
+using testing::Contains;
+using testing::IsEmpty;
+using testing::Not;
+using namespace std::chrono_literals;
+
+namespace {
+
+constexpr char scan[] = "HBA_GetNumberOfAdapters";
+constexpr char settings_class[] = "NVRHBA_ProviderConfigSetting";
+
+std::vector<std::string> port_names(const host::Answer& answer)
+{
+    std::vector<std::string> names;
+    for (const host::Instance& port : answer.instances)
+        names.push_back(port.get("DeviceID").as_text());
+    return names;
+}
+
+// A host of so many adapters of one port each, told apart from others by the first port's number.
+std::string host_of(unsigned ports, unsigned first)
+{
+    std::string text = "# a host\n";
+    char name[32];
+    for (unsigned i = 0; i < ports; i++) {
+        std::snprintf(name, sizeof name, "%016X", 0xC9B00000u + first + i);
+        text += "[[adapter]]\n[[adapter.port]]\nwwpn = \"" + std::string(name) + "\"\n";
+    }
+    return text;
+}
+
+void set_current(Rig& rig, std::size_t place, std::uint32_t value)
+{
+    host::Instance setting = rig.enumerate(settings_class).instances.at(place);
+    setting.set("current", host::Value::uint32(value));
+    ASSERT_THAT(rig.server().modify(setting, std::vector<std::string>{"current"}), succeeded());
+}
+
+} // namespace
+
+TEST(Refresh, TheFirstQuestionStartsTheThreadAndWaitsForIt)
+{
+    Rig rig;
+    add_fault(std::string("call = \"") + scan + "\", delay_ms = 200");
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+    EXPECT_GE(std::chrono::steady_clock::now() - start, 200ms);
+    EXPECT_EQ(calls(scan), 1u);
+}
+
+TEST(Refresh, ProfilesAreThereBeforeTheFirstOne)
+{
+    Rig rig;
+    add_fault(std::string("call = \"") + scan + "\", delay_ms = 2000");
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(rig.enumerate("NVRHBA_RegisteredProfile").instances.size(), 13u);
+    EXPECT_LT(std::chrono::steady_clock::now() - start, 1500ms);
+}
+
+TEST(Refresh, SaysWhatItDoesInOrder)
+{
+    Rig rig({host::Manner::strict(), "small"});
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(1);
+    EXPECT_THAT(rig.words(), contains_in_order({
+                                 "Initializing RM API ",
+                                 "Constructor",
+                                 "Setting Up for FIFO.. ",
+                                 "RMLIB initialized",
+                                 "Initializing Data Pointer ",
+                                 "Data Pointer Constructed.",
+                                 "Norvane Provider v2.5.19-1 Loaded[" + std::to_string(getpid()) + "]",
+                                 "ProviderAgent::addRef[0]",
+                                 "PERF: ---BuildCimpleInfo BEGIN---",
+                                 "Checking if TimeOut...",
+                                 "PERF: TimeOut",
+                                 "PERF: Creating DataFetch_Handler Thread.",
+                             }));
+    EXPECT_THAT(rig.words(), contains_in_order({
+                                 "PERF: DataFetch_Handler Thread BEGIN",
+                                 "PERF: Building Adapter Data...",
+                                 "buildAdapterData",
+                                 "freeAllData: Entry",
+                                 "freeAllData: cleanExit",
+                                 "buildAdapterData - with hbaapi",
+                                 "Number of Adapters detected = 1",
+                                 "FC AdapterName : [Norvane-FC2162-0]",
+                                 "Adapter Function type : 0",
+                                 "PERF: Updating Adapter Maps...",
+                                 "PERF: updateAdapterMaps: Entry",
+                                 "PERF: Entered clearAdapterMaps()",
+                                 "Exiting clearAdapterMaps()",
+                                 "up-call to enumerate CIM_ComputerSystem started",
+                                 "up-call to enumerate CIM_RegisteredProfile started",
+                                 "up-call method failed",
+                                 std::string("Host ipAddress : ") + rig_host_address,
+                                 "All clear -created nvrhba computer system instance",
+                                 "Generating NVRHBA_RegisteredProfile (Profile Registration)",
+                                 "Created NVRHBA_RegisteredProfile in the map (Profile Registration)",
+                                 "Generating NVRHBA_ReferencedProfile (Software Inventory / Profile Registration)",
+                                 "Creating classes for port 0.",
+                                 "RM_DiagReadPCIRegistersV2 status = 0 ",
+                                 "RM_DiagReadPCIRegistersV2 call passed",
+                                 "Creating NVRHBA_PCIDevice",
+                                 "FC Port # 0",
+                                 "***************Port Status: 2******************",
+                                 "PERF: updateAdapterMaps: cleanExit",
+                                 "PERF: Building SAN Data...",
+                                 "buildSANData",
+                                 "PERF: Updating SAN Maps...",
+                                 "PERF: DataFetch_Handler Thread END",
+                             }));
+    for (const std::string& word : rig.words())
+        EXPECT_EQ(word.find("Insert Failed"), std::string::npos) << word;
+}
+
+TEST(Refresh, DoesNotHappenWithinTheTimeOut)
+{
+    Rig rig;
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(1);
+    rig.forget_words();
+    advance_clock(9min);
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_PortController").instances.size(), 4u);
+    EXPECT_EQ(rig.count_words("PERF: ---No timeout BuildCimpleInfo END---"), 2u);
+    EXPECT_THAT(rig.words(), Not(Contains("PERF: DataFetch_Handler Thread BEGIN")));
+    EXPECT_EQ(calls(scan), 1u);
+}
+
+TEST(Refresh, OfATimeOutReadsTheSanAndNotTheAdaptersUnlessToldTo)
+{
+    Rig rig;
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(1);
+    const std::uint64_t mappings = calls("HBA_GetFcpTargetMapping");
+    EXPECT_EQ(mappings, 4u);
+    rig.forget_words();
+    rig.refresh();
+    EXPECT_EQ(calls(scan), 1u);
+    EXPECT_EQ(calls("HBA_GetFcpTargetMapping"), 2 * mappings);
+    EXPECT_THAT(rig.words(), Not(Contains("PERF: Building Adapter Data...")));
+    EXPECT_THAT(rig.words(), contains_in_order({"PERF: TimeOut", "PERF: Clearing the previous thread...with join",
+                                                "PERF: Creating DataFetch_Handler Thread."}));
+}
+
+TEST(Refresh, OfTheAdaptersCanBeSwitchedOnByAClientAndComesWithTheNextTimeOut)
+{
+    Rig rig;
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(1);
+    set_current(rig, 1, 1);
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    EXPECT_EQ(calls(scan), 1u);
+    rig.refresh();
+    EXPECT_EQ(calls(scan), 2u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+}
+
+TEST(Refresh, OfTheSanCanBeSwitchedOffByAClient)
+{
+    Rig rig;
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(1);
+    set_current(rig, 2, 0);
+    const std::uint64_t mappings = calls("HBA_GetFcpTargetMapping");
+    rig.refresh();
+    EXPECT_EQ(calls("HBA_GetFcpTargetMapping"), mappings);
+    EXPECT_EQ(calls(scan), 1u);
+}
+
+TEST(Refresh, ComesAfterTheTimeOutThatAClientSet)
+{
+    Rig rig;
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(1);
+    set_current(rig, 0, 3);
+    advance_clock(2min);
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    EXPECT_EQ(rig.refreshes(), 1u);
+    advance_clock(61s);
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(2);
+}
+
+TEST(Refresh, OfAHostSwitchedOffForTimeOutsStillHappensForASanQuestion)
+{
+    Rig rig({host::Manner::strict(), "typical", "NVR_PROVIDER_REFRESH_SANDATA = FALSE\n"});
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
+    rig.wait_for_refreshes(1);
+    EXPECT_EQ(calls("HBA_GetFcpTargetMapping"), 0u);
+    EXPECT_THAT(rig.enumerate("NVRHBA_LogicalDisk"), succeeded());
+    EXPECT_EQ(calls("HBA_GetFcpTargetMapping"), 4u);
+}
+
+TEST(Refresh, ASecondQuestionWhileOneRunsStartsNothing)
+{
+    Rig rig;
+    add_fault(std::string("call = \"") + scan + "\", delay_ms = 400");
+    std::thread first([&] { EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u); });
+    while (calls(scan) == 0)
+        std::this_thread::sleep_for(1ms);
+    EXPECT_EQ(rig.enumerate("NVRHBA_Product").instances.size(), 4u);
+    first.join();
+    rig.wait_for_refreshes(1);
+    EXPECT_THAT(rig.words(), Contains("PERF: ---DataFetch_Handler thread already running -BuildCimpleInfo END---"));
+    EXPECT_EQ(rig.count_words("PERF: DataFetch_Handler Thread BEGIN"), 1u);
+}
+
+TEST(Refresh, AdaptersThatCameAndWentAreSeenByTheNextOne)
+{
+    Rig rig({host::Manner::strict(), "typical", refreshing_settings});
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+    ASSERT_EQ(nvrsim_set("1", "present", 0), 0);
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u) << "before the time-out";
+    rig.refresh();
+    EXPECT_THAT(port_names(rig.enumerate("NVRHBA_FCPort")),
+                testing::ElementsAre("10000000C9A00001", "10000000C9A00003", "10000000C9A00004"));
+    ASSERT_EQ(nvrsim_set("1", "present", 1), 0);
+    rig.refresh();
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+}
+
+TEST(Refresh, StatusOfPortsIsReadAgainAfterTenSeconds)
+{
+    Rig rig;
+    const auto status = [&] {
+        return rig.enumerate("NVRHBA_FCPort").instances.at(0).get("StatusDescriptions").to_text();
+    };
+    EXPECT_EQ(status(), "{OK}");
+    ASSERT_EQ(nvrsim_set("0", "state", 7), 0);
+    EXPECT_EQ(status(), "{OK}") << "within ten seconds";
+    advance_clock(11s);
+    EXPECT_EQ(status(), "{Error}");
+    EXPECT_EQ(calls(scan), 1u) << "without a walk of the adapters";
+}
+
+TEST(Refresh, StatisticsAreLive)
+{
+    Rig rig;
+    const auto packets = [&] {
+        return rig.enumerate("NVRHBA_FCPortStatistics").instances.at(0).get("PacketsTransmitted").to_text();
+    };
+    EXPECT_EQ(packets(), "5000");
+    ASSERT_EQ(nvrsim_set("0", "statistic:1030", 77), 0);
+    EXPECT_EQ(packets(), "77");
+    // A counter that the hardware does not have reads as all ones of 32 bits.
+    ASSERT_EQ(nvrsim_set("0", "statistic:1030", ~std::uint64_t{0}), 0);
+    EXPECT_EQ(packets(), "4294967295");
+}
+
+TEST(Refresh, CountersThatCannotBeReadKeepTheirValues)
+{
+    Rig rig;
+    ASSERT_THAT(rig.enumerate("NVRHBA_FCPortStatistics"), succeeded());
+    rig.forget_words();
+    add_fault("call = \"RM_GetPortStatistics\", port = 1, status = 1");
+    ASSERT_EQ(nvrsim_set("0", "statistic:1030", 77), 0);
+    ASSERT_EQ(nvrsim_set("1", "statistic:1030", 77), 0);
+    ASSERT_EQ(nvrsim_set("2", "statistic:1030", 77), 0);
+    const host::Answer answer = rig.enumerate("NVRHBA_FCPortStatistics");
+    ASSERT_EQ(answer.instances.size(), 4u);
+    EXPECT_EQ(answer.instances[0].get("PacketsTransmitted").to_text(), "77");
+    EXPECT_EQ(answer.instances[1].get("PacketsTransmitted").to_text(), "5001");
+    EXPECT_EQ(answer.instances[2].get("PacketsTransmitted").to_text(), "77");
+    EXPECT_THAT(rig.words(), contains_in_order({"ERROR: RM_GetPortStatistics call failed (1)",
+                                                "FC Port statistics error occurred,retain the old statistics !!!",
+                                                "Error occurred while retrieving FCPort Statistics..."}));
+}
+
+class Refreshes : public Every_Manner {};
+NVR_IN_EVERY_MANNER(Refreshes);
+
+// Two hosts take turns; whoever asks sees one of them whole.
+TEST_P(Refreshes, EachOfEightClientsSeesAllOldOrAllNew)
+{
+    const std::string hosts[] = {host_of(5, 0x100), host_of(7, 0x200)};
+    Rig rig({*GetParam(), hosts[0], refreshing_settings});
+    const std::vector<std::string> first = port_names(rig.enumerate("NVRHBA_FCPort"));
+    load_scenario(hosts[1]);
+    rig.refresh();
+    const std::vector<std::string> second = port_names(rig.enumerate("NVRHBA_FCPort"));
+    ASSERT_EQ(first.size(), 5u);
+    ASSERT_EQ(second.size(), 7u);
+
+    std::atomic<bool> over{false};
+    std::atomic<unsigned> answers{0}, wrong{0};
+    std::vector<std::thread> clients;
+    for (int i = 0; i < 8; i++)
+        clients.emplace_back([&, i] {
+            const char* const classes[] = {"NVRHBA_FCPort", "NVRHBA_PortController", "NVRHBA_SCSIProtocolController",
+                                           "NVRHBA_FCPort"};
+            while (!over) {
+                const host::Answer answer = rig.enumerate(classes[i % 4]);
+                const std::vector<std::string> seen = port_names(answer);
+                wrong += !answer.ok() || (seen != first && seen != second);
+                answers++;
+            }
+        });
+    for (int round = 0; round < 12; round++) {
+        load_scenario(hosts[round % 2]);
+        rig.refresh();
+    }
+    over = true;
+    for (std::thread& client : clients)
+        client.join();
+    EXPECT_EQ(wrong, 0u);
+    EXPECT_GT(answers, 24u);
+    EXPECT_EQ(left_beside_strings(rig.server().report()), 0u) << rig.server().report().to_text();
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
+}
+
+TEST_P(Refreshes, ASecondOneLeavesTheSameInstances)
+{
+    Rig rig({*GetParam(), "typical", refreshing_settings});
+    const auto names = [&] {
+        std::vector<std::string> all;
+        for (const std::string& class_name : rig.classes())
+            for (const host::Path& path : rig.names(class_name).paths)
+                all.push_back(path.to_text());
+        return all;
+    };
+    const std::vector<std::string> before = names();
+    EXPECT_GT(before.size(), 100u);
+    rig.refresh();
+    EXPECT_EQ(names(), before);
+}
+
+TEST(Refresh, OfASlowLibraryLetsOthersReadTheOldInstancesFirst)
+{
+    Rig rig({host::Manner::strict(), "typical", refreshing_settings});
+    ASSERT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+    rig.wait_for_refreshes(1);
+    add_fault("call = \"HBA_GetAdapterName\", delay_ms = 50");
+    advance_clock(31min);
+    const host::Answer answer = rig.enumerate("NVRHBA_PortController");
+    EXPECT_THAT(answer, succeeded());
+    EXPECT_EQ(answer.instances.size(), 4u);
+    rig.wait_for_refreshes(2);
+}
+
+TEST(Refresh, OfAThousandPortsIsWhole)
+{
+    std::string text(nvrsim_generate(1000, 0, 0, nullptr, 0) + 1, '\0');
+    text.resize(nvrsim_generate(1000, 0, 0, text.data(), text.size()));
+    Rig rig({host::Manner::strict(), text});
+    const std::vector<std::string> names = port_names(rig.enumerate("NVRHBA_FCPort"));
+    EXPECT_EQ(std::set<std::string>(names.begin(), names.end()).size(), 1000u);
+    EXPECT_EQ(rig.enumerate("NVRHBA_FCPortConformsToProfile").instances.size(), 4000u);
+}

@@ -1,0 +1,46 @@
+/// What the loader sees of a shared object, read from its file. Throws std::runtime_error for what is no 64-bit ELF.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace nvrtest {
+
+class Elf_File {
+public:
+    explicit Elf_File(const std::string& path);
+
+    /// Names that the file defines for others, sorted.
+    const std::vector<std::string>& exported() const { return m_exported; }
+    /// Entry of the dynamic section, or 0.
+    std::uint64_t dynamic_entry(std::int64_t tag) const;
+    /// Functions that run when it is loaded.
+    std::size_t initializers() const;
+    /// Libraries that it names.
+    const std::vector<std::string>& needed() const { return m_needed; }
+    /// True if an address of the loaded file lies in what is made read-only when relocation is done.
+    bool is_read_only_data(std::uint64_t offset) const;
+
+private:
+    void read_dynamic(std::size_t at, std::size_t size);
+    void read_symbols(std::size_t at, std::size_t size, std::size_t strings);
+    template <class Record>
+    Record record(std::size_t at) const;
+    std::string text(std::size_t at) const;
+
+    struct Range {
+        std::uint64_t from, to;
+    };
+    struct Entry {
+        std::int64_t tag;
+        std::uint64_t value;
+    };
+    std::string m_bytes;
+    std::vector<Range> m_read_only;
+    std::vector<Entry> m_dynamic;
+    std::vector<std::string> m_exported, m_needed;
+};
+
+} // namespace nvrtest

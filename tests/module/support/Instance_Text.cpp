@@ -1,0 +1,88 @@
+#include "tests/module/support/Instance_Text.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <ctime>
+#include <map>
+#include <sstream>
+
+namespace nvrtest {
+
+namespace {
+
+// The clock of a test runs at most some days ahead.
+bool is_present(const std::string& datetime)
+{
+    const std::time_t now = std::time(nullptr);
+    for (int day = -1; day < 30; day++) {
+        const std::time_t then = now + day * 86400;
+        char text[16];
+        std::tm broken;
+        std::strftime(text, sizeof text, "%Y%m%d", localtime_r(&then, &broken));
+        if (datetime.compare(0, 8, text) == 0) return true;
+    }
+    return false;
+}
+
+std::string text_of(const host::Value& value)
+{
+    if (value.type() == CMPI_dateTime && is_present(value.as_text())) return "<now>";
+    std::string text;
+    for (const char c : value.to_text()) {
+        char escaped[8] = {c, '\0'};
+        if (static_cast<unsigned char>(c) < 0x20) std::snprintf(escaped, sizeof escaped, "\\x%02X", c);
+        text += escaped;
+    }
+    return text;
+}
+
+std::vector<std::string> lines(const std::string& text)
+{
+    std::vector<std::string> all;
+    std::istringstream stream(text);
+    for (std::string line; std::getline(stream, line);)
+        all.push_back(line);
+    return all;
+}
+
+} // namespace
+
+std::string to_lines(const std::string& class_name, const std::vector<host::Instance>& instances)
+{
+    std::ostringstream text;
+    for (std::size_t i = 0; i < instances.size(); i++) {
+        std::map<std::string, std::string> properties;
+        for (const host::Named_Value& property : instances[i].properties)
+            if (!property.value.is_null())
+                properties[property.name] =
+                    host::type_name(property.value.type()) + ' ' + property.name + " = " + text_of(property.value);
+        for (const auto& property : properties)
+            text << class_name << '[' << i << "] " << property.second << '\n';
+    }
+    return text.str();
+}
+
+std::string lines_of_class(const std::string& text, const std::string& class_name)
+{
+    std::string mine;
+    for (const std::string& line : lines(text))
+        if (line.rfind(class_name + "[", 0) == 0) mine += line + '\n';
+    return mine;
+}
+
+std::string difference(const std::string& expected, const std::string& actual)
+{
+    const std::vector<std::string> wanted = lines(expected);
+    const std::vector<std::string> found = lines(actual);
+    std::ostringstream result;
+    for (const std::string& line : wanted)
+        if (std::count(found.begin(), found.end(), line) < std::count(wanted.begin(), wanted.end(), line))
+            result << "- " << line << '\n';
+    for (const std::string& line : found)
+        if (std::count(wanted.begin(), wanted.end(), line) < std::count(found.begin(), found.end(), line))
+            result << "+ " << line << '\n';
+    if (result.str().empty() && wanted != found) result << "the same lines, in another order\n";
+    return result.str();
+}
+
+} // namespace nvrtest

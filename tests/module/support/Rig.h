@@ -1,0 +1,113 @@
+/// A host with the module in it, for one test: name and address, settings files, a trace file, simulated hardware, and
+/// a CIM server of some manner that knows the module's classes. The module is reached as a server reaches it, by its
+/// exported entries.
+///
+///     Rig rig;
+///     EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 4u);
+///
+/// For programs with a private host. One at a time; its server may be asked from many threads.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include "host/Host.h"
+
+namespace nvrtest {
+
+constexpr char conf_path[] = "/etc/norvane_fc_provider.conf";
+constexpr char dmp_path[] = "/etc/norvane_fc_provider.dmp";
+/// The trace file that the second of them names.
+constexpr char trace_path[] = "/var/log/norvane.trace";
+
+/// The host's official name and address.
+constexpr char rig_host_name[] = "storage1.norvane.test";
+constexpr char rig_host_address[] = "192.0.2.17";
+
+struct Rig_Options {
+    host::Manner manner = host::Manner::strict();
+    /// As load_scenario takes it.
+    std::string scenario = "typical";
+    /// Content of the settings file; empty: there is none.
+    std::string settings = {};
+    /// The simulated libraries that are installed.
+    std::vector<std::string> libraries = {"HBAAPI", "lrmapi", "rmapi", "tssdm"};
+    /// A variant of the simulator instead of them.
+    std::string variant = {};
+};
+
+/// Settings under which each time-out reads the adapters anew.
+constexpr char refreshing_settings[] = "NVR_PROVIDER_REFRESH_ADAPTERDATA = TRUE\n";
+
+class Rig {
+public:
+    explicit Rig(const Rig_Options& options = {});
+    ~Rig();
+    Rig(const Rig&) = delete;
+    Rig& operator=(const Rig&) = delete;
+
+    host::Host& server() { return *m_server; }
+    /// In the namespace of the module.
+    host::Answer enumerate(const std::string& class_name, host::Property_List properties = {});
+    host::Answer names(const std::string& class_name);
+    /// All classes that the module serves, in the order of the server's registrations.
+    std::vector<std::string> classes();
+
+    /// Lets the cache grow old, asks, and waits until the refresh that this starts has ended.
+    void refresh();
+    /// Waits until so many refreshes have ended since the start of the trace.
+    void wait_for_refreshes(std::size_t count);
+    /// How many have ended.
+    std::size_t refreshes() const;
+
+    /// The words of the module's log so far, or since the last forget_words().
+    std::vector<std::string> words() const;
+    void forget_words();
+    /// How many of them are this one.
+    std::size_t count_words(const std::string& word) const;
+
+    /// Stops the server, as at its end, and starts another one: the module is loaded anew at the first request.
+    void restart();
+    void stop();
+
+private:
+    void start();
+
+    const Rig_Options m_options;
+    std::string m_trace_path;
+    std::size_t m_forgotten = 0;
+    std::unique_ptr<host::Host> m_server;
+};
+
+/// The schema of the module's classes, read once.
+std::shared_ptr<const host::Schema> module_schema();
+
+/// Objects that the module made and did not give back, but for strings: those in arrays live until their call returns.
+std::uint64_t left_beside_strings(const host::Report& report);
+
+/// Matches an answer of status OK; the description tells the status.
+MATCHER(succeeded, "")
+{
+    *result_listener << "status " << host::status_name(arg.status.code) << ' ' << arg.status.message;
+    return arg.ok();
+}
+
+/// Matches an answer of that CMPI status.
+MATCHER_P(failed_with, code, "")
+{
+    *result_listener << "status " << host::status_name(arg.status.code) << ' ' << arg.status.message;
+    return arg.status.code == code;
+}
+
+/// The manners of real servers and the strictest one, for parameterised tests.
+class Every_Manner : public testing::TestWithParam<const host::Manner*> {};
+#define NVR_IN_EVERY_MANNER(suite)                                                                                     \
+    INSTANTIATE_TEST_SUITE_P(In, suite, testing::ValuesIn(nvrtest::every_manner()),                                    \
+                             [](const auto& info) { return nvrtest::manner_label(*info.param); })
+std::vector<const host::Manner*> every_manner();
+std::string manner_label(const host::Manner& manner);
+
+} // namespace nvrtest

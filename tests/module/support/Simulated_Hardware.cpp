@@ -1,0 +1,95 @@
+#include "tests/module/support/Simulated_Hardware.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <sstream>
+#include <stdexcept>
+
+#include "simulator/nvrsim.h"
+#include "tests/support/private_host.h"
+
+namespace nvrtest {
+
+namespace {
+
+template <class Read>
+std::string text_of(Read read)
+{
+    std::string text(read(nullptr, 0) + 1, '\0');
+    text.resize(std::min(text.size() - 1, read(text.data(), text.size())));
+    return text;
+}
+
+[[noreturn]] void fail()
+{
+    throw std::runtime_error(text_of(nvrsim_error));
+}
+
+const char* const library_names[] = {"HBAAPI", "lrmapi", "rmapi", "tssdm"};
+
+void compose_from(const std::string& folder, const std::vector<std::string>& present)
+{
+    for (const char* name : library_names) {
+        const std::string file = std::string("lib") + name + ".so";
+        const std::string path = library_folder() + "/" + file;
+        if (std::find(present.begin(), present.end(), name) != present.end())
+            link(folder + "/" + file, path);
+        else
+            write_file(path, "No library of this name is installed.\n");
+    }
+}
+
+} // namespace
+
+void load_scenario(const std::string& scenario)
+{
+    const bool is_text = scenario.find('\n') != std::string::npos;
+    const int loaded = is_text ? nvrsim_load_text(scenario.c_str(), "scenario of the test")
+                               : nvrsim_load((std::string(NVR_SCENARIO_DIR) + "/" + scenario + ".toml").c_str());
+    if (loaded != 0) fail();
+}
+
+void add_fault(const std::string& fault)
+{
+    if (nvrsim_fault(fault.c_str()) < 0) fail();
+}
+
+void clear_faults()
+{
+    nvrsim_clear_faults();
+}
+
+std::uint64_t fault_hits()
+{
+    // One line a fault, "... seen=N hits=N".
+    std::istringstream lines(text_of(nvrsim_faults));
+    std::uint64_t hits = 0;
+    for (std::string line; std::getline(lines, line);) {
+        const std::string word = " hits=";
+        const std::size_t at = line.rfind(word);
+        if (at == std::string::npos) throw std::runtime_error("no count of hits in: " + line);
+        hits += std::strtoull(line.c_str() + at + word.size(), nullptr, 10);
+    }
+    return hits;
+}
+
+std::uint64_t calls(const std::string& operation)
+{
+    return nvrsim_calls(operation.c_str());
+}
+
+void compose_libraries(const std::vector<std::string>& present)
+{
+    compose_from(NVR_SIMULATOR_LIB_DIR, present);
+}
+
+void compose_variant(const std::string& variant)
+{
+    const std::string folder = std::string(NVR_SIMULATOR_VARIANT_DIR) + "/" + variant;
+    std::vector<std::string> present;
+    for (const char* name : library_names)
+        if (exists(folder + "/lib" + name + ".so")) present.push_back(name);
+    compose_from(folder, present);
+}
+
+} // namespace nvrtest
