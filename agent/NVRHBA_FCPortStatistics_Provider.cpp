@@ -10,7 +10,7 @@ Enum_Instances_Status NVRHBA_FCPortStatistics_Provider::enum_instances(const NVR
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     if (!agent.m_bLoaded) {
-        NVR_LOG("RM Init failed for %s", __FILE__);
+        NVR_LOG("RM Init failed for %s", "agent/NVRHBA_FCPortStatistics_Provider.cpp");
         return ENUM_INSTANCES_OK;
     }
     enumerateActive<&ProviderAgent::GetFCPortStats>(agent, agent.m_NVRHBA_FCPortStatistics_map, handler);

@@ -326,6 +326,7 @@ private:
     bool hasFetchThread();
     void joinFetchThread(); // holds no lock while it waits
     void fetchData();
+    void abandonFetch();
     bool SANMapsMissed() const;
     bool nothingLeftToFetch();
     void runAdapterPhase();

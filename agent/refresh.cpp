@@ -137,7 +137,7 @@ void* ProviderAgent::DataFetch_Handler(void* argument)
     auto* agent = static_cast<ProviderAgent*>(argument);
     if (agent) {
         markFetchThread();
-        agent->fetchData();
+        if (!guarded([agent] { agent->fetchData(); })) agent->abandonFetch();
     } else
         NVR_LOG("Error in converting the pointer to ProviderAgent");
     NVR_LOG("PERF: DataFetch_Handler Thread END");
@@ -154,6 +154,16 @@ void ProviderAgent::fetchData()
         if (targets || m_bSANRefreshPending || SANMapsMissed()) runSANPhase();
         first = false;
     } while (!nothingLeftToFetch());
+}
+
+/// Even the words between the phases could not be said for want of memory: the next call starts anew, and nobody waits.
+void ProviderAgent::abandonFetch()
+{
+    {
+        Auto_Mutex lock(m_DataFetchMutex);
+        m_bDataFetchRunning = false;
+    }
+    raiseReadyFlags();
 }
 
 bool ProviderAgent::SANMapsMissed() const

@@ -10,7 +10,7 @@ Enum_Instances_Status NVRHBA_DriverParamGlobal_Provider::enum_instances(const NV
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     if (!agent.m_bLoaded) {
-        NVR_LOG("RM Init failed for %s", __FILE__);
+        NVR_LOG("RM Init failed for %s", "services/NVRHBA_DriverParamGlobal_Provider.cpp");
         return ENUM_INSTANCES_OK;
     }
     enumerateActive<&ProviderAgent::UpdateDriverParamGlobal>(agent, agent.m_NVRHBA_DriverParamGlobal_map, handler);

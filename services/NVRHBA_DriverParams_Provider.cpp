@@ -10,7 +10,7 @@ Enum_Instances_Status NVRHBA_DriverParams_Provider::enum_instances(const NVRHBA_
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     if (!agent.m_bLoaded) {
-        NVR_LOG("RM Init failed for %s", __FILE__);
+        NVR_LOG("RM Init failed for %s", "services/NVRHBA_DriverParams_Provider.cpp");
         return ENUM_INSTANCES_OK;
     }
     enumerateActive<&ProviderAgent::UpdateDriverParams>(agent, agent.m_NVRHBA_DriverParams_map, handler);

@@ -9,7 +9,7 @@ Enum_Instances_Status NVRHBA_FCPort_Provider::enum_instances(const NVRHBA_FCPort
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     if (!agent.m_bLoaded) {
-        NVR_LOG("RM Init failed for %s", __FILE__);
+        NVR_LOG("RM Init failed for %s", "services/NVRHBA_FCPort_Provider.cpp");
         return ENUM_INSTANCES_OK;
     }
     enumerateActive<&ProviderAgent::UpdateFCPortStatus>(agent, agent.m_NVRHBA_FCPort_map, handler);

@@ -1,4 +1,7 @@
-#include "classes/NVRHBA_FCPort.h"
+#include "classes/NVRHBA_DriverParamGlobal.h"
+#include "classes/NVRHBA_DriverParams.h"
+#include "foundation/NVR_Common.h"
+#include "foundation/management_binding.h"
 #include "simulator/nvrsim.h"
 #include "tests/agent/Simulated_Host.h"
 
@@ -34,13 +37,31 @@ protected:
         enumerateActive<&ProviderAgent::UpdateFCPortStatus>(agent(), agent().m_NVRHBA_FCPort_map, {collect, &all});
         return all;
     }
-    std::string current(const Map<struct NVRHBA_DriverParams>& map, const char* id)
+    /// The current value of the first parameter that a refresh shows with this InstanceID.
+    template <void (ProviderAgent::*refresh)()>
+    std::string current(const Instance_Map& map, const char* id)
     {
         Instances all;
-        enumerateActive<&ProviderAgent::UpdateDriverParams>(agent(), map, {collect, &all});
+        enumerateActive<refresh>(agent(), map, {collect, &all});
         for (const auto& instance : all)
             if (value(instance.get(), "InstanceID") == id) return value(instance.get(), "current");
         return "missing";
+    }
+    std::string local()
+    {
+        return current<&ProviderAgent::UpdateDriverParams>(agent().m_NVRHBA_DriverParams_map,
+                                                           "10000000C9A00001:lun-queue-depth");
+    }
+    std::string global()
+    {
+        return current<&ProviderAgent::UpdateDriverParamGlobal>(agent().m_NVRHBA_DriverParamGlobal_map,
+                                                                "lun-queue-depth");
+    }
+    static void change(const char* assignment, uint32 code)
+    {
+        HBA_WWN port = {};
+        ASSERT_EQ(string2HBAName(&port, first_wwpn), 1);
+        ASSERT_EQ(RM_SetDriverParam(port, assignment, code), 0u);
     }
 };
 
@@ -169,4 +190,43 @@ TEST_F(LiveValues, APortThatIsGoneKeepsItsLastCounters)
     statistics();
     nvrsim_set("0", "present", 0);
     EXPECT_EQ(value(statistics()[0].get(), "LIPCount"), "5");
+}
+
+TEST_F(LiveValues, DriverParametersAreReadAtMostOnceInFiveSeconds)
+{
+    EXPECT_EQ(local(), "30");
+    EXPECT_EQ(global(), "30");
+    change("lun-queue-depth=40", 0);
+    advance_clock(5 * second - 1);
+    EXPECT_EQ(local(), "30");
+    EXPECT_EQ(global(), "30");
+    advance_clock(1);
+    words();
+    EXPECT_EQ(local(), "40");
+    change("lun-queue-depth=50", RM_PARAM_GLOBAL);
+    EXPECT_EQ(global(), "50");
+    EXPECT_THAT(words(), contains_in_order({"Checking driver TimeOut...", "PERF: update driver map",
+                                            "RM_GetDriverParams: status=0", "RM_GetDriverParams: status=0",
+                                            "RM_GetDriverParamsGlobal: status=0"}));
+}
+
+TEST_F(LiveValues, AFailingParameterListLeavesTheValuesAndSaysSo)
+{
+    fault("call = \"RM_GetDriverParams\", status = 2");
+    fault("call = \"RM_GetDriverParamsGlobal\", status = 2");
+    EXPECT_EQ(local(), "30");
+    EXPECT_EQ(global(), "30");
+    EXPECT_THAT(words(), contains_in_order(
+                             {"RM_GetDriverParams: status=2", "RM_GetDriverParams:failed",
+                              "ERROR: nvrcimGetDriverParamsGlobal: RM_GetDriverParamsGlobal call failed (b) (2)"}));
+}
+
+TEST_F(LiveValues, AListThatIsNeverLongEnoughIsAskedForTwice)
+{
+    fault("call = \"RM_GetDriverParamsGlobal\", status = 191, value = 4294967295");
+    const uint64 before = nvrsim_calls("RM_GetDriverParamsGlobal");
+    EXPECT_EQ(global(), "30");
+    EXPECT_EQ(nvrsim_calls("RM_GetDriverParamsGlobal") - before, 2u);
+    EXPECT_THAT(words(),
+                Contains("ERROR: nvrcimGetDriverParamsGlobal: RM_GetDriverParamsGlobal call failed (a) (191)"));
 }
