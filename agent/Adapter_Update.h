@@ -74,7 +74,10 @@ private:
 
     // port_instances.cpp
     void buildPort(const Port_Scope& scope);
-    bool buildPCIDevice(const Port_Scope& scope);
+    /// Null if the port is to be passed over.
+    Instance* buildPCIDevice(const Port_Scope& scope);
+    void buildVPD(const Port_Scope& scope, const Instance* device);
+    void buildTransceiver(const Port_Scope& scope);
     Instance* buildFCPort(const Port_Scope& scope);
     Instance* buildStatistics(const Port_Scope& scope);
     Instance* buildSCSIProtocolController(const Port_Scope& scope);

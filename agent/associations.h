@@ -24,6 +24,8 @@ enum class Link {
     SystemPackaging,
     HostedCollection,
     SystemDevice,
+    ElementVPD,
+    TransceiverComponent,
     FCPortSystemDevice,
     MemberOfCollection,
     ElementStatisticalData,
@@ -41,6 +43,7 @@ enum class Link {
     ProviderSoftwareIdentity,
     ElementSoftwareIdentity,
     FCTagElementSoftwareIdentity,
+    ElementFlashImageSoftwareIdentity,
     // Services: their host, and what they affect.
     HostedInstallationService,
     InstallServiceAffectsSystem,

@@ -64,7 +64,7 @@ void insertGlobal(ProviderAgent& agent, const RM_DRIVERPARAM& record, std::size_
 }
 
 void insertLocal(ProviderAgent& agent, const RM_DRIVERPARAM& record, std::size_t index, const Instance* service,
-                 const std::string& wwpn, const HBA_WWN& wwn)
+                 const Instance* port, const std::string& wwpn, const HBA_WWN& wwn)
 {
     auto made = makeParam<NVRHBA_DriverParams>(record, index, driverParamID(wwpn, record));
     const HBA_UINT8* b = wwn.wwn;
@@ -72,7 +72,6 @@ void insertLocal(ProviderAgent& agent, const RM_DRIVERPARAM& record, std::size_t
     set(made->def, record.defaultValue);
     const Instance* param = insert(agent.m_NVRHBA_DriverParams_map, made);
     if (service && !associate(agent, Link::DriverServiceElementSettingData, service, param)) throw Update_Ended();
-    const Instance* port = portOf(agent.m_NVRHBA_FCPort_map, wwpn);
     if (!port) {
         NVR_LOG("Data Structure is corrupted...");
         throw Update_Ended();
@@ -133,13 +132,14 @@ uint32 nvrcimGetDriverParam(ProviderAgent& agent, const std::string& wwpn, bool 
 
     const auto& services = agent.m_NVRHBA_FCHBADriverParamService_map;
     const Instance* service = services.empty() ? nullptr : services[0];
+    const Instance* port = global ? nullptr : portOf(agent.m_NVRHBA_FCPort_map, wwpn);
     try {
         for (std::size_t i = 0; i < records.size(); i++) {
             NVR_LOG("saving the values of driver parameter %d", static_cast<int>(i));
             if (global)
                 insertGlobal(agent, records[i], i, service);
             else
-                insertLocal(agent, records[i], i, service, wwpn, wwn);
+                insertLocal(agent, records[i], i, service, port, wwpn, wwn);
         }
     } catch (const Update_Ended&) {
         return status_failed; // of this list alone: the update goes on

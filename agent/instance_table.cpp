@@ -44,13 +44,20 @@ void logInsertFailed(const Instance_Map& map, const char* failure)
         NVR_LOG("Insert Failed : m_%s_map", map.meta_class()->name);
 }
 
-Instance* insert(Instance_Map& map, Ref<Instance> instance, const char* failure)
+Instance* insertOrLog(Instance_Map& map, Ref<Instance> instance, const char* failure)
 {
     if (map.insert(instance.get()) < 0) {
         logInsertFailed(map, failure);
-        throw Update_Ended();
+        return nullptr;
     }
     return instance.release();
+}
+
+Instance* insert(Instance_Map& map, Ref<Instance> instance, const char* failure)
+{
+    Instance* inserted = insertOrLog(map, std::move(instance), failure);
+    if (!inserted) throw Update_Ended();
+    return inserted;
 }
 
 } // namespace cimple

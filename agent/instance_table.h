@@ -77,8 +77,11 @@ String string_property(const Instance* instance, const char* name);
 /// Thrown by `insert` to end the whole update that builds the instance.
 struct Update_Ended {};
 
-/// Moves `instance` into `map`. A known key logs `failure` (null: "Insert Failed : m_<Class>_map"), frees the instance
-/// and throws Update_Ended. Result the instance, now the map's.
+/// Moves `instance` into `map`. A known key logs `failure` (null: "Insert Failed : m_<Class>_map") and frees the
+/// instance. Result the instance, now the map's; or null.
+Instance* insertOrLog(Instance_Map& map, Ref<Instance> instance, const char* failure = nullptr);
+
+/// The same for an instance without which the whole update ends: a known key throws Update_Ended.
 Instance* insert(Instance_Map& map, Ref<Instance> instance, const char* failure = nullptr);
 template <class T>
 T* insert(Map<T>& map, Ref<T> instance, const char* failure = nullptr)

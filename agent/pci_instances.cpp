@@ -38,7 +38,7 @@ private:
 
 } // namespace
 
-bool Adapter_Update::buildPCIDevice(const Port_Scope& scope)
+Instance* Adapter_Update::buildPCIDevice(const Port_Scope& scope)
 {
     const PCI_Header header(scope.wwn);
     NVR_LOG("Creating NVRHBA_PCIDevice");
@@ -79,15 +79,15 @@ bool Adapter_Update::buildPCIDevice(const Port_Scope& scope)
     set(made->InterruptPin, header.byte(61));
     set(made->MinimumGrant, header.byte(62));
     set(made->MaximumLatency, header.byte(63));
-    const Instance* device = insert(m_agent.m_NVRHBA_PCIDevice_map, made);
+    Instance* device = insert(m_agent.m_NVRHBA_PCIDevice_map, made);
 
     if (!m_pciDevice) {
         NVR_LOG("Failed to create NVRHBA_PCIElementConformsToProfile");
-        return false;
+        return nullptr;
     }
     tie(Link::PCIElementConformsToProfile, m_pciDevice, device);
     tie(Link::SystemDevice, m_host, device);
-    return true;
+    return device;
 }
 
 } // namespace cimple

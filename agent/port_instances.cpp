@@ -2,6 +2,7 @@
 #include "agent/Adapter_Update.h"
 #include "agent/beacon.h"
 #include "agent/library_name.h"
+#include "agent/port_data_instances.h"
 #include "agent/port_tables.h"
 #include "agent/vpd.h"
 #include "classes/NVRHBA_ControlledBy.h"
@@ -60,7 +61,10 @@ void setStatus(T& instance, const Status_Row& row)
 
 void Adapter_Update::buildPort(const Port_Scope& scope)
 {
-    if (!buildPCIDevice(scope)) return;
+    const Instance* device = buildPCIDevice(scope);
+    if (!device) return;
+    buildVPD(scope, device);
+    buildTransceiver(scope);
     Instance* port = buildFCPort(scope);
     const std::string name = scope.adapter._Model + ":" + scope.wwpn;
     const auto conforms = [&](Link link, const Instance* profile, const Instance* element, const char* what,
@@ -86,6 +90,8 @@ void Adapter_Update::buildPort(const Port_Scope& scope)
     conforms(Link::PortControllerConformsToProfile, m_storageHBA, controller, "Port Controller", "Storage HBA");
     conforms(Link::PortControllerConformsToProfile, m_fcHBA, controller, "Port Controller", "FC HBA");
 
+    createFlashImages(m_agent, scope.wwpn, scope.adapter, controller);
+
     auto* controlled = static_cast<NVRHBA_ControlledBy*>(tie(Link::ControlledBy, controller, port));
     set(controlled->AccessState, access_state(scope.attributes.PortState));
     tie(Link::Realizes, scope.package, controller);
@@ -95,6 +101,23 @@ void Adapter_Update::buildPort(const Port_Scope& scope)
     if (m_accessPoint) tie(Link::SAPAvailableForElement, m_accessPoint, port);
     buildServiceLinks(port, name.c_str());
     NVR_LOG("Ending of Software Installation Service");
+}
+
+void Adapter_Update::buildVPD(const Port_Scope& scope, const Instance* device)
+{
+    Instance* vpd = nullptr;
+    if (CreateVPD(m_agent, scope.wwpn, vpd) == 0)
+        tie(Link::ElementVPD, device, vpd);
+    else
+        NVR_LOG("FC port %s CreateVPD failed", scope.wwpn);
+}
+
+void Adapter_Update::buildTransceiver(const Port_Scope& scope)
+{
+    if (const Instance* transceiver = createTransceiver(m_agent, scope.wwpn))
+        tie(Link::TransceiverComponent, scope.package, transceiver);
+    else
+        NVR_LOG("Failed Creating NVRVCNA_Transceiver");
 }
 
 Instance* Adapter_Update::buildFCPort(const Port_Scope& scope)

@@ -1,9 +1,9 @@
 // The software identities: of the provider, the driver, the diagnostics, and of each port's firmware.
 #include "agent/Adapter_Update.h"
+#include "agent/version_properties.h"
 #include "agent/walk_ports.h"
 #include "classes/NVRHBA_SoftwareIdentity.h"
 #include "foundation/CLogger.h"
-#include "foundation/NVR_Common.h"
 #include "inventory/AdapterAttributes.h"
 
 namespace cimple {
@@ -31,23 +31,6 @@ Ref<NVRHBA_SoftwareIdentity> makeIdentity(const String& id, const char* descript
     set(identity->ClassificationDescriptions, {classification_text});
     set(identity->IsEntity, true);
     return identity;
-}
-
-/// The numbers of a firmware version, where its text has them. `what` stands in front of the log's words.
-void setVersion(NVRHBA_SoftwareIdentity& identity, const std::string& version, const char* what)
-{
-    NVR_LOG("%s- Parsing VersionString", what);
-    NVR_Version parsed;
-    if (parseVersion(version.c_str(), parsed) == 0) {
-        set(identity.MajorVersion, parsed.major);
-        set(identity.MinorVersion, parsed.minor);
-        set(identity.RevisionNumber, parsed.revision);
-        set(identity.BuildNumber, parsed.build);
-        set(identity.ReleaseType, parsed.releaseType);
-        set(identity.TestReleaseVersion, parsed.testRelease);
-        NVR_LOG("%s- Parsing Success", what);
-    }
-    NVR_LOG("%s- Parsing Done", what);
 }
 
 } // namespace

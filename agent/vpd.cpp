@@ -4,8 +4,6 @@
 
 namespace cimple {
 
-const std::string vpd_product_name(2, static_cast<char>(RM_VPD_TAG_PRODUCT_NAME));
-
 uint32 readVPD(const HBA_WWN& wwn, std::vector<Vpd_Entry>& entries)
 {
     entries.clear();

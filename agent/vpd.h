@@ -13,7 +13,8 @@ namespace cimple {
 /// A two-letter tag, or vpd_product_name's two bytes, and its value.
 using Vpd_Entry = std::pair<std::string, std::string>;
 
-extern const std::string vpd_product_name;
+constexpr char vpd_product_name[] = {static_cast<char>(RM_VPD_TAG_PRODUCT_NAME),
+                                     static_cast<char>(RM_VPD_TAG_PRODUCT_NAME), '\0'};
 
 /// Reads the entries of a port in their order. Result the library's status; on failure there are none. The library's
 /// walk is bounded: it ends when it has run its length or stops to advance.
