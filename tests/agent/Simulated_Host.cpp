@@ -1,6 +1,7 @@
 #include "tests/agent/Simulated_Host.h"
 
 #include <cerrno>
+#include <cstdio>
 #include <pthread.h>
 #include <unistd.h>
 
@@ -47,6 +48,16 @@ std::string scalar(const void* place, uint16 type)
         return std::to_string(*static_cast<const sint32*>(place));
     case UINT64:
         return std::to_string(*static_cast<const uint64*>(place));
+    case REAL32: {
+        char text[32];
+        std::snprintf(text, sizeof text, "%.6g", static_cast<double>(*static_cast<const real32*>(place)));
+        return text;
+    }
+    case DATETIME: {
+        char text[Datetime::text_size];
+        static_cast<const Datetime*>(place)->ascii(text);
+        return text;
+    }
     case STRING:
         return static_cast<const String*>(place)->c_str();
     default:
