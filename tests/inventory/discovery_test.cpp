@@ -492,7 +492,7 @@ TEST(Inventory, SaysWhenItComesAndGoes)
 namespace {
 
 // Each call of a discovery, failing with each status that libraries answer.
-struct EveryFault : Discovery, testing::WithParamInterface<std::tuple<const char*, uint32>> {};
+struct EveryFault : Discovery, testing::WithParamInterface<std::tuple<std::string, uint32>> {};
 
 } // namespace
 

@@ -144,7 +144,7 @@ INSTANTIATE_TEST_SUITE_P(
 
 namespace {
 
-struct SimulatedDamage : testing::TestWithParam<std::tuple<const char*, const char*>> {};
+struct SimulatedDamage : testing::TestWithParam<std::tuple<std::string, std::string>> {};
 
 } // namespace
 
