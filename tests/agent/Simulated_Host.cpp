@@ -1,5 +1,6 @@
 #include "tests/agent/Simulated_Host.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <pthread.h>
@@ -25,6 +26,13 @@ std::atomic<uint64> now{start_of_time};
 uint64 test_clock()
 {
     return now;
+}
+
+/// Fetch threads that begin less those that end in these words.
+long fetches(const std::vector<std::string>& words)
+{
+    return std::count(words.begin(), words.end(), "PERF: DataFetch_Handler Thread BEGIN") -
+           std::count(words.begin(), words.end(), "PERF: DataFetch_Handler Thread END");
 }
 
 uint32 driverLog(ProviderAgent& agent)
@@ -125,9 +133,10 @@ void SimulatedHost::unload()
     ProviderAgent::unload();
 }
 
+// The thread's last words come behind its last look at the flags.
 void SimulatedHost::settle()
 {
-    while (agent().m_bDataFetchRunning)
+    while (agent().m_bDataFetchRunning || m_fetching + fetches(log->words()) > 0)
         usleep(1000);
 }
 
@@ -156,10 +165,17 @@ SimulatedHost::Instances SimulatedHost::san(const Instance_Map& map)
 
 std::vector<std::string> SimulatedHost::words()
 {
-    std::vector<std::string> all = log->words();
     CLogger::Hold hold;
+    std::vector<std::string> all = log->words();
     log->clear();
+    m_fetching += fetches(all);
     return all;
+}
+
+void SimulatedHost::listenAgain()
+{
+    log.reset(new Log_Capture);
+    m_fetching = 0;
 }
 
 bool collect(Instance* instance, int status, void* data)

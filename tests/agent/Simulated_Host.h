@@ -60,7 +60,13 @@ protected:
     /// The log's words so far, and forgets them.
     std::vector<std::string> words();
 
+    /// The end of an agent takes all loggers off: puts the capture back, for the next one.
+    void listenAgain();
+
     std::unique_ptr<Log_Capture> log;
+
+private:
+    long m_fetching = 0; // fetch threads that the forgotten words left running
 };
 
 /// The value of a property as text: arrays as "{a,b}", null as "null".

@@ -329,8 +329,9 @@ TEST_F(AdapterUpdate, TwoPortsOfOneNameAreOneAndTheUpdateEndsThere)
     EXPECT_THAT(said, Not(Contains("Done with the Driver Parameter fetching")));
     EXPECT_TRUE(agent().m_bIsAdapterMapsReady);
     EXPECT_TRUE(agent().m_bIsSANMapsReady);
-    Agent_Wait wait(agent());
-    EXPECT_EQ(agent().updateAdapterMaps(), 32769u);
+    ProviderAgent& held = agent();
+    Agent_Wait wait(held);
+    EXPECT_EQ(held.updateAdapterMaps(), 32769u);
 }
 
 TEST_F(AdapterUpdate, AHostWithoutAdaptersPublishesItsProfilesAlone)

@@ -93,7 +93,7 @@ TEST_F(Lifecycle, AMissingManagementLibraryRefusesEveryLoadAndTheNextAgentRecove
     unload();
     EXPECT_THAT(words(), contains_in_order({"ProviderAgent::releaseRef[0]", "Entering the function ~ProviderAgent()",
                                             "Norvane Provider Unloaded"}));
-    log.reset(new Log_Capture);
+    listenAgain();
     EXPECT_EQ(load(), 0);
     EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
     unload();
@@ -133,7 +133,7 @@ TEST_F(Lifecycle, TenRoundsEachLoadBindAndShowThePortAgain)
         unload();
         EXPECT_EQ(nvrsim_open_handles(), 0u);
         EXPECT_FALSE(exists(guard_name()));
-        log.reset(new Log_Capture);
+        listenAgain();
     }
 }
 

@@ -261,6 +261,7 @@ TEST_F(ConfigSetting, RefusesWhatIsMissingUnknownOrForeign)
     const Ref<Instance> foreign(create(&NVRHBA_PortController::meta, true));
     const auto* disguised = static_cast<const NVRHBA_ProviderConfigSetting*>(foreign.get());
     EXPECT_EQ(provider.modify_instance(disguised, disguised), 104);
-    EXPECT_EQ(agent().m_DataMutex.try_lock(), 0); // released on every path
-    agent().m_DataMutex.unlock();
+    Mutex& data = agent().m_DataMutex;
+    EXPECT_EQ(data.try_lock(), 0); // released on every path
+    data.unlock();
 }

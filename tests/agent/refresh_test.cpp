@@ -108,18 +108,19 @@ TEST_F(Refresh, WithAdapterRefreshSetATimeOutRebuildsBothSides)
 TEST_F(Refresh, TheLimitIsComputedIn32Bits)
 {
     plain(agent().m_NVRHBA_FCPort_map);
-    Auto_Mutex lock(agent().m_DataFetchMutex);
-    agent().m_cacheTimeout = 30;
+    ProviderAgent& held = agent();
+    Auto_Mutex lock(held.m_DataFetchMutex);
+    held.m_cacheTimeout = 30;
     advance_clock(30 * minute - 1);
-    EXPECT_EQ(agent().checkTimeOut(), 0);
+    EXPECT_EQ(held.checkTimeOut(), 0);
     advance_clock(1);
-    EXPECT_EQ(agent().checkTimeOut(), 1);
-    agent().m_cacheTimeout = 72; // 4,320,000,000 wraps to 25,032,704
-    EXPECT_EQ(agent().checkTimeOut(), 1);
-    agent().m_cacheTimeout = 71;
-    EXPECT_EQ(agent().checkTimeOut(), 0);
+    EXPECT_EQ(held.checkTimeOut(), 1);
+    held.m_cacheTimeout = 72; // 4,320,000,000 wraps to 25,032,704
+    EXPECT_EQ(held.checkTimeOut(), 1);
+    held.m_cacheTimeout = 71;
+    EXPECT_EQ(held.checkTimeOut(), 0);
     advance_clock(4294967296u - 30 * minute);
-    EXPECT_EQ(agent().checkTimeOut(), 1);
+    EXPECT_EQ(held.checkTimeOut(), 1);
 }
 
 TEST_F(Refresh, AnEnumerationDuringARefreshStartsNothing)
@@ -179,10 +180,11 @@ TEST_F(Refresh, AWaiterWithoutARequestIsServedToo)
 {
     agent().m_bRefreshSANData = false;
     plain(agent().m_NVRHBA_FCPort_map);
-    Auto_Mutex lock(agent().m_SANMapsReadyMutex);
-    ASSERT_FALSE(agent().m_bIsSANMapsReady);
-    agent().waitForSANMaps();
-    EXPECT_TRUE(agent().m_bIsSANMapsReady);
+    ProviderAgent& held = agent();
+    Auto_Mutex lock(held.m_SANMapsReadyMutex);
+    ASSERT_FALSE(held.m_bIsSANMapsReady);
+    held.waitForSANMaps();
+    EXPECT_TRUE(held.m_bIsSANMapsReady);
 }
 
 TEST_F(Refresh, AnExceptionInAnUpdateRaisesTheFlagsAndTheNextRefreshRecovers)
@@ -232,11 +234,12 @@ TEST_F(Refresh, EveryClientSeesACompleteListWhileRefreshesRun)
 TEST_F(Refresh, TheAgentWaitSaysWhatItWaitsForAtTheFirstCallOnly)
 {
     fault("call = \"HBA_GetAdapterAttributes\", delay_ms = 100, times = 1");
+    ProviderAgent& held = agent();
     words();
     {
-        Agent_Wait wait(agent());
-        EXPECT_TRUE(agent().m_bIsAdapterMapsReady);
-        EXPECT_EQ(agent().m_DataMutex.try_lock(), 16);
+        Agent_Wait wait(held);
+        EXPECT_TRUE(held.m_bIsAdapterMapsReady);
+        EXPECT_EQ(held.m_DataMutex.try_lock(), 16);
     }
     settle();
     words();
@@ -276,6 +279,7 @@ TEST_F(Refresh, AHandlerThatThrowsEndsTheEnumerationWithItsWords)
                     },
                     nullptr});
     EXPECT_THAT(words(), Contains("Exception in CIM Provider Enumeration - do nothing"));
-    EXPECT_EQ(agent().m_DataMutex.try_lock(), 0); // no lock is left behind
-    agent().m_DataMutex.unlock();
+    Mutex& data = agent().m_DataMutex;
+    EXPECT_EQ(data.try_lock(), 0); // no lock is left behind
+    data.unlock();
 }
