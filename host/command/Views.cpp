@@ -33,7 +33,7 @@ const std::vector<View>& views()
           {"FCID", "FCID"},
           {"FabricName", "FABRIC"},
           {"NumberOfDiscoveredPorts", "TARGETS"},
-          {"Description", "ADAPTER"}}},
+          {"AdapterName", "ADAPTER"}}},
         {"NVRHBA_FCPortStatistics",
          {{"InstanceID", "PORT"},
           {"BytesTransmitted", "BYTES OUT"},
