@@ -174,7 +174,8 @@ NVR_IN_EVERY_MANNER(Lives);
 TEST_P(Lives, TenRoundsInOneProcessLeaveNothingBehind)
 {
     Rig rig({*GetParam()});
-    std::size_t memory = 0, files = 0, threads = 0;
+    [[maybe_unused]] std::size_t memory = 0;
+    std::size_t files = 0, threads = 0;
     for (int round = 0; round < 10; round++) {
         rig.server().reset_report();
         const std::size_t elements = ask_all(rig) + ask_all(rig);

@@ -1,0 +1,31 @@
+/// A CIM server over a simulated host of so many ports, without a trace: what the figures are taken on.
+///
+/// For programs in a private host. One at a time; the module of an earlier one has ended with it.
+#pragma once
+
+#include <string>
+
+#include "host/Host.h"
+
+namespace nvrbench {
+
+class Bench_Host {
+public:
+    /// Adapters of two ports, without targets.
+    explicit Bench_Host(unsigned ports);
+    ~Bench_Host() { m_server.stop(); }
+
+    host::Host& server() { return m_server; }
+    host::Answer enumerate(const std::string& class_name);
+
+private:
+    host::Host m_server;
+};
+
+/// The host's hardware, libraries and settings, without a server.
+void prepare_host(unsigned ports);
+
+/// Measures the first answer of a module in this fresh process and prints it; the exit status.
+int answer_first(unsigned ports);
+
+} // namespace nvrbench

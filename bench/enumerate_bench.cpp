@@ -1,0 +1,54 @@
+// One enumeration of the ports: the module against a provider written by hand in C, on the same broker.
+#include <dlfcn.h>
+#include <stdexcept>
+
+#include <benchmark/benchmark.h>
+
+#include "bench/Bench_Host.h"
+#include "tests/module/support/Rig.h"
+
+namespace {
+
+constexpr char name_space[] = "root/norvane";
+constexpr char port_class[] = "NVRHBA_FCPort";
+
+void ask(benchmark::State& state, host::Host& server)
+{
+    const auto ports = static_cast<std::size_t>(state.range(0));
+    std::size_t properties = 0;
+    for (auto _ : state) {
+        const host::Answer answer = server.enumerate(name_space, port_class);
+        if (answer.instances.size() != ports) throw std::runtime_error("not all ports were told");
+        properties = answer.instances.front().properties.size();
+    }
+    state.counters["per_instance"] = benchmark::Counter(
+        static_cast<double>(ports), benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
+    state.counters["properties"] = static_cast<double>(properties);
+}
+
+void enumerate_module(benchmark::State& state)
+{
+    nvrbench::Bench_Host host(static_cast<unsigned>(state.range(0)));
+    (void)host.enumerate(port_class);
+    ask(state, host.server());
+}
+
+void enumerate_floor(benchmark::State& state)
+{
+    void* library = dlopen(NVR_FLOOR, RTLD_NOW | RTLD_LOCAL);
+    if (!library) throw std::runtime_error(dlerror());
+    const auto set_ports = reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_ports"));
+    set_ports(static_cast<unsigned>(state.range(0)));
+    {
+        host::Host server(nvrtest::module_schema());
+        server.add({port_class, "NVRHBA_FCPort_Provider", NVR_FLOOR, host::instance_kind, {name_space}, false});
+        ask(state, server);
+    }
+    dlclose(library);
+}
+
+// The caller waits while the request runs on a thread of its own: wall time is what counts.
+BENCHMARK(enumerate_floor)->Arg(4)->Arg(100)->Arg(1000)->UseRealTime()->Unit(benchmark::kMicrosecond);
+BENCHMARK(enumerate_module)->Arg(4)->Arg(100)->Arg(1000)->UseRealTime()->Unit(benchmark::kMicrosecond);
+
+} // namespace
