@@ -592,12 +592,23 @@ TEST_F(SANUpdate, AnAdapterThatVanishesLeavesItsTargetsOut)
     EXPECT_EQ(value(first(agent().m_NVRHBA_SCSIProtocolEndpoint_map), "Name").substr(0, 16), "10000000C9A00002");
 }
 
-TEST_F(SANUpdate, TwoPortsOfOneAdapterSeeTheSameUnitsByDifferentWays)
+// An adapter has one mapping, and each of its ports takes all of it.
+TEST_F(SANUpdate, PortsOfOneAdapterHaveInstancesOfTheirOwn)
 {
-    scenario("[[adapter]]\nports = 2\n[[target]]\nluns = 2\n");
-    const auto ids = all(agent().m_NVRHBA_StorageVolume_map, "DeviceID");
-    EXPECT_THAT(std::set<std::string>(ids.begin(), ids.end()), SizeIs(ids.size()));
-    EXPECT_THAT(ids, Not(SizeIs(0)));
+    scenario("[[adapter]]\nports = 2\n[[target]]\nseen_by = [0]\n[[target]]\nseen_by = [1]\n");
+    EXPECT_THAT(all(agent().m_NVRHBA_SCSIProtocolEndpoint_map, "Name"),
+                ElementsAre("10000000C9A00001:50060E8005A10000:0000000000000000",
+                            "10000000C9A00001:50060E8005A10001:0000000000000000",
+                            "10000000C9A00002:50060E8005A10000:0000000000000000",
+                            "10000000C9A00002:50060E8005A10001:0000000000000000"));
+}
+
+TEST_F(SANUpdate, AUnitThatBothPortsOfAnAdapterSeeIsATwin)
+{
+    scenario("[[adapter]]\nports = 2\n[[target]]\nluns = 1\n");
+    EXPECT_THAT(all(agent().m_NVRHBA_SCSIProtocolEndpoint_map, "Name"),
+                ElementsAre("10000000C9A00001:50060E8005A10000:0000000000000000"));
+    EXPECT_EQ(update(), 32769u);
 }
 
 TEST_F(SANUpdate, ASecondRefreshLeavesTheSameInstances)
