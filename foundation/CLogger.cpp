@@ -4,6 +4,7 @@
 #include <cstdarg>
 #include <cstdio>
 #include <exception>
+#include <pthread.h>
 
 #include "foundation/Keep_Errno.h"
 #include "foundation/NVR_CIMLogger.h"
@@ -28,6 +29,19 @@ Mutex& dispatch_mutex()
     static Immortal<Mutex> mutex(false);
     return *mutex;
 }
+
+// A thread that is to be cancelled is not cancelled inside a scope of this: destructors log, and unwinding out of one
+// ends the process.
+class Hold_Off_Cancellation {
+public:
+    Hold_Off_Cancellation() { ::pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, &m_state); }
+    ~Hold_Off_Cancellation() { ::pthread_setcancelstate(m_state, nullptr); }
+    Hold_Off_Cancellation(const Hold_Off_Cancellation&) = delete;
+    Hold_Off_Cancellation& operator=(const Hold_Off_Cancellation&) = delete;
+
+private:
+    int m_state = PTHREAD_CANCEL_ENABLE;
+};
 
 bool of_known_kind(NVR_LoggerInterface* logger)
 {
@@ -82,6 +96,7 @@ void CLogger::log(const char* file, const uint32& line, sint32 level, const char
 {
     if (holds_dispatch_mutex || !wanted(level)) return;
     Keep_Errno keep_errno;
+    Hold_Off_Cancellation hold_off_cancellation;
     char fixed[1024];
     va_list arguments;
     va_start(arguments, format);

@@ -34,7 +34,8 @@ public:
 
     /// Formats by printf rules, without a limit, and hands the text to each logger in order of attachment, under the
     /// dispatch mutex. While logging is disabled and a system logger is attached, that one alone gets it, without the
-    /// mutex: who ends the system logger sees to it that no other thread still logs below NVR_DBG.
+    /// mutex: who ends the system logger sees to it that no other thread still logs below NVR_DBG. No cancellation
+    /// point, whatever the loggers do.
     void log(const char* file, const uint32& line, sint32 level, const char* format, ...)
         __attribute__((format(printf, 5, 6)));
 

@@ -6,6 +6,7 @@
 
 #include <fcntl.h>
 #include <gmock/gmock.h>
+#include <pthread.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -220,6 +221,21 @@ TEST_F(TraceFile, TakesRecordsOfManyThreadsWhole)
     const auto words = trace_file_words(path);
     EXPECT_EQ(words.size(), 2000u);
     EXPECT_THAT(words, testing::Each("0123456789"));
+}
+
+TEST_F(TraceFile, LetsACancelledThreadFinishWhatItMayNotLeave)
+{
+    ASSERT_EQ(file.setPath(path.c_str()), 0);
+    logger().setMode(2);
+    bool cancelled = true;
+    std::thread([&] {
+        ::pthread_cancel(::pthread_self());
+        [&]() noexcept { NVR_LOG("from a destructor"); }(); // unwinding out of it would end the process
+        ::pthread_testcancel();
+        cancelled = false;
+    }).join();
+    EXPECT_TRUE(cancelled) << "afterwards";
+    EXPECT_THAT(trace_file_words(path), ElementsAre("from a destructor"));
 }
 
 TEST(EndedTraceFile, IsLetGoAndNoLongerCalled)
