@@ -2,9 +2,11 @@
 #include "simulator/Call.h"
 
 #include <algorithm>
+#include <atomic>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -12,12 +14,44 @@ using namespace nvrsim;
 
 namespace {
 
-/// The scenario's directory, or one for this process under the system's temporary one; made when it is first needed.
+/// The directory that this process has under the system's temporary one, once there is one.
+struct Own_Directory {
+    std::string path;
+    pid_t process;
+};
+
+std::atomic<const Own_Directory*> ownDirectory{nullptr};
+
+/// The scenario's directory, or the process's own; made when it is first needed.
 std::string directory_of(const Port& port)
 {
     if (!port.dumpDirectory.empty()) return port.dumpDirectory;
     const char* base = std::getenv("TMPDIR");
     return std::string(base && *base ? base : "/tmp") + "/nvrsim-dumps-" + std::to_string(::getpid());
+}
+
+/// Makes the directory if it is not there. False for the process's own if it is somebody else's, or a link.
+bool make_directory(const Port& port)
+{
+    const std::string directory = directory_of(port);
+    ::mkdir(directory.c_str(), 0700);
+    if (!port.dumpDirectory.empty()) return true; // what it lacks shows when a file is written
+    struct stat status;
+    if (::lstat(directory.c_str(), &status) != 0 || !S_ISDIR(status.st_mode) || status.st_uid != ::geteuid())
+        return false;
+    const Own_Directory* own = ownDirectory;
+    if (!own || own->path != directory) ownDirectory = new Own_Directory{directory, ::getpid()};
+    return true;
+}
+
+/// When the process ends in good order nobody can ask for the dumps in its own directory any more. A child of a fork
+/// leaves those of its parent.
+__attribute__((destructor)) void drop_own_directory()
+{
+    const Own_Directory* own = ownDirectory;
+    if (!own || own->process != ::getpid()) return;
+    std::error_code ignored;
+    std::filesystem::remove_all(own->path, ignored);
 }
 
 void remove_dump(const Port& port, const std::string& name)
@@ -27,11 +61,10 @@ void remove_dump(const Port& port, const std::string& name)
 
 uint32_t generate(Port& port, const char* kind)
 {
-    const std::string directory = directory_of(port);
-    ::mkdir(directory.c_str(), 0700); // may be there already
+    if (!make_directory(port)) return RM_STATUS_DIRECTORY_NOT_OPENED;
     char name[sizeof(RM_DUMPNAME::name)];
     std::snprintf(name, sizeof name, "NVR_%s_%s_%04u.dmp", to_text(port.current.wwpn).c_str(), kind, ++port.dumpsMade);
-    const std::string path = directory + "/" + name;
+    const std::string path = directory_of(port) + "/" + name;
     std::FILE* file = std::fopen(path.c_str(), "wb");
     if (!file) return RM_STATUS_DIRECTORY_NOT_OPENED;
     const bool printed = std::fprintf(file, "dump %s of port %s\n", kind, to_text(port.current.wwpn).c_str()) > 0;

@@ -3,6 +3,7 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 class Services : public Simulated {
@@ -203,12 +204,13 @@ TEST_F(Services, FirmwareImageIsReallyChecked)
 
 TEST_F(Services, ResettingAdapterIsBusyForAWhile)
 {
-    load("[[adapter]]\n[[adapter.port]]\nreset_ms = 30\n");
+    load("[[adapter]]\n[[adapter.port]]\nreset_ms = 3600000\n[[adapter]]\n[[adapter.port]]\nreset_ms = 30\n");
     uint32_t type = 0;
     ASSERT_EQ(0u, nvrsim_RM_ResetHBA(wire(port0), 1));
     EXPECT_EQ(64u, nvrsim_RM_GetDriverType(wire(port0), &type));
+    ASSERT_EQ(0u, nvrsim_RM_ResetHBA(wire(port1), 1));
     usleep(40000);
-    EXPECT_EQ(0u, nvrsim_RM_GetDriverType(wire(port0), &type));
+    EXPECT_EQ(0u, nvrsim_RM_GetDriverType(wire(port1), &type));
 }
 
 TEST_F(Services, DumpsAreFilesAndTheOldestGoWithTheRetentionCount)
@@ -237,6 +239,37 @@ TEST_F(Services, DumpsAreFilesAndTheOldestGoWithTheRetentionCount)
     EXPECT_EQ(0u, nvrsim_RM_SetDumpRetentionCount(wire(port0), 20));
     EXPECT_EQ(0u, nvrsim_RM_GetDumpRetentionCount(wire(port0), &count));
     EXPECT_EQ(20u, count);
+}
+
+TEST_F(Services, DumpsInTheProcesssOwnDirectoryGoWithIt)
+{
+    const std::string temporary = temporary_directory();
+    const pid_t child = fork();
+    if (child == 0) {
+        setenv("TMPDIR", temporary.c_str(), 1);
+        char told[RM_DUMP_DIRECTORY_SIZE];
+        const bool made = nvrsim_RM_GenerateDump(wire(0), wire(port0)) == 0 &&
+                          nvrsim_RM_GetDumpDirectoryA(wire(port0), told, sizeof told) == 0 && access(told, R_OK) == 0 &&
+                          nvrsim_reset() == 0 && nvrsim_RM_GenerateEfdDump(wire(port0), 0, 0) == 0;
+        std::exit(made ? 0 : 1);
+    }
+    int status = -1;
+    ASSERT_EQ(child, waitpid(child, &status, 0));
+    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
+    EXPECT_EQ(0, rmdir(temporary.c_str())) << "nothing is left";
+}
+
+TEST_F(Services, DumpsFollowNoLinkThatStandsInThePlaceOfTheOwnDirectory)
+{
+    const std::string temporary = temporary_directory(), elsewhere = temporary_directory();
+    const std::string link = temporary + "/nvrsim-dumps-" + std::to_string(getpid());
+    ASSERT_EQ(0, symlink(elsewhere.c_str(), link.c_str()));
+    setenv("TMPDIR", temporary.c_str(), 1);
+    EXPECT_EQ(unsigned(RM_STATUS_DIRECTORY_NOT_OPENED), nvrsim_RM_GenerateDump(wire(0), wire(port0)));
+    unsetenv("TMPDIR");
+    EXPECT_EQ(0, rmdir(elsewhere.c_str())) << "nothing is written there";
+    unlink(link.c_str());
+    rmdir(temporary.c_str());
 }
 
 TEST_F(Services, TagTableIsReadBackAsWritten)
