@@ -11,6 +11,8 @@ namespace {
 
 constexpr uint64_t mostAdapters = 65536;
 constexpr uint64_t mostLuns = 65536;
+constexpr uint64_t mostUnits = 1 << 20; // of the whole host: more than that would eat up the process's memory
+constexpr uint64_t mostViews = 1 << 22; // of a target by a port
 
 struct Seen_Target {
     std::shared_ptr<Target> target;
@@ -114,8 +116,9 @@ private:
             Lun_Numbers numbers;
             uint32_t luns = fields.has("lun") ? 0 : 1;
             fields.number("luns", luns, 0, mostLuns);
+            refuse_too_many(fields, luns * (count - i));
             for (uint32_t n = 0; n < luns; ++n)
-                add_lun(target, n, m_nothing, numbers);
+                add_lun(fields, target, n, m_nothing, numbers);
             for (const toml::table* lun : fields.tables("lun")) {
                 Fields inner(m_file, *lun, m_lunDefaults);
                 uint32_t number = static_cast<uint32_t>(target.luns.size());
@@ -123,10 +126,10 @@ private:
                 uint32_t many = 1;
                 inner.number("count", many, 1, mostLuns);
                 for (uint32_t n = 0; n < many; ++n)
-                    add_lun(target, number + n, *lun, numbers);
+                    add_lun(inner, target, number + n, *lun, numbers);
             }
             index(fields, target);
-            m_targets.push_back(std::move(seen));
+            keep(fields, std::move(seen));
         }
         fields.refuse_unknown();
     }
@@ -157,9 +160,17 @@ private:
 
     using Lun_Numbers = std::unordered_map<uint32_t, size_t>; // place of each unit of a target, by its number here
 
-    /// A number that the target has already replaces that unit.
-    void add_lun(Target& target, uint32_t number, const toml::table& table, Lun_Numbers& numbers)
+    /// Before they are made, so that no refusal costs the memory first.
+    void refuse_too_many(const Fields& at, uint64_t units) const
     {
+        if (m_units + units > mostUnits) at.fail("too many logical units: more than " + std::to_string(mostUnits));
+    }
+
+    /// A number that the target has already replaces that unit.
+    void add_lun(const Fields& at, Target& target, uint32_t number, const toml::table& table, Lun_Numbers& numbers)
+    {
+        refuse_too_many(at, 1);
+        ++m_units;
         Lun lun = default_lun(target, number);
         if (&table != &m_nothing || m_lunDefaults) { // plain units, of which there can be many, are as they are
             Fields fields(m_file, table, m_lunDefaults);
@@ -173,7 +184,7 @@ private:
             target.luns[place->second] = std::move(lun);
     }
 
-    void index(Fields& fields, Target& target)
+    void index(const Fields& fields, Target& target)
     {
         target.byFcpLun.reserve(target.luns.size());
         for (uint32_t i = 0; i < target.luns.size(); ++i) {
@@ -194,6 +205,14 @@ private:
         seen.target->wwnn = firstTargetNode + number;
         seen.target->fcId = 0x020000 + number;
         return seen;
+    }
+
+    void keep(const Fields& at, Seen_Target seen)
+    {
+        m_views += seen.byAll ? m_ports : seen.ordinals.size();
+        if (m_views > mostViews)
+            at.fail("too many targets: more than " + std::to_string(mostViews) + " views of one by a port");
+        m_targets.push_back(std::move(seen));
     }
 
     void read_generated_adapters()
@@ -220,14 +239,18 @@ private:
 
     void read_generated_targets()
     {
+        const toml::table* table = m_root.table("generate");
+        if (!table) return;
+        const Fields fields(m_file, *table);
+        refuse_too_many(fields, uint64_t(m_generatedTargets) * m_generatedLuns);
         for (uint32_t t = 0; t < m_generatedTargets; ++t) {
             Seen_Target seen = make_target();
             Lun_Numbers numbers;
             seen.target->luns.reserve(m_generatedLuns);
             for (uint32_t n = 0; n < m_generatedLuns; ++n)
-                add_lun(*seen.target, n, m_nothing, numbers);
-            index(m_root, *seen.target);
-            m_targets.push_back(std::move(seen));
+                add_lun(fields, *seen.target, n, m_nothing, numbers);
+            index(fields, *seen.target);
+            keep(fields, std::move(seen));
         }
     }
 
@@ -268,6 +291,7 @@ private:
     Scenario m_scenario;
     std::vector<Seen_Target> m_targets;
     uint32_t m_ports = 0;
+    uint64_t m_units = 0, m_views = 0;
     uint32_t m_generatedTargets = 0, m_generatedLuns = 0;
     bool m_allowTwins = false;
     const toml::table m_nothing;

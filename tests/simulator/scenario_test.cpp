@@ -62,6 +62,12 @@ TEST(Scenario, WhatIsWrongIsToldWithFileLineAndReason)
         {"[[fault]]\nstatus = 1\n", "bad.toml:1: a fault needs a \"call\""},
         {"[defaults.port]\ncolour = 1\n[[adapter]]\n", "bad.toml:2: unknown key \"colour\""},
         {"[generate]\nports = 70000\n", "bad.toml:2: \"ports\" must lie between 0 and 65536"},
+        {"\n[generate]\nports = 1\ntargets = 65536\nluns = 65536\n",
+         "bad.toml:2: too many logical units: more than 1048576"},
+        {"[[adapter]]\n[[target]]\ncount = 17\nluns = 65536\n",
+         "bad.toml:2: too many logical units: more than 1048576"},
+        {"[[adapter]]\nports = 256\n[[target]]\ncount = 16385\nluns = 0\n",
+         "bad.toml:3: too many targets: more than 4194304 views of one by a port"},
     };
     for (const Wrong& row : rows)
         EXPECT_EQ(row.message, refusal(row.toml)) << row.toml;
