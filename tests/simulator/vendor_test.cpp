@@ -44,7 +44,7 @@ void remember(void*, HBA_WWN, HBA_UINT32 type, HBA_UINT32)
 
 TEST(VendorPlugin, SystemLibraryListsAndReadsTheSimulatedAdapters)
 {
-    if (!private_mounts()) GTEST_SKIP() << "no namespaces here";
+    ASSERT_TRUE(private_mounts()) << "run as root, or allow user namespaces: " << strerror(errno);
     ASSERT_EQ(0, mount(NVRSIM_HBA_CONF, "/etc/hba.conf", nullptr, MS_BIND, nullptr)) << strerror(errno);
     void* library = dlopen("libHBAAPI.so.2", RTLD_NOW);
     ASSERT_NE(nullptr, library) << dlerror();
