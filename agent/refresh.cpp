@@ -5,6 +5,7 @@
 #include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "inventory/NVR_Data.h"
+#include "runtime/Forced_Unwind.h"
 
 namespace cimple {
 
@@ -19,6 +20,18 @@ void raise(std::atomic<bool>& ready, Mutex& mutex, Cond& condition)
     ready = true;
     condition.broadcast();
 }
+
+/// Counts a waiting thread, also one that is cancelled while it waits.
+class Waiter {
+public:
+    explicit Waiter(std::atomic<uint32>& count) : m_count(count) { m_count++; }
+    ~Waiter() { m_count--; }
+    Waiter(const Waiter&) = delete;
+    Waiter& operator=(const Waiter&) = delete;
+
+private:
+    std::atomic<uint32>& m_count;
+};
 
 } // namespace
 
@@ -85,7 +98,7 @@ bool ProviderAgent::startFetchThread()
     return false;
 }
 
-/// No thread will: so that no caller waits for ever. The maps are as the last refresh left them.
+/// For what no thread will raise: so that no caller waits for ever. The maps are as the last refresh left them.
 void ProviderAgent::raiseReadyFlags()
 {
     raise(m_bIsAdapterDataReady, m_AdapterDataReadyMutex, m_AdapterDataReadyCond);
@@ -115,7 +128,7 @@ void ProviderAgent::joinFetchThread()
 
 void ProviderAgent::waitForSANMaps()
 {
-    m_SANWaiters++;
+    const Waiter waiter(m_SANWaiters);
     bool served;
     {
         // The fetch thread's last look is under this mutex too: either it sees us, or we see that it is gone.
@@ -128,7 +141,6 @@ void ProviderAgent::waitForSANMaps()
         m_bIsSANMapsReady = true;
         m_SANMapsReadyCond.broadcast();
     }
-    m_SANWaiters--;
 }
 
 void* ProviderAgent::DataFetch_Handler(void* argument)
@@ -137,7 +149,12 @@ void* ProviderAgent::DataFetch_Handler(void* argument)
     auto* agent = static_cast<ProviderAgent*>(argument);
     if (agent) {
         markFetchThread();
-        if (!guarded([agent] { agent->fetchData(); })) agent->abandonFetch();
+        try {
+            agent->fetchData();
+        } catch (...) {
+            agent->abandonFetch();
+            if (is_forced_unwind()) throw;
+        }
     } else
         NVR_LOG("Error in converting the pointer to ProviderAgent");
     NVR_LOG("PERF: DataFetch_Handler Thread END");
@@ -156,14 +173,13 @@ void ProviderAgent::fetchData()
     } while (!nothingLeftToFetch());
 }
 
-/// Even the words between the phases could not be said for want of memory: the next call starts anew, and nobody waits.
+/// The thread ends inside a refresh, cancelled or for want of memory: the next call starts anew, and nobody waits.
 void ProviderAgent::abandonFetch()
 {
-    {
-        Auto_Mutex lock(m_DataFetchMutex);
-        m_bDataFetchRunning = false;
-    }
+    // First the flags: once the thread counts as gone, a caller that holds their mutexes may join it.
     raiseReadyFlags();
+    Auto_Mutex lock(m_DataFetchMutex);
+    m_bDataFetchRunning = false;
 }
 
 bool ProviderAgent::SANMapsMissed() const

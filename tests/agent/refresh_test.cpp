@@ -1,4 +1,5 @@
 #include <atomic>
+#include <pthread.h>
 #include <stdexcept>
 #include <thread>
 #include <unistd.h>
@@ -197,6 +198,50 @@ TEST_F(Refresh, AnExceptionInAnUpdateRaisesTheFlagsAndTheNextRefreshRecovers)
     refresh();
     EXPECT_THAT(plain(agent().m_NVRHBA_FCPort_map), SizeIs(1));
     EXPECT_THAT(words(), Not(Contains("No FC card found")));
+}
+
+TEST_F(Refresh, AThreadThatIsEndedInsideARefreshLeavesNobodyWaiting)
+{
+    on_driver_log = [](ProviderAgent&) { pthread_exit(nullptr); };
+    Instances all;
+    enumeratePlain(agent(), agent().m_NVRHBA_FCPort_map, {collect, &all});
+    EXPECT_THAT(all, SizeIs(1)); // the maps as far as they got
+    while (agent().m_bDataFetchRunning)
+        usleep(1000);
+    EXPECT_THAT(words(), Not(Contains("PERF: DataFetch_Handler Thread END")));
+    on_driver_log = nullptr;
+    listenAgain();
+    EXPECT_THAT(plain(agent().m_NVRHBA_FCPort_map), SizeIs(1));
+    EXPECT_THAT(words(), contains_in_order({"PERF: Clearing the previous thread...with join", building_adapters,
+                                            "PERF: updateAdapterMaps: cleanExit", building_targets}));
+}
+
+TEST_F(Refresh, AClientThatIsCancelledWhileItWaitsIsNotServedForEver)
+{
+    agent().m_bRefreshSANData = false;
+    plain(agent().m_NVRHBA_FCPort_map);
+    fault("call = \"HBA_GetFcpTargetMapping\", delay_ms = 300, times = 1");
+    pthread_t client;
+    ASSERT_EQ(pthread_create(
+                  &client, nullptr,
+                  [](void* held) -> void* {
+                      auto& agent = *static_cast<ProviderAgent*>(held);
+                      enumerateSAN(agent, agent.m_NVRHBA_StorageVolume_map, {collect, nullptr});
+                      return nullptr;
+                  },
+                  &agent()),
+              0);
+    while (agent().m_SANWaiters == 0)
+        usleep(1000);
+    ASSERT_EQ(pthread_cancel(client), 0);
+    void* result = nullptr;
+    ASSERT_EQ(pthread_join(client, &result), 0);
+    EXPECT_EQ(result, PTHREAD_CANCELED);
+    EXPECT_EQ(agent().m_SANWaiters, 0u);
+    settle();
+    words();
+    refresh();
+    EXPECT_THAT(words(), Not(Contains(building_targets)));
 }
 
 TEST_F(Refresh, EveryClientSeesACompleteListWhileRefreshesRun)
