@@ -2,6 +2,7 @@
 #include "agent/ProviderAgent.h"
 
 #include <cerrno>
+#include <new>
 #include <unistd.h>
 
 #include "agent/fatal_signal.h"
@@ -40,7 +41,8 @@ void ProviderAgent::construct(int errno_found)
     if (loadLibraries() == 1) NVR_LOG("Error : In Loading Library ");
     const uint32 status = CPQFC_LoadLibrary();
     if (status != 0) NVR_LOG("Provider Agent::CPQFC_LoadLibrary() Failed:%d ", static_cast<int>(status));
-    m_pMethodWrapper.reset(new NVR_MethodWrapper);
+    m_pMethodWrapper.reset(new (std::nothrow) NVR_MethodWrapper);
+    if (!m_pMethodWrapper) NVR_LOG("Error : Could not allocate RMAPI --returning ");
 
     NVR_LOG("Initializing Data Pointer ");
     m_pData.reset(new NVR_Data);

@@ -70,8 +70,8 @@ public:
     /// having made sure that a fetch thread serves it.
     void waitForSANMaps();
 
-    // ------------------------------------------------------------------------- live values (under the Agent_Wait
-    // locks)
+    // ---------------------------------------------------------------------- live values (under the locks of
+    // Agent_Wait)
 
     /// Copies the counters of every port into the statistics instances.
     void GetFCPortStats();

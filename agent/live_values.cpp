@@ -71,9 +71,9 @@ public:
 
     T* find(const std::string& wwpn)
     {
-        if (m_next < m_map.size() && (m_map[m_next]->*m_key).value == wwpn.c_str()) return m_map[m_next++];
+        if (m_next < m_map.size() && names(m_next, wwpn)) return m_map[m_next++];
         for (std::size_t i = 0; i < m_map.size(); i++) {
-            if (!std::strstr((m_map[i]->*m_key).value.c_str(), wwpn.c_str())) continue;
+            if (!names(i, wwpn)) continue;
             m_next = i + 1;
             return m_map[i];
         }
@@ -81,6 +81,11 @@ public:
     }
 
 private:
+    bool names(std::size_t index, const std::string& wwpn) const
+    {
+        return std::strstr((m_map[index]->*m_key).value.c_str(), wwpn.c_str()) != nullptr;
+    }
+
     const Map<T>& m_map;
     Property<String> T::*m_key;
     std::size_t m_next = 0;
@@ -92,7 +97,7 @@ void ProviderAgent::GetFCPortStats()
 {
     NVR_LOG("PERF: GetFCPortStats: Entry");
     if (!m_pData || !m_pData->haveAdapters()) return;
-    Finder<NVRHBA_FCPortStatistics> instances(m_NVRHBA_FCPortStatistics_map, &NVRHBA_FCPortStatistics::ElementName);
+    Finder<NVRHBA_FCPortStatistics> instances(m_NVRHBA_FCPortStatistics_map, &NVRHBA_FCPortStatistics::InstanceID);
     const bool walked = guarded([&] {
         walkFCPorts(*m_pData, [&](FCAdapter&, FCPort& port) {
             auto* instance = instances.find(port.portName());

@@ -27,7 +27,7 @@ extern std::function<void(cimple::ProviderAgent&)> on_driver_log;
 /// True: the next threads cannot be created.
 extern bool no_more_threads;
 
-/// Simulated minutes go by.
+/// So many microseconds go by on the agent's clock.
 void advance_clock(cimple::uint64 usec);
 constexpr cimple::uint64 second = 1000000;
 constexpr cimple::uint64 minute = 60 * second;
