@@ -13,8 +13,10 @@ namespace {
 
 constexpr uint32 usec_per_minute = 60000000;
 
+/// Asks before it locks: who waits for the maps holds the mutex of the data, whose flag it has seen up.
 void raise(std::atomic<bool>& ready, Mutex& mutex, Cond& condition)
 {
+    if (ready) return;
     Auto_Mutex lock(mutex);
     if (ready) return;
     ready = true;

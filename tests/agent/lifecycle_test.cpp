@@ -128,8 +128,7 @@ TEST_F(Lifecycle, TenRoundsEachLoadBindAndShowThePortAgain)
     for (int round = 0; round < 10; round++) {
         ASSERT_EQ(load(), 0);
         EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
-        EXPECT_EQ(san(agent().m_NVRHBA_SCSIProtocolEndpoint_map).size(),
-                  agent().m_NVRHBA_SCSIProtocolEndpoint_map.size());
+        EXPECT_EQ(san(agent().m_NVRHBA_SCSIProtocolEndpoint_map).size(), 2u);
         unload();
         EXPECT_EQ(nvrsim_open_handles(), 0u);
         EXPECT_FALSE(exists(guard_name()));

@@ -202,9 +202,12 @@ TEST_F(Refresh, AnExceptionInAnUpdateRaisesTheFlagsAndTheNextRefreshRecovers)
 
 TEST_F(Refresh, AThreadThatIsEndedInsideARefreshLeavesNobodyWaiting)
 {
-    on_driver_log = [](ProviderAgent&) { pthread_exit(nullptr); };
+    on_driver_log = [](ProviderAgent&) {
+        usleep(50000); // the client holds the mutex of the data by now, and waits for the maps
+        pthread_exit(nullptr);
+    };
     Instances all;
-    enumeratePlain(agent(), agent().m_NVRHBA_FCPort_map, {collect, &all});
+    enumerateActive<&ProviderAgent::GetFCPortStats>(agent(), agent().m_NVRHBA_FCPortStatistics_map, {collect, &all});
     EXPECT_THAT(all, SizeIs(1)); // the maps as far as they got
     while (agent().m_bDataFetchRunning)
         usleep(1000);
@@ -276,11 +279,32 @@ TEST_F(Refresh, EveryClientSeesACompleteListWhileRefreshesRun)
     EXPECT_EQ(incomplete, 0);
 }
 
-TEST_F(Refresh, TheAgentWaitSaysWhatItWaitsForAtTheFirstCallOnly)
+TEST_F(Refresh, TheLocksSayWhatTheyWaitFor)
 {
-    fault("call = \"HBA_GetAdapterAttributes\", delay_ms = 100, times = 1");
     ProviderAgent& held = agent();
     words();
+    std::thread client([&] { Agent_Locks locks(held, Words::spoken); });
+    const auto raise = [&](std::atomic<bool>& ready, Mutex& mutex, Cond& condition, const char* waiting) {
+        while (count(log->words(), waiting) == 0)
+            usleep(1000);
+        Auto_Mutex lock(mutex);
+        ready = true;
+        condition.broadcast();
+    };
+    raise(held.m_bIsAdapterDataReady, held.m_AdapterDataReadyMutex, held.m_AdapterDataReadyCond,
+          "PERF: Waiting for m_AdapterDataReadyMutex");
+    raise(held.m_bIsAdapterMapsReady, held.m_AdapterMapsReadyMutex, held.m_AdapterMapsReadyCond,
+          "PERF: Waiting for m_AdapterMapsReadyMutex");
+    client.join();
+    EXPECT_EQ(words(), (std::vector<std::string>{"PERF: Waiting for m_AdapterDataReadyMutex",
+                                                 "PERF: Woken up from wait for m_AdapterDataReadyMutex",
+                                                 "PERF: Waiting for m_AdapterMapsReadyMutex",
+                                                 "PERF: Woken up from wait for m_AdapterMapsReadyMutex"}));
+}
+
+TEST_F(Refresh, TheAgentWaitHoldsItsLocksAndIsSilentOnceTheMapsAreReady)
+{
+    ProviderAgent& held = agent();
     {
         Agent_Wait wait(held);
         EXPECT_TRUE(held.m_bIsAdapterMapsReady);
