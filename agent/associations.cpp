@@ -17,8 +17,8 @@ Instance_Map& map_of(ProviderAgent& agent)
     return agent.*member;
 }
 
-constexpr const char* norvane = "root/norvane";
-constexpr const char* interop = "root/pg_interop";
+constexpr const char* norvane = norvane_name_space;
+constexpr const char* interop = interop_name_space;
 
 // One row an association class: its ends in the order of the arguments, its trace line, its words for a refused insert
 // and for a missing end, its namespace.

@@ -8,9 +8,6 @@
 
 namespace cimple {
 
-const char* const norvane_name_space = "root/norvane";
-const char* const interop_name_space = "root/pg_interop";
-
 String text(const char* format, ...)
 {
     char buffer[256];

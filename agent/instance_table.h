@@ -13,8 +13,8 @@
 
 namespace cimple {
 
-extern const char* const norvane_name_space; // "root/norvane"
-extern const char* const interop_name_space; // "root/pg_interop"
+constexpr const char* norvane_name_space = "root/norvane";
+constexpr const char* interop_name_space = "root/pg_interop";
 
 template <class T>
 Ref<T> make(const char* name_space = norvane_name_space)

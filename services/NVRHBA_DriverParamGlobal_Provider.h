@@ -1,4 +1,4 @@
-/// Serves the driver's parameters, with their current values read anew.
+/// Serves the driver's parameters that all ports share, with their current values read anew.
 #pragma once
 
 #include "agent/Read_Only_Provider.h"

@@ -1,4 +1,4 @@
-/// Serves the dump service of the host. Its instance comes from the agent's map; methods not named here are not
+/// Serves the dump service of the host. Its instance comes from the agent's map; its methods are answered as not
 /// supported.
 #pragma once
 

@@ -1,4 +1,4 @@
-/// Serves the WWN management service of the host. Its instance comes from the agent's map; methods not named here are
+/// Serves the WWN management service of the host. Its instance comes from the agent's map; its methods are answered as
 /// not supported.
 #pragma once
 

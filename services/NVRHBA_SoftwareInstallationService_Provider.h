@@ -1,5 +1,5 @@
-/// Serves the firmware installation service of the host. Its instance comes from the agent's map; methods not named
-/// here are not supported.
+/// Serves the firmware installation service of the host. Its instance comes from the agent's map; its methods, but for
+/// StartService, are answered as not supported.
 #pragma once
 
 #include "agent/Read_Only_Provider.h"
