@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <new>
+#include <pthread.h>
 #include <stdio_ext.h>
 #include <sys/stat.h>
 
@@ -32,16 +33,22 @@ std::FILE* log_file = nullptr;
 int log_lock_file = -1;
 std::atomic<bool> warnings_enabled{true};
 
-/// A message of ours leaves the caller's errno alone.
-class Keep_Errno {
+/// A message of ours leaves the caller's errno alone, and is no point where the thread can be cancelled: destructors
+/// log, and a thread that unwinds out of one ends the process.
+class Undisturbed {
 public:
-    Keep_Errno() : m_errno(errno) {}
-    ~Keep_Errno() { errno = m_errno; }
-    Keep_Errno(const Keep_Errno&) = delete;
-    Keep_Errno& operator=(const Keep_Errno&) = delete;
+    Undisturbed() : m_errno(errno) { pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, &m_cancel_state); }
+    ~Undisturbed()
+    {
+        pthread_setcancelstate(m_cancel_state, nullptr);
+        errno = m_errno;
+    }
+    Undisturbed(const Undisturbed&) = delete;
+    Undisturbed& operator=(const Undisturbed&) = delete;
 
 private:
     int m_errno;
+    int m_cancel_state = PTHREAD_CANCEL_ENABLE;
 };
 
 bool is_blank(char c)
@@ -181,7 +188,7 @@ void write_line(const String& line)
 
 bool log_open_and_ask(Log_Level level)
 {
-    const Keep_Errno keep;
+    const Undisturbed undisturbed;
     if (log_threshold.load(std::memory_order_acquire) == INT_MAX) {
         Auto_Mutex hold(log_mutex);
         if (!log_asked) {
@@ -200,7 +207,7 @@ bool log_open_and_ask(Log_Level level)
 void log_write(Log_Level level, const char* file, int line, const char* format, ...)
 {
     if (!log_wanted(level)) return;
-    const Keep_Errno keep;
+    const Undisturbed undisturbed;
     std::va_list arguments;
     va_start(arguments, format);
     try {

@@ -24,7 +24,7 @@ inline bool log_wanted(Log_Level level)
     return level <= log_threshold.load(std::memory_order_acquire) && log_open_and_ask(level);
 }
 
-/// Writes one line by printf rules. Never fails, leaves errno as it was.
+/// Writes one line by printf rules. Never fails, leaves errno as it was, and is no cancellation point.
 void log_write(Log_Level level, const char* file, int line, const char* format, ...)
     __attribute__((format(printf, 4, 5)));
 

@@ -6,6 +6,7 @@
 #include <fstream>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <pthread.h>
 #include <string>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -201,6 +202,23 @@ TEST_F(RuntimeLog, ErrnoStaysAsItWas)
         CIMPLE_DBG("closed");
         EXPECT_EQ(errno, 77);
     });
+}
+
+TEST_F(RuntimeLog, AThreadIsNotCancelledInAMessage)
+{
+    configure("LOG_LEVEL=DBG\n");
+    in_child([] {
+        bool came_back = false;
+        std::thread([&came_back] {
+            pthread_cancel(pthread_self());
+            for (int i = 0; i < 2; ++i) // opens the log, then writes to it
+                CIMPLE_DBG("message %d", i);
+            came_back = true;
+            pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, nullptr); // a std::thread cannot be cancelled
+        }).join();
+        EXPECT_TRUE(came_back);
+    });
+    EXPECT_EQ(lines().size(), 2u);
 }
 
 TEST_F(RuntimeLog, FilesThatCannotBeOpenedKeepItOff)
