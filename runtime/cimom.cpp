@@ -47,7 +47,7 @@ int cimom::enum_instances(const char* name_space, const Instance* model, Instanc
     return enumerator.m_rep ? 0 : -1;
 }
 
-int cimom::enum_instances(const char*, const Instance*, Array<Instance*>&)
+int cimom::enum_instances(const char*, const Instance*, Array<Instance>&)
 {
     std::printf("NOT IMPLEMENTED.");
     std::fflush(stdout);

@@ -34,7 +34,7 @@ public:
     /// Opens an enumeration of the model's class; one that `enumerator` still holds is destroyed first. 0 or -1.
     static int enum_instances(const char* name_space, const Instance* model, Instance_Enumerator& enumerator);
     /// Not to be called: writes "NOT IMPLEMENTED." and ends the process by assertion.
-    static int enum_instances(const char* name_space, const Instance* model, Array<Instance*>& instances);
+    static int enum_instances(const char* name_space, const Instance* model, Array<Instance>& instances);
     /// An instance with one count for the caller, or null.
     static Instance* get_instance(const char* name_space, const Instance* model);
     /// 0 or -1.
