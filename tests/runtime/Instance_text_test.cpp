@@ -1,9 +1,9 @@
-#include <clocale>
 #include <gtest/gtest.h>
 #include <limits>
 #include <string>
 
 #include "runtime/Instance.h"
+#include "tests/runtime/Comma_Locale.h"
 #include "tests/runtime/Test_Classes.h"
 
 using namespace cimple;
@@ -99,6 +99,8 @@ TEST(ModelPath, OddTypesAreWrittenAndRefused)
     const std::string text = "Test_Odd_Keys.Real32=1.500000,Real64=-2.250000,Char16='x',When=00000000000500.000000:000";
     EXPECT_EQ(path_of(odd.get()), text);
     EXPECT_FALSE(is_read(&Test_Odd_Keys::meta, text));
+    const Comma_Locale comma;
+    EXPECT_EQ(path_of(odd.get()), text) << "in every locale";
 }
 
 TEST(ModelPath, ReferencesNestBetweenEscapedQuotes)

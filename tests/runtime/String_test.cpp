@@ -1,6 +1,5 @@
 #include "runtime/String.h"
 
-#include <clocale>
 #include <gtest/gtest.h>
 #include <string>
 #include <thread>

@@ -1,9 +1,10 @@
 #include "runtime/strings.h"
 
-#include <clocale>
 #include <gtest/gtest.h>
 #include <limits>
 #include <string>
+
+#include "tests/runtime/Comma_Locale.h"
 
 using namespace cimple;
 
@@ -114,11 +115,10 @@ TEST(RealText, AStrictFormIsRead)
 
 TEST(RealText, TheLocaleOfTheServerDoesNotMatter)
 {
-    // A locale with a decimal comma, where the system has one.
-    const bool has_comma = std::setlocale(LC_ALL, "de_DE.UTF-8") || std::setlocale(LC_ALL, "de_DE");
+    const Comma_Locale comma;
+    ASSERT_EQ(std::strtod("1.5", nullptr), 1.0) << "the locale is in force";
     expect_read<real64>(str_to_real64, "1.5", 1.5);
-    std::setlocale(LC_ALL, "C");
-    if (!has_comma) GTEST_SKIP() << "this system has no locale with a decimal comma";
+    expect_refused<real64>(str_to_real64, "1,5");
 }
 
 TEST(BooleanText, TheTwoWordsInAnyCase)
