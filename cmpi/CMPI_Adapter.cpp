@@ -107,10 +107,12 @@ void CMPI_Adapter::start(const CMPIContext* context, const char* provider_name, 
     call(OP_LOAD, provider);
     call(OP_GET_META_CLASS, &meta_class);
     log_return("CMPI_Adapter");
+    m_started = true;
 }
 
 CMPI_Adapter::~CMPI_Adapter()
 {
+    if (!m_started) return;
     log_enter("~CMPI_Adapter");
     log_return("~CMPI_Adapter");
 }

@@ -104,6 +104,7 @@ private:
     }
 
     std::atomic<uint32> m_users;
+    bool m_started = false; // wholly built: only such an adapter has an end to tell of
 };
 
 /// One count of an adapter: of a table set's for the length of a call, or none.

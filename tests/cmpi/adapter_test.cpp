@@ -399,6 +399,15 @@ TEST_F(Adapter, TheLogTellsTheLifeOfAnAdapter)
                                          "DBG return: ~CMPI_Adapter()"));
 }
 
+TEST_F(Adapter, AnAdapterThatWasNeverBuiltHasNoEndInTheLog)
+{
+    Runtime_Log log;
+    provider.on[OP_LOAD] = [](void**) -> int { throw 42; };
+    create('I');
+    EXPECT_EQ(provider.destroyed, 1);
+    EXPECT_THAT(log.lines(), ElementsAre("DBG enter: CMPI_Adapter()"));
+}
+
 TEST_F(Adapter, TheLogNamesTheVeto)
 {
     Runtime_Log log;
