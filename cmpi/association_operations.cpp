@@ -128,9 +128,10 @@ bool pass_associators(Instance* instance, int, void* data)
     get_associators(filter.source, instance, filter.result_class, filter.role, filter.result_role, ends);
     for (Instance* end : ends) {
         ref(end);
+        Ref<Instance> handed(end);
         std::printf("Provider_Handle enum_associator_names call proc name NS = %s\n", end->__name_space.c_str());
         print(stdout, end, false);
-        filter.proc(end, 0, filter.data);
+        filter.proc(handed.release(), 0, filter.data);
     }
     return true;
 }
