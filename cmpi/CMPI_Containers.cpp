@@ -274,15 +274,8 @@ int CMPIArgs_Container::take(CMPIData& data, int expected_type, Value& value)
     const bool text_for_another_type =
         data.type == CMPI_string && !(data.state & CMPI_nullValue) && expected_type != STRING;
     if (text_for_another_type) {
-        if (!data.value.string) {
-            CIMPLE_INFO("ignored null CMPI string");
-            return -1;
-        }
-        const char* text = chars_of(data.value.string);
-        if (!text) {
-            CONVERSION_WARN("CMGetCharsPtr() failed");
-            return -1;
-        }
+        const char* text = nullptr;
+        if (read_chars(data.value.string, text) != 0 || !text) return -1;
         if (cast_cmpi_string_to_scalar(text, expected_type, value)) {
             CONVERSION_WARN("converting string to registered parameter type");
             release(data.value.string);

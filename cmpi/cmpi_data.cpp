@@ -194,20 +194,11 @@ int take_instance(const CMPIBroker* broker, const Meta_Repository* repository, c
 int take_string(const CMPIString* string, Value& value)
 {
     const char* text = nullptr;
-    if (string) {
-        CMPIStatus status;
-        text = ask(status, string, &CMPIStringFT::getCharPtr);
-        if (status.rc != CMPI_RC_OK) {
-            CONVERSION_WARN("CMGetCharsPtr() failed");
-            return -1;
-        }
-    }
-    if (text) {
+    if (read_chars(string, text) != 0) return -1;
+    if (text)
         value.set(String(text));
-    } else {
-        CIMPLE_INFO("ignored null CMPI string");
+    else
         value.set_null(STRING);
-    }
     return 0;
 }
 
@@ -295,6 +286,21 @@ Made_Data::~Made_Data()
         release(data.value.dateTime);
     else if (data.type == CMPI_ref)
         release(data.value.ref);
+}
+
+int read_chars(const CMPIString* string, const char*& text)
+{
+    text = nullptr;
+    if (string) {
+        CMPIStatus status;
+        text = ask(status, string, &CMPIStringFT::getCharPtr);
+        if (status.rc != CMPI_RC_OK) {
+            CONVERSION_WARN("CMGetCharsPtr() failed");
+            return -1;
+        }
+    }
+    if (!text) CIMPLE_INFO("ignored null CMPI string");
+    return 0;
 }
 
 int to_cmpi_data(const CMPIBroker* broker, const char* name_space, const Value& value, uint32 flags, Made_Data& made)

@@ -29,6 +29,10 @@ struct Made_Data {
 /// without one. Bytes of strings that no XML can carry become '?'. 0, or -1 with a warning.
 int to_cmpi_data(const CMPIBroker* broker, const char* name_space, const Value& value, uint32 flags, Made_Data& made);
 
+/// The characters of a string that a client sent: 0, with null and a word in the log where it has none; or -1 with a
+/// warning.
+int read_chars(const CMPIString* string, const char*& text);
+
 /// CMPI to runtime. `depth` counts how many instances the data lies in. 0, or -1 with a warning.
 int cmpi_to_cimple_value(const CMPIBroker* broker, const Meta_Repository* repository, const CMPIData& data,
                          unsigned depth, Value& value);
