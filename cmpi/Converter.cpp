@@ -1,5 +1,6 @@
 #include "cmpi/Converter.h"
 
+#include <cassert>
 #include <vector>
 
 #include "cmpi/CMPI_Containers.h"
@@ -111,6 +112,8 @@ int make_cimple_method(const CMPIBroker* broker, const Meta_Class* meta_class, c
 int make_method_out(const CMPIBroker* broker, const char* name_space, const Instance* record, CMPIArgs* out,
                     Value& return_value)
 {
+    const Meta_Record* mm = record_of(record);
+    assert(mm->num_meta_features > 0); // the last one is the return value
     CMPIArgs_Container container(broker, nullptr, name_space, out);
     if (container.convert(record, META_FLAG_OUT) != 0) return 1;
     return_value = container.return_value();

@@ -228,6 +228,63 @@ TEST_F(Conversion, NothingComesOutOfNothing)
     EXPECT_EQ(CMPIInstance_Container(&broker.cmpi, nullptr, "root/test", nullptr).convert(nullptr, 0), -1);
 }
 
+TEST_F(Conversion, EachCallThatFailsHasItsWords)
+{
+    Runtime_Log log;
+    Ref<TEST_Thing> thing(new_thing("a", 1));
+    thing->Text.set(String("text"));
+    thing->When.set(Datetime(uint64(1)));
+    thing->Codes.set(Array<uint16>{1});
+    thing->Other = new_part("p");
+    thing->Part = new_part("p");
+    Made<CMPIObjectPath> path;
+    ASSERT_EQ(make_cmpi_object_path(&broker.cmpi, thing.get(), "root/test", path), 0);
+
+    const auto words_of = [&](const char* name_space, auto& slot) {
+        const std::size_t before = log.lines().size();
+        auto kept = slot;
+        slot = nullptr;
+        CMPIInstance* made = broker.instance({{"root/test", "TEST_Thing", {}}, {}});
+        CMPIInstance_Container(&broker.cmpi, nullptr, name_space, made).convert(thing.get(), 0);
+        slot = kept;
+        auto lines = log.lines();
+        lines.erase(lines.begin(), lines.begin() + static_cast<std::ptrdiff_t>(before));
+        return lines;
+    };
+    EXPECT_THAT(words_of("root/test", broker.eft.newDateTimeFromChars),
+                ElementsAre("WARN _to_cmpi_data() failed: feature=When", "WARN conversion error: TEST_Thing.When"));
+    EXPECT_THAT(words_of("root/test", broker.array_ft.setElementAt),
+                ElementsAre("WARN CMSetArrayElementAt() failed", "WARN _to_cmpi_data() failed: feature=Codes",
+                            "WARN conversion error: TEST_Thing.Codes"));
+    EXPECT_THAT(words_of("root/test", broker.eft.newInstance),
+                ElementsAre("WARN CMNewInstance() failed", "WARN _to_cmpi_data() failed: feature=Part",
+                            "WARN conversion error: TEST_Thing.Part"));
+    EXPECT_THAT(words_of("root/test", broker.eft.newObjectPath),
+                ElementsAre("WARN CMNewObjectPath() failed", "WARN _to_cmpi_data() failed: feature=Part",
+                            "WARN conversion error: TEST_Thing.Part", "WARN CMNewObjectPath() failed",
+                            "WARN _to_cmpi_data() failed: feature=Other", "WARN conversion error: TEST_Thing.Other"));
+    EXPECT_THAT(words_of("root/test", broker.path_ft.addKey),
+                testing::IsSupersetOf({"WARN CMAddKey() failed", "WARN conversion error: TEST_Part.Id"}));
+    EXPECT_THAT(words_of("root/test", broker.instance_ft.setProperty),
+                testing::IsSupersetOf({"WARN CMSetProperty() failed: Name", "WARN conversion error: TEST_Thing.Name"}));
+    for (const char* none : {static_cast<const char*>(nullptr), ""})
+        EXPECT_THAT(words_of(none, broker.args_ft.addArg),
+                    ElementsAre("WARN null namespace", "WARN _to_cmpi_data() failed: feature=Part",
+                                "WARN conversion error: TEST_Thing.Part", "WARN null namespace",
+                                "WARN _to_cmpi_data() failed: feature=Other",
+                                "WARN conversion error: TEST_Thing.Other"));
+    elements_left = broker.alive() - 1; // embedded instances; the path is still ours
+}
+
+TEST_F(Conversion, AMethodWithoutAReturnValueIsNone)
+{
+    const Meta_Method bare = {{{{0}, META_FLAG_METHOD, "Bare", nullptr, 0}, nullptr, 0, sizeof(Instance)}, UINT32};
+    Ref<Instance> record(create(&bare, true));
+    Value value;
+    EXPECT_DEATH(make_method_out(&broker.cmpi, "root/test", record.get(), broker.args(), value),
+                 "mm->num_meta_features > 0");
+}
+
 // --- In
 // ----------------------------------------------------------------------------------------------------------------
 
@@ -365,6 +422,24 @@ TEST_F(Conversion, AKeyOf64BitsIsTruncated)
     Ref<TEST_Thing> thing = keys({{"Name", fake::string("a")}, {"Number", fake::uint64(300)}});
     EXPECT_EQ(thing->Number.null, 0);
     EXPECT_EQ(thing->Number.value, 44);
+}
+
+TEST_F(Conversion, KeysOf64BitsFitWhatTheFeatureWants)
+{
+    const auto counter = [this](const fake::Values& values) {
+        Instance* read = nullptr;
+        EXPECT_EQ(make_cimple_reference(&broker.cmpi, &TEST_Counter::meta,
+                                        broker.path({"root/test", "TEST_Counter", values}), read),
+                  0);
+        return Ref<TEST_Counter>(static_cast<TEST_Counter*>(read));
+    };
+    Ref<TEST_Counter> read = counter({{"Value", fake::sint64(4294967303ll)}, {"Balance", fake::uint64(~0ull)}});
+    EXPECT_EQ(read->Value.null, 0);
+    EXPECT_EQ(read->Value.value, 7u) << "truncated";
+    EXPECT_EQ(read->Balance.null, 0);
+    EXPECT_EQ(read->Balance.value, -1);
+    EXPECT_EQ(counter({{"Value", fake::sint64(-1)}})->Value.value, 4294967295u);
+    EXPECT_EQ(counter({{"Value", fake::sint32(7)}})->Value.null, 1) << "narrower types are not taken";
 }
 
 TEST_F(Conversion, ASignedKeyIsTakenForUint32Only)

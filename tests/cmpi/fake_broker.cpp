@@ -593,6 +593,11 @@ Value array(CMPIType element, std::vector<Value> elements)
     return value;
 }
 
+const std::string& text_of(const CMPIString* string)
+{
+    return whole<String_Object>(string).content.text;
+}
+
 Value find(const Values& values, const std::string& name)
 {
     for (const auto& entry : values)

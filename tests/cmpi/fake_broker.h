@@ -60,6 +60,9 @@ struct Instance {
     Values properties;
 };
 
+/// The characters behind a string of the broker's, past its table.
+const std::string& text_of(const CMPIString* string);
+
 /// The value of that name, or a null one of type CMPI_null.
 Value find(const Values& values, const std::string& name);
 

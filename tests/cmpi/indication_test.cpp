@@ -148,6 +148,32 @@ TEST_F(Indications, AConversionThatFailsPassesOverItsNamespace)
     EXPECT_THAT(delivered(), SizeIs(1));
 }
 
+class IndicationLog : public Runtime_Log, public Indications {};
+
+TEST_F(IndicationLog, NamesEachOperation)
+{
+    const std::size_t before = lines().size();
+    CMPIObjectPath* path = broker.path(class_path());
+    mi->ft->authorizeFilter(mi, context, nullptr, "", path, "");
+    mi->ft->mustPoll(mi, context, nullptr, "", path);
+    activate("root/a");
+    deactivate("root/a");
+    enable_status = 140;
+    enable();
+    enable();
+    disable();
+    auto all = lines();
+    all.erase(all.begin(), all.begin() + static_cast<std::ptrdiff_t>(before));
+    EXPECT_THAT(all,
+                ElementsAre("DBG enter: authorizeFilter()", "DBG return: authorizeFilter(): CMPI_RC_OK",
+                            "DBG enter: mustPoll()", "DBG return: mustPoll(): CMPI_RC_OK",
+                            "DBG enter: activateFilter()", "DBG return: activateFilter(): CMPI_RC_OK",
+                            "DBG enter: deActivateFilter()", "DBG return: deActivateFilter(): CMPI_RC_OK",
+                            "DBG enter: enableIndications()", "DBG return: enableIndications(): CMPI_RC_ERR_FAILED",
+                            "DBG enter: enableIndications()", "DBG return: enableIndications(): CMPI_RC_OK",
+                            "DBG enter: disableIndications()", "DBG return: disableIndications(): CMPI_RC_OK"));
+}
+
 // The provider's thread, as its enable starts it and its disable ends it.
 struct Worker {
     Indication_Handler handler;

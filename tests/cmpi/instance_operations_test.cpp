@@ -513,6 +513,37 @@ TEST_F(Methods, ReferencesGoBothWays)
 
 class MethodLog : public Runtime_Log, public Methods {};
 
+TEST_F(MethodLog, TellsWhyATextIsNotCast)
+{
+    const auto lines_of = [this](const char* name, const fake::Value& value) {
+        const std::size_t before = lines().size() + 1; // and the line of the call's beginning
+        call("Echo", {{name, value}});
+        auto all = lines();
+        all.erase(all.begin(), all.begin() + static_cast<std::ptrdiff_t>(before));
+        all.pop_back(); // of its end
+        return all;
+    };
+    EXPECT_THAT(lines_of("Wide", fake::string("1")),
+                ElementsAre("WARN Default case - unsupported type", "WARN type mismatch on Wide: string/uint64",
+                            "WARN conversion error: Echo.Wide"));
+    EXPECT_THAT(lines_of("Letter", fake::string("x")),
+                ElementsAre("INFO cast_cmpi_string_to_scalar(): Not supported",
+                            "WARN type mismatch on Letter: string/char16", "WARN conversion error: Echo.Letter"));
+    EXPECT_THAT(lines_of("Flag", fake::string("maybe")),
+                ElementsAre("WARN type mismatch on Flag: string/boolean", "WARN conversion error: Echo.Flag"));
+    EXPECT_THAT(lines_of("Number", fake::string_without_chars()),
+                ElementsAre("INFO ignored null CMPI string", "WARN cmpi_to_cimple_value() failed",
+                            "WARN conversion error: Echo.Number"));
+    broker.string_ft.getCharPtr = [](const CMPIString* string, CMPIStatus* status) -> const char* {
+        const auto& text = fake::text_of(string);
+        status->rc = text == "broken" ? CMPI_RC_ERR_FAILED : CMPI_RC_OK;
+        return text.c_str();
+    };
+    EXPECT_THAT(lines_of("Number", fake::string("broken")),
+                ElementsAre("WARN CMGetCharsPtr() failed", "WARN cmpi_to_cimple_value() failed",
+                            "WARN conversion error: Echo.Number"));
+}
+
 TEST_F(MethodLog, HasAWordForEachFailure)
 {
     call("Nothing");

@@ -105,8 +105,12 @@ const Meta_Property event_text = SCALAR(TEST_Event, Text, STRING, 0);
 const Meta_Property event_notes = ARRAY(TEST_Event, Notes, STRING, 0);
 const Meta_Feature* const event_features[] = {&event_text, &event_notes};
 
-const Meta_Class* const classes[] = {&TEST_Base::meta, &TEST_Part::meta, &TEST_Thing::meta,
-                                     &TEST_Link::meta, &TEST_Pair::meta, &TEST_Event::meta};
+const Meta_Property counter_value = SCALAR(TEST_Counter, Value, UINT32, key);
+const Meta_Property counter_balance = SCALAR(TEST_Counter, Balance, SINT64, key);
+const Meta_Feature* const counter_features[] = {&counter_value, &counter_balance};
+
+const Meta_Class* const classes[] = {&TEST_Base::meta, &TEST_Part::meta,  &TEST_Thing::meta,  &TEST_Link::meta,
+                                     &TEST_Pair::meta, &TEST_Event::meta, &TEST_Counter::meta};
 
 template <class T>
 void give(Property<T>& place, const T& value)
@@ -117,7 +121,7 @@ void give(Property<T>& place, const T& value)
 
 } // namespace
 
-const Meta_Repository test_repository = {classes, 6};
+const Meta_Repository test_repository = {classes, 7};
 
 const Meta_Class TEST_Base::meta = {
     {HEAD(META_FLAG_CLASS, "TEST_Base"), RECORD(TEST_Base, base_features, 1)}, locals, nullptr, 1, &test_repository};
@@ -143,6 +147,12 @@ const Meta_Class TEST_Event::meta = {{HEAD(META_FLAG_INDICATION, "TEST_Event"), 
                                      nullptr,
                                      0,
                                      &test_repository};
+const Meta_Class TEST_Counter::meta = {
+    {HEAD(META_FLAG_CLASS, "TEST_Counter"), RECORD(TEST_Counter, counter_features, 2)},
+    locals,
+    nullptr,
+    2,
+    &test_repository};
 const Meta_Method TEST_Thing_Echo::meta = {{HEAD(META_FLAG_METHOD, "Echo"), RECORD(TEST_Thing_Echo, echo_features, 10)},
                                            UINT32};
 

@@ -2,7 +2,7 @@
 ///
 /// TEST_Base (key Name) < TEST_Thing (key Number, a property of most types, methods); TEST_Part (key Id);
 /// TEST_Link, an association of a TEST_Base and a TEST_Part; TEST_Pair, one of two TEST_Base; TEST_Event, an
-/// indication.
+/// indication; TEST_Counter (keys Value of 32 bits, Balance of 64 signed ones).
 #pragma once
 
 #include <atomic>
@@ -83,6 +83,12 @@ struct TEST_Pair : Instance {
 struct TEST_Event : Instance {
     Property<String> Text;
     Property<Array<String>> Notes;
+    static const Meta_Class meta;
+};
+
+struct TEST_Counter : Instance {
+    Property<uint32> Value;
+    Property<sint64> Balance;
     static const Meta_Class meta;
 };
 

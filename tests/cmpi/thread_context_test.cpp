@@ -139,6 +139,35 @@ TEST_F(UpCalls, AMethodsResultsComeBackIntoItsRecord)
     EXPECT_EQ(fake::find(broker.up_calls[0].path.keys, "Name").text, "t");
 }
 
+TEST_F(UpCalls, AStaticMethodIsCalledOnItsClass)
+{
+    const Meta_Method& echo = TEST_Thing_Echo::meta;
+    const Meta_Method still = {{{{0}, META_FLAG_METHOD | META_FLAG_STATIC, "Still", nullptr, 0},
+                                echo.meta_features,
+                                echo.num_meta_features,
+                                echo.size},
+                               UINT32};
+    broker.method_answer = fake::uint32(7);
+    inside([&] {
+        Ref<TEST_Thing> target(new_thing("t", 1));
+        Ref<Instance> call(cimple::create(&still, true));
+        EXPECT_EQ(cimom::invoke_method("root/test", target.get(), call.get()), 0);
+    });
+    ASSERT_THAT(broker.up_calls, SizeIs(1));
+    EXPECT_EQ(broker.up_calls[0].path.class_name, "TEST_Thing");
+    EXPECT_THAT(broker.up_calls[0].path.keys, SizeIs(0));
+}
+
+TEST_F(UpCalls, AClassThatIsInNoRepositoryHasNoMethods)
+{
+    inside([&] {
+        Ref<Instance> target(cimple::create(&Instance::meta, true));
+        Ref<Instance> call(cimple::create(&TEST_Thing_Echo::meta, true));
+        EXPECT_EQ(cimom::invoke_method("root/test", target.get(), call.get()), -1);
+    });
+    EXPECT_THAT(broker.up_calls, SizeIs(0));
+}
+
 TEST_F(UpCalls, FaultsOfAMethodCall)
 {
     Runtime_Log log;
