@@ -207,8 +207,8 @@ typedef struct {
 static_assert(sizeof(RM_BLOCKHEADER) == 16, "attribute block header");
 static_assert(sizeof(RM_ATTRIBUTE) == 4, "attribute record head");
 
-/* ------------------------------------------------------------------------------------------- vital product data (VPD)
- */
+/* -------------------------------------------------------------------------------------------------------------------
+ * vital product data (VPD) */
 
 /* What RM_GetVPD writes: a length word, then PCI vital product data as the bus has it: large resource 0x82 (identifier
  * text), 0x90 (read-only fields), 0x91 (writable fields), each with a 16-bit little-endian length; in the last two,
@@ -237,8 +237,8 @@ typedef struct {
 static_assert(sizeof(RM_VPDCURSOR) == RM_VPD_CURSOR_SIZE, "VPD cursor");
 static_assert(offsetof(RM_VPDBLOCK, data) == 4, "VPD data");
 
-/* -------------------------------------------------------------------------------------------------- driver parameters
- */
+/* -------------------------------------------------------------------------------------------------------------------
+ * driver parameters */
 
 /* A record of RM_GetDriverParams and RM_GetDriverParamsGlobal, which write an array of them without a header. `*count`
  * is the capacity in records on the way in and the number of records on the way out; 7 or 191 ask for a second try with
@@ -261,8 +261,8 @@ static_assert(offsetof(RM_DRIVERPARAM, lowLimit) == 32, "words from index 8 on")
 static_assert(offsetof(RM_DRIVERPARAM, exportFlag) == 48 && offsetof(RM_DRIVERPARAM, dynamic) == 50, "16-bit words");
 static_assert(offsetof(RM_DRIVERPARAM, help) == 52, "help text");
 
-/* ------------------------------------------------------------------------------------------------------ flash contents
- */
+/* -------------------------------------------------------------------------------------------------------------------
+ * flash contents */
 
 /* What RM_DiagGetLoadListParams fills: `count` entries, of which the last is the end-of-list record and no image, so
  * that there are count - 1 images; 0 and 1 mean none. Readers cut the number of images to RM_FLASH_MAX_IMAGES. Texts
@@ -285,8 +285,8 @@ typedef struct {
 static_assert(sizeof(RM_FLASHIMAGE) == 72, "flash image record");
 static_assert(sizeof(RM_FLASHCONTENTS) == 4688, "flash contents");
 
-/* --------------------------------------------------------------------------------------------------------- transceiver
- */
+/* -------------------------------------------------------------------------------------------------------------------
+ * transceiver */
 
 /* What RM_GetSffData writes: pages A0 and A2 of the port's module by SFF-8472, as read from it. `*size` is the capacity
  * on the way in, the bytes written on the way out; 256 when the module has no page A2. */
@@ -299,8 +299,8 @@ typedef struct {
 
 static_assert(sizeof(RM_SFFDATA) == RM_SFF_SIZE, "transceiver pages");
 
-/* -------------------------------------------------------------------------------------------------------- PCI
- * registers */
+/* -------------------------------------------------------------------------------------------------------------------
+ * PCI registers */
 
 /* What RM_DiagReadPCIRegistersV2 fills: the standard configuration header (little-endian), then registers behind it. */
 typedef struct {
@@ -310,8 +310,8 @@ typedef struct {
 
 static_assert(sizeof(RM_PCIREGISTERS) == 320, "PCI registers");
 
-/* ------------------------------------------------------------------------------------------------- targets and LUN
- * lists */
+/* -------------------------------------------------------------------------------------------------------------------
+ * targets and LUN lists */
 
 /* What RM_GetLunList writes. `count` is the capacity on the way in, the number of LUNs on the way out (also with 7). */
 typedef struct {
@@ -345,8 +345,8 @@ static_assert(offsetof(RM_TARGETLIST, entry) == 8, "target list header");
 static_assert(sizeof(HBA_FCPSCSIENTRY) == 304, "mapping entry");
 #endif
 
-/* ---------------------------------------------------------------------------------------------------- local port
- * records */
+/* -------------------------------------------------------------------------------------------------------------------
+ * local port records */
 
 /* The argument that names a record of RM_GetLocalHBAInfo. */
 typedef struct {
@@ -369,8 +369,8 @@ typedef struct {
 static_assert(sizeof(RM_LOCALINDEX) == 8, "record index");
 static_assert(sizeof(RM_LOCALHBAINFO) == 4096, "local port record");
 
-/* -------------------------------------------------------------------------------------------------------- virtual
- * ports */
+/* -------------------------------------------------------------------------------------------------------------------
+ * virtual ports */
 
 typedef struct {
     HBA_WWN wwpn;
@@ -433,7 +433,7 @@ typedef struct {
 static_assert(offsetof(RM_VMLIST, entry) == 4 && sizeof(RM_VMLIST) == 516, "virtual machine list");
 static_assert(sizeof(RM_VMINFO) == 1296, "virtual machine record");
 
-/* ----------------------------------------------------------------------------------------------------------------
+/* -------------------------------------------------------------------------------------------------------------------
  * dumps */
 
 typedef struct {
@@ -457,7 +457,7 @@ typedef struct {
 
 static_assert(offsetof(RM_DUMPLIST, entry) == 8 && sizeof(RM_DUMPNAME) == 256, "dump name list");
 
-/* -----------------------------------------------------------------------------------------------------------
+/* -------------------------------------------------------------------------------------------------------------------
  * diagnostics */
 
 /* What RM_DiagGetResults fills; RM_STATUS_NO_RESULT_YET leaves only `state` meaningful. */
@@ -479,8 +479,8 @@ static_assert(sizeof(RM_DIAGRESULT) == 48, "twelve words");
 static_assert(offsetof(RM_DIAGRESULT, state) == 4 && offsetof(RM_DIAGRESULT, resultCode) == 20, "words 1 and 5");
 static_assert(offsetof(RM_DIAGRESULT, loopsFailed) == 28, "word 7");
 
-/* ------------------------------------------------------------------------------------------------------------- tag
- * tables */
+/* -------------------------------------------------------------------------------------------------------------------
+ * tag tables */
 
 typedef struct {
     HBA_WWN source;
@@ -503,7 +503,7 @@ typedef struct {
 static_assert(sizeof(CPQFC_QOSENTRY) == 36, "tag entry");
 static_assert(offsetof(CPQFC_QOSENTRY, tag) == 32 && offsetof(CPQFC_QOSCONFIG, entry) == 4, "tag table");
 
-/* --------------------------------------------------------------------------------------------------------------
+/* -------------------------------------------------------------------------------------------------------------------
  * operations */
 
 /* Called on a thread of the Common HBA API for each event of a registered port. */
