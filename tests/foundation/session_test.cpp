@@ -130,6 +130,24 @@ TEST_F(Session, OfASecondInstanceInitialisesAgain)
     EXPECT_FALSE(there(guard));
 }
 
+TEST_F(Session, TakesALeftOverSemaphoreForAnInstanceThatInitialises)
+{
+    sem_t* left_over = ::sem_open(guard.c_str(), O_CREAT, 0644, 4); // any value but 2; with less than 2 it would wait
+    ASSERT_NE(left_over, SEM_FAILED);
+    Log_Capture log;
+    {
+        NVR_MethodWrapper wrapper;
+    }
+    EXPECT_EQ(initialised, 0);
+    EXPECT_THAT(log.words(),
+                ElementsAre("Constructor", "Setting Up for FIFO.. ",
+                            StartsWith("Waiting on Completed Semaphore.. To issue RM Calls.." + guard + ".. sem = "),
+                            "Recieved signal on Completed Semaphore.. To issue RM Calls", "RMLIB initialized",
+                            "Destructor", "Value of Sem in destructor=3", "RMLIB uninitialzed"));
+    EXPECT_FALSE(there(guard));
+    ::sem_close(left_over);
+}
+
 TEST_F(Session, ReadsNames)
 {
     NVR_MethodWrapper wrapper;
