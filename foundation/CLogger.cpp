@@ -4,14 +4,13 @@
 #include <cstdarg>
 #include <cstdio>
 #include <exception>
-#include <pthread.h>
 
-#include "foundation/Keep_Errno.h"
 #include "foundation/NVR_CIMLogger.h"
 #include "foundation/NVR_FileLogger.h"
 #include "foundation/NVR_SysLogger.h"
 #include "runtime/Immortal.h"
 #include "runtime/Mutex.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -29,19 +28,6 @@ Mutex& dispatch_mutex()
     static Immortal<Mutex> mutex(false);
     return *mutex;
 }
-
-// A thread that is to be cancelled is not cancelled inside a scope of this: destructors log, and unwinding out of one
-// ends the process.
-class Hold_Off_Cancellation {
-public:
-    Hold_Off_Cancellation() { ::pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, &m_state); }
-    ~Hold_Off_Cancellation() { ::pthread_setcancelstate(m_state, nullptr); }
-    Hold_Off_Cancellation(const Hold_Off_Cancellation&) = delete;
-    Hold_Off_Cancellation& operator=(const Hold_Off_Cancellation&) = delete;
-
-private:
-    int m_state = PTHREAD_CANCEL_ENABLE;
-};
 
 bool of_known_kind(NVR_LoggerInterface* logger)
 {
@@ -95,8 +81,7 @@ bool CLogger::wanted(sint32 level) const
 void CLogger::log(const char* file, const uint32& line, sint32 level, const char* format, ...)
 {
     if (holds_dispatch_mutex || !wanted(level)) return;
-    Keep_Errno keep_errno;
-    Hold_Off_Cancellation hold_off_cancellation;
+    Undisturbed undisturbed;
     char fixed[1024];
     va_list arguments;
     va_start(arguments, format);
@@ -163,7 +148,7 @@ void CLogger::detachAll()
 
 void CLogger::setMode(uint32 mode)
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     Hold hold;
     m_mode = mode;
     for (NVR_LoggerInterface* logger : m_loggers) {
@@ -192,7 +177,7 @@ void CLogger::disable()
 
 void CLogger::clearAll()
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     Hold hold;
     for (NVR_LoggerInterface* logger : m_loggers)
         logger->clear();

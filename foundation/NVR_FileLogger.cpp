@@ -6,9 +6,9 @@
 #include <sys/stat.h>
 
 #include "foundation/CLogger.h"
-#include "foundation/Keep_Errno.h"
 #include "foundation/open_file.h"
 #include "runtime/Datetime.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -30,7 +30,7 @@ NVR_FileLogger::NVR_FileLogger()
 NVR_FileLogger::~NVR_FileLogger()
 {
     CLogger::instance()->detach(this); // an agent that failed half-way may end without detachAll
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     closeStream();
 }
 
@@ -53,7 +53,7 @@ void NVR_FileLogger::logMessage(sint32 level, const char* file, uint32 line, con
 void NVR_FileLogger::open()
 {
     if (!mode_uses_trace_file()) return;
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     CLogger::Hold hold;
     closeStream();
     if (!m_path.empty()) m_stream = open_file(m_path.c_str(), "a+").release();
@@ -61,7 +61,7 @@ void NVR_FileLogger::open()
 
 void NVR_FileLogger::close()
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     CLogger::Hold hold;
     if (!m_stream) return;
     closeStream();
@@ -70,7 +70,7 @@ void NVR_FileLogger::close()
 
 void NVR_FileLogger::clear()
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     CLogger::Hold hold;
     if (!m_stream) return;
     closeStream();
@@ -81,7 +81,7 @@ void NVR_FileLogger::clear()
 
 int NVR_FileLogger::setPath(const char* path)
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     if (!path) return -1;
     CLogger::Hold hold;
     struct stat status;

@@ -6,7 +6,7 @@
 #include <syslog.h>
 
 #include "foundation/CLogger.h"
-#include "foundation/Keep_Errno.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -41,7 +41,7 @@ void make_format(char* format, const char* text)
 NVR_SysLogger::NVR_SysLogger()
 {
     CLogger::instance()->attach(this);
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     ::openlog(lasting_name(), LOG_NDELAY | LOG_NOWAIT, LOG_USER);
 }
 
@@ -50,7 +50,7 @@ NVR_SysLogger::~NVR_SysLogger()
     CLogger::instance()->detach(this);
     NVR_SysLogger* self = this;
     system_logger.compare_exchange_strong(self, nullptr);
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     ::closelog();
 }
 

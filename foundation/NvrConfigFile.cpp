@@ -7,8 +7,8 @@
 #include <sys/stat.h>
 
 #include "foundation/CLogger.h"
-#include "foundation/Keep_Errno.h"
 #include "foundation/open_file.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -101,7 +101,7 @@ void NvrConfigFile::load(const char* path)
 
 void NvrConfigFile::save()
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     File file = open_file(m_path.c_str(), "w");
     if (!file) return;
     std::fprintf(file.get(),
@@ -161,7 +161,7 @@ int NvrConfigFile::setRefreshSANData(uint32 flag)
 std::string readWebLaunchURL()
 {
     static const char path[] = "/etc/nvr_smis.conf";
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     File file = open_file(path, "r");
     if (!file) {
         NVR_LOG("WebLaunch config file '%s' not found.", path);

@@ -5,9 +5,9 @@
 #include <sys/stat.h>
 
 #include "foundation/CLogger.h"
-#include "foundation/Keep_Errno.h"
 #include "foundation/NVR_FileLogger.h"
 #include "foundation/open_file.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -31,7 +31,7 @@ bool CLogger::setTracePath(const char* path)
 
 void CLogger::saveSettings()
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     const std::string path = tracePath();
     File file = open_file(log_settings_path, "w");
     if (!file) {
@@ -45,7 +45,7 @@ void CLogger::saveSettings()
 
 void CLogger::loadSettings()
 {
-    Keep_Errno keep_errno;
+    Undisturbed undisturbed;
     struct stat status;
     if (::stat(log_settings_path, &status) != 0) return;
     File file = open_file(log_settings_path, "r");

@@ -1,13 +1,11 @@
 #include "runtime/log.h"
 
-#include <cerrno>
 #include <climits>
 #include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <new>
-#include <pthread.h>
 #include <stdio_ext.h>
 #include <sys/stat.h>
 
@@ -15,6 +13,7 @@
 #include "runtime/File_Lock.h"
 #include "runtime/Mutex.h"
 #include "runtime/String.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -32,24 +31,6 @@ bool log_asked = false; // opened, or found closed, once and for all
 std::FILE* log_file = nullptr;
 int log_lock_file = -1;
 std::atomic<bool> warnings_enabled{true};
-
-/// A message of ours leaves the caller's errno alone, and is no point where the thread can be cancelled: destructors
-/// log, and a thread that unwinds out of one ends the process.
-class Undisturbed {
-public:
-    Undisturbed() : m_errno(errno) { pthread_setcancelstate(PTHREAD_CANCEL_DISABLE, &m_cancel_state); }
-    ~Undisturbed()
-    {
-        pthread_setcancelstate(m_cancel_state, nullptr);
-        errno = m_errno;
-    }
-    Undisturbed(const Undisturbed&) = delete;
-    Undisturbed& operator=(const Undisturbed&) = delete;
-
-private:
-    int m_errno;
-    int m_cancel_state = PTHREAD_CANCEL_ENABLE;
-};
 
 bool is_blank(char c)
 {
