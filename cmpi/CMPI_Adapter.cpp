@@ -1,6 +1,7 @@
 #include "cmpi/CMPI_Adapter.h"
 
 #include <cerrno>
+#include <cstddef>
 #include <cstdio>
 #include <cstring>
 #include <new>
@@ -11,6 +12,26 @@
 #include "runtime/Forced_Unwind.h"
 
 namespace cimple {
+
+// A table set is static data of the module: its places are told by the tables' sizes alone.
+static_assert(offsetof(MI_Table_Set, magic) == 0);
+static_assert(offsetof(MI_Table_Set, adapter) == sizeof(void*));
+static_assert(offsetof(MI_Table_Set, instance_table) == 2 * sizeof(void*));
+static_assert(offsetof(MI_Table_Set, method_table) ==
+              offsetof(MI_Table_Set, instance_table) + sizeof(CMPIInstanceMIFT));
+static_assert(offsetof(MI_Table_Set, indication_table) ==
+              offsetof(MI_Table_Set, method_table) + sizeof(CMPIMethodMIFT));
+static_assert(offsetof(MI_Table_Set, association_table) ==
+              offsetof(MI_Table_Set, indication_table) + sizeof(CMPIIndicationMIFT));
+static_assert(offsetof(MI_Table_Set, instance_mi) ==
+              offsetof(MI_Table_Set, association_table) + sizeof(CMPIAssociationMIFT));
+static_assert(offsetof(MI_Table_Set, method_mi) == offsetof(MI_Table_Set, instance_mi) + 2 * sizeof(void*));
+static_assert(offsetof(MI_Table_Set, association_mi) == offsetof(MI_Table_Set, method_mi) + 2 * sizeof(void*));
+static_assert(offsetof(MI_Table_Set, indication_mi) == offsetof(MI_Table_Set, association_mi) + 2 * sizeof(void*));
+static_assert(offsetof(MI_Table_Set, instance_name) == offsetof(MI_Table_Set, indication_mi) + 2 * sizeof(void*));
+static_assert(offsetof(MI_Table_Set, method_name) == offsetof(MI_Table_Set, instance_name) + 256);
+static_assert(offsetof(MI_Table_Set, indication_name) == offsetof(MI_Table_Set, method_name) + 256);
+static_assert(offsetof(MI_Table_Set, association_name) == offsetof(MI_Table_Set, indication_name) + 256);
 
 namespace {
 

@@ -89,8 +89,8 @@ bool scan_timestamp(const char* text, uint64& usec, sint32& utc)
 
 struct Datetime::Rep {
     std::atomic<uint32> refs;
-    sint32 utc;
     uint64 usec;
+    sint32 utc;
     bool is_timestamp;
 };
 
@@ -108,12 +108,12 @@ void Datetime::release(Rep* rep) noexcept
 void Datetime::assign(uint64 usec, sint32 utc, bool is_timestamp)
 {
     if (m_rep && m_rep->refs.load(std::memory_order_acquire) == 1) {
-        m_rep->utc = utc;
         m_rep->usec = usec;
+        m_rep->utc = utc;
         m_rep->is_timestamp = is_timestamp;
         return;
     }
-    Rep* rep = new Rep{{1}, utc, usec, is_timestamp};
+    Rep* rep = new Rep{{1}, usec, utc, is_timestamp};
     if (m_rep) release(m_rep);
     m_rep = rep;
 }

@@ -1,6 +1,6 @@
 #include "runtime/Meta_Class.h"
 
-#include "runtime/Instance.h"
+#include "runtime/Registration.h"
 
 namespace cimple {
 
@@ -51,6 +51,13 @@ static_assert(offsetof(Instance, refs) == 4);
 static_assert(offsetof(Instance, meta_class) == 8);
 static_assert(offsetof(Instance, __name_space) == 16);
 static_assert(sizeof(Instance) == 24);
+
+static_assert(offsetof(Registration, module_name) == 0);
+static_assert(offsetof(Registration, provider_name) == 8);
+static_assert(offsetof(Registration, proc) == 16);
+static_assert(offsetof(Registration, meta_class) == 24);
+static_assert(offsetof(Registration, next) == 32);
+static_assert(sizeof(Registration) == 40);
 #pragma GCC diagnostic pop
 
 template <class T>

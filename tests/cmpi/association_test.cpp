@@ -115,6 +115,9 @@ TEST_F(Associations, ReferencesAreTheAssociations)
     EXPECT_EQ(references(one), CMPI_RC_OK);
     ASSERT_THAT(returned().instances, SizeIs(2));
     EXPECT_EQ(fake::find(returned().instances[0].properties, "Note").text, "note");
+    EXPECT_EQ(fake::find(returned().instances[1].properties, "Note").type, CMPI_string);
+    EXPECT_FALSE(fake::find(returned().instances[1].properties, "Note").null()) << "without a list all is reported";
+    EXPECT_EQ(fake::find(returned().instances[1].properties, "Dependent").path->class_name, "TEST_Part");
     returned() = {};
     EXPECT_EQ(references(none), CMPI_RC_OK);
     EXPECT_THAT(returned().instances, IsEmpty());
