@@ -68,10 +68,11 @@ protected:
     /// Runs the update alone, over maps and an inventory that the test may have changed.
     uint32 update()
     {
-        Auto_Mutex maps(agent().m_SANMapsReadyMutex);
-        Auto_Mutex data(agent().m_DataMutex);
+        ProviderAgent& a = agent(); // found before its locks are held, as everywhere
         words();
-        return agent().updateSANMaps();
+        Auto_Mutex maps(a.m_SANMapsReadyMutex);
+        Auto_Mutex data(a.m_DataMutex);
+        return a.updateSANMaps();
     }
     void refresh() { san(agent().m_NVRHBA_SCSIProtocolEndpoint_map); }
     /// The words of the last updateSANMaps, without those of the clearing.
@@ -641,8 +642,9 @@ TEST_F(SANUpdate, WhatIsHandedOutIsTheCallersOwn)
               reference_of(first(agent().m_NVRHBA_SCSIInitiatorTargetStorageVolumePath_map), unit));
     const std::string id = end(path.get(), "LogicalUnit", "DeviceID");
     {
-        Auto_Mutex data(agent().m_DataMutex);
-        agent().clearSANMaps();
+        ProviderAgent& a = agent();
+        Auto_Mutex data(a.m_DataMutex);
+        a.clearSANMaps();
     }
     EXPECT_EQ(end(path.get(), "LogicalUnit", "DeviceID"), id);
     EXPECT_EQ(end(path.get(), "Initiator", "Name"), first_wwpn);
