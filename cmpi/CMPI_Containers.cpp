@@ -115,6 +115,7 @@ int CMPI_Container::fetch(std::size_t index)
         return -1;
     }
     if (index == m_fetched) return 0;
+    m_fetched = not_known;
     CMPIString* name = nullptr;
     if (read(index, name, m_data) != 0) return -1;
     m_name = chars_of(name);

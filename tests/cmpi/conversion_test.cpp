@@ -467,6 +467,25 @@ TEST_F(Conversion, BoundsAreTold)
     EXPECT_THAT(log.lines(), Contains("WARN bounds error").Times(2));
 }
 
+TEST_F(Conversion, AReadThatFailsSpoilsNoOther)
+{
+    CMPIArgs_Container container(&broker.cmpi, &test_repository, "root/test",
+                                 broker.args({{"a", fake::uint8(1)}, {"b", fake::uint8(2)}}));
+    const char* name = nullptr;
+    Value value;
+    EXPECT_EQ(container.get_name(0, name), 0);
+    auto kept = broker.args_ft.getArgAt;
+    broker.args_ft.getArgAt = [](const CMPIArgs*, CMPICount, CMPIString**, CMPIStatus* status) {
+        status->rc = CMPI_RC_ERR_FAILED;
+        return CMPIData{CMPI_uint16, CMPI_goodValue, {}};
+    };
+    EXPECT_EQ(container.get_name(1, name), -1);
+    broker.args_ft.getArgAt = kept;
+    EXPECT_EQ(container.get_value(0, UINT8, value), 0);
+    ASSERT_NE(value.get<uint8>(), nullptr);
+    EXPECT_EQ(*value.get<uint8>(), 1);
+}
+
 TEST_F(Conversion, ABrokenObjectOfTheServersIsCaught)
 {
     Runtime_Log log;
