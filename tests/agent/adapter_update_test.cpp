@@ -1,5 +1,7 @@
 #include "agent/Agent_Wait.h"
+#include "inventory/NVR_Data.h"
 #include "simulator/nvrsim.h"
+#include "tests/agent/Other_Adapter.h"
 #include "tests/agent/Simulated_Host.h"
 #include "tests/support/private_host.h"
 
@@ -277,13 +279,27 @@ TEST_F(AdapterUpdate, TheHostIsGeneratedWhereNobodyPublishesOne)
                                             "All clear -created nvrhba computer system instance"}));
 }
 
+TEST_F(AdapterUpdate, TheHostBearsItsOfficialNameAndItsFirstAddress)
+{
+    write_file("/etc/hosts", "192.0.2.7 storage7.example " + host_name() + "\n");
+    write_file("/etc/nsswitch.conf", "hosts: files\n");
+    const Ref<Instance> host = only(agent().m_CIM_ComputerSystem_map);
+    const std::string system = agent().m_osName.c_str();
+    const std::string version = agent().m_osExtendedInfo.c_str();
+    EXPECT_EQ(value(host.get(), "Name"), "storage7.example");
+    EXPECT_EQ(value(host.get(), "ElementName"), "storage7.example");
+    EXPECT_EQ(value(host.get(), "OtherIdentifyingInfo"), "{192.0.2.7," + system + "," + version + "}");
+    EXPECT_EQ(value(host.get(), "Description"), system + " with Norvane CMPI HBA Provider v2.5.19-1");
+    EXPECT_THAT(words(), contains_in_order({"Host Name : " + host_name(), "Host ipAddress : 192.0.2.7"}));
+}
+
 TEST_F(AdapterUpdate, AnUnknownHostNameHasAnUnknownAddress)
 {
     write_file("/etc/hosts", "");
     write_file("/etc/nsswitch.conf", "hosts: files\n");
-    plain(agent().m_NVRHBA_FCPort_map);
-    EXPECT_STREQ(agent().m_hostName.c_str(), host_name().c_str());
-    EXPECT_STREQ(agent().m_ipAddress.c_str(), "unknown");
+    const Ref<Instance> host = only(agent().m_CIM_ComputerSystem_map);
+    EXPECT_EQ(value(host.get(), "Name"), host_name());
+    EXPECT_THAT(value(host.get(), "OtherIdentifyingInfo"), testing::StartsWith("{unknown,"));
     EXPECT_THAT(words(), Contains("Error! gethostbyname() failed, using 'unknown' for IP address."));
 }
 
@@ -332,6 +348,44 @@ TEST_F(AdapterUpdate, TwoPortsOfOneNameAreOneAndTheUpdateEndsThere)
     ProviderAgent& held = agent();
     Agent_Wait wait(held);
     EXPECT_EQ(held.updateAdapterMaps(), 32769u);
+}
+
+TEST_F(AdapterUpdate, AHostWithOtherAdaptersAlonePublishesItsServices)
+{
+    plain(agent().m_NVRHBA_FCPort_map);
+    ProviderAgent& held = agent();
+    Agent_Wait wait(held);
+    auto& adapters = const_cast<std::vector<Adapter*>&>(held.m_pData->getAdapters());
+    Adapter* real = adapters[0];
+    Other_Adapter other;
+    adapters[0] = &other;
+    words();
+    EXPECT_EQ(held.updateAdapterMaps(), 0u);
+    adapters[0] = real;
+    const std::string skipped = "Skippping Adapter [Other-0] since it is not an FC Adapter";
+    EXPECT_THAT(words(), contains_in_order({"Starting the SoftwareInstallationService", skipped,
+                                            "driverName: , driverVersion: , driverManufacturer: ", skipped,
+                                            "Done with the Driver Parameter fetching"}));
+    EXPECT_EQ(held.m_NVRHBA_RegisteredProfile_map.size(), 13u);
+    EXPECT_EQ(held.m_NVRHBA_SoftwareInstallationService_map.size(), 1u);
+    EXPECT_EQ(held.m_NVRHBA_SoftwareIdentity_map.size(), 4u); // provider, tagging, driver, diagnostics
+    EXPECT_EQ(held.m_NVRHBA_PhysicalPackage_map.size(), 0u);
+    EXPECT_EQ(held.m_NVRHBA_FCPort_map.size(), 0u);
+}
+
+TEST_F(AdapterUpdate, AnAdapterOfAnotherKindCountsInTheNumbers)
+{
+    plain(agent().m_NVRHBA_FCPort_map);
+    ProviderAgent& held = agent();
+    Agent_Wait wait(held);
+    auto& adapters = const_cast<std::vector<Adapter*>&>(held.m_pData->getAdapters());
+    Other_Adapter other;
+    adapters.insert(adapters.begin(), &other);
+    EXPECT_EQ(held.updateAdapterMaps(), 0u);
+    adapters.erase(adapters.begin());
+    const Instance_Map& devices = held.m_NVRHBA_PCIDevice_map;
+    ASSERT_EQ(devices.size(), 1u);
+    EXPECT_EQ(value(devices[0], "ElementName"), "Norvane:FCAdapter1");
 }
 
 TEST_F(AdapterUpdate, AHostWithoutAdaptersPublishesItsProfilesAlone)

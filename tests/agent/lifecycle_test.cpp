@@ -164,6 +164,36 @@ TEST_F(Lifecycle, ALoadDuringTheLastReleaseKeepsTheAgent)
     EXPECT_THAT(words(), Contains("Norvane Provider Unloaded"));
 }
 
+TEST_F(Lifecycle, AnUpCallThatLoadsAProviderDuringTheLastReleaseIsNotHeldUp)
+{
+    on_driver_log = [](ProviderAgent&) {
+        usleep(100000); // the last release waits for this thread by now
+        EXPECT_EQ(ProviderAgent::load(), 0);
+        ProviderAgent::unload();
+    };
+    ASSERT_EQ(load(), 0);
+    agent().BuildCimpleInfo();
+    unload();
+    EXPECT_THAT(words(), contains_in_order({"ProviderAgent::releaseRef[1]", "ProviderAgent::addRef[0]",
+                                            "ProviderAgent::releaseRef[1]", "PERF: DataFetch_Handler Thread END",
+                                            "Entering the function ~ProviderAgent()", "Norvane Provider Unloaded"}));
+}
+
+TEST_F(Lifecycle, ALastReleaseOnTheFetchThreadLeavesTheAgentToTheNextOne)
+{
+    on_driver_log = [](ProviderAgent&) { ProviderAgent::unload(); };
+    ASSERT_EQ(load(), 0);
+    ProviderAgent* before = &agent();
+    before->BuildCimpleInfo();
+    settle();
+    EXPECT_THAT(words(), Not(Contains("Entering the function ~ProviderAgent()")));
+    on_driver_log = nullptr;
+    ASSERT_EQ(load(), 0);
+    EXPECT_EQ(&agent(), before);
+    unload();
+    EXPECT_THAT(words(), Contains("Norvane Provider Unloaded"));
+}
+
 TEST_F(Lifecycle, ManyThreadsLoadAndUnloadAtOnce)
 {
     std::atomic<int> refused{0};

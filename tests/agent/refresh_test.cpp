@@ -339,15 +339,19 @@ TEST_F(Refresh, ARefusedCopyHandsNothingOut)
 
 TEST_F(Refresh, AHandlerThatThrowsEndsTheEnumerationWithItsWords)
 {
+    const Enum_Handler handler{[](Instance* instance, int, void*) -> bool {
+                                   unref(instance);
+                                   throw std::runtime_error("handler");
+                               },
+                               nullptr};
     plain(agent().m_NVRHBA_FCPort_map);
     words();
-    enumeratePlain(agent(), agent().m_NVRHBA_FCPort_map,
-                   {[](Instance* instance, int, void*) -> bool {
-                        unref(instance);
-                        throw std::runtime_error("handler");
-                    },
-                    nullptr});
-    EXPECT_THAT(words(), Contains("Exception in CIM Provider Enumeration - do nothing"));
+    enumeratePlain(agent(), agent().m_NVRHBA_FCPort_map, handler);
+    EXPECT_EQ(words().back(), "Exception in CIM Provider Enumeration - do nothing");
+    enumerateActive<&ProviderAgent::GetFCPortStats>(agent(), agent().m_NVRHBA_FCPortStatistics_map, handler);
+    EXPECT_EQ(words().back(), "Exception in Active CIM Provider Enumeration - do nothing");
+    enumerateSAN(agent(), agent().m_NVRHBA_SCSIProtocolEndpoint_map, handler);
+    EXPECT_EQ(words().back(), "Exception in SAN CIM Provider Enumeration - do nothing");
     Mutex& data = agent().m_DataMutex;
     EXPECT_EQ(data.try_lock(), 0); // no lock is left behind
     data.unlock();

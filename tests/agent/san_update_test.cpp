@@ -2,10 +2,10 @@
 
 #include <set>
 
-#include "inventory/Adapter.h"
 #include "inventory/NVR_Data.h"
 #include "inventory/Port.h"
 #include "inventory/Target.h"
+#include "tests/agent/Other_Adapter.h"
 #include "tests/agent/expect_rows.h"
 
 using namespace cimple;
@@ -112,20 +112,6 @@ protected:
             count += map->size();
         return count;
     }
-};
-
-/// An adapter of another kind.
-struct Other_Adapter : Adapter {
-    Other_Adapter() : Adapter("Other-0", 0, 2) {}
-    const std::string* getAdapterName() override { return &m_adapterName; }
-    const uint32* getAdapterNumber() override { return &m_adapterNumber; }
-    const uint32* getFunctionType() override { return &m_functionType; }
-    AdapterAttributes* getAttributes() override { return nullptr; }
-    AdapterStatistics* getStatistics() override { return nullptr; }
-    uint32 getNumberOfPorts() override { return 0; }
-    std::vector<Port*>* getPorts() override { return &m_ports; }
-    Port* getPort(uint32) override { return nullptr; }
-    void rescanTargets() override {}
 };
 
 } // namespace
