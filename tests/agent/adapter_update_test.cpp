@@ -1,8 +1,10 @@
+#include <cstdio>
+
 #include "agent/Agent_Wait.h"
 #include "inventory/NVR_Data.h"
 #include "simulator/nvrsim.h"
 #include "tests/agent/Other_Adapter.h"
-#include "tests/agent/Simulated_Host.h"
+#include "tests/agent/expect_rows.h"
 #include "tests/support/private_host.h"
 
 using namespace cimple;
@@ -32,19 +34,6 @@ protected:
     }
 };
 
-struct Row {
-    const char* property;
-    const char* value;
-};
-
-template <std::size_t N>
-void expect_rows(const Instance* instance, const Row (&rows)[N])
-{
-    EXPECT_STREQ(instance->__name_space.c_str(), "root/norvane");
-    for (const Row& row : rows)
-        EXPECT_EQ(value(instance, row.property), row.value) << row.property;
-}
-
 std::string host_name()
 {
     char name[256] = {};
@@ -57,117 +46,131 @@ std::string host_name()
 TEST_F(AdapterUpdate, AnFCPortShowsAllThatTheLibrariesTell)
 {
     const Ref<Instance> port = only(agent().m_NVRHBA_FCPort_map);
-    const Row rows[] = {
-        {"PortNumber", "0"},
-        {"Description", "Norvane FC2162 16Gb Fibre Channel Host Bus Adapter"},
-        {"SystemCreationClassName", "CIM_ComputerSystem"},
-        {"CreationClassName", "NVRHBA_FCPort"},
-        {"Name", first_wwpn},
-        {"DeviceID", first_wwpn},
-        {"PermanentAddress", first_wwpn},
-        {"NetworkAddresses", "{10000000C9A00001}"},
-        {"OtherIdentifyingInfo", "{Norvane FC2162 16Gb 2-Port PCIe Fibre Channel Adapter,FC2162-M8,NV216200001,A-5681,"
-                                 "4E56,FC2162,Norvane FC2162 16Gb 2-Port PCIe Fibre Channel Adapter,FC2162-M8,0,"
-                                 "slot 1,/sys/class/fc_host/host0,00:00:c9:a0:00:01}"},
-        {"IdentifyingDescriptions", "{VPD:PRODUCT_NAME,VPD:PART_NUMBER,VPD:SERIAL_NUMBER,VPD:EC_LEVEL,"
-                                    "VPD:MANUFACTURER_ID,VPD:V0,VPD:V1,VPD:V2,VPD:V4,VPD:YA,OS Device Name,"
-                                    "NORVANE:IEEE_ADDRESS}"},
-        {"LocationIndicator", "3"},
-        {"ElementName", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"},
-        {"UsageRestriction", "4"},
-        {"FCID", "65792"},
-        {"NumberOfDiscoveredPorts", "1"},
-        {"OperationalFirmware", "SLI-3 Overlay:v2.01a4"},
-        {"FabricName", "1000000533A00001"},
-        {"AdapterName", "Norvane-FC2162-0"},
-        {"LinkTechnology", "4"},
-        {"SupportedMaximumTransmissionUnit", "2048"},
-        {"ActiveMaximumTransmissionUnit", "2048"},
-        {"OperationalStatus", "{2}"},
-        {"StatusDescriptions", "{OK}"},
-        {"SupportedCOS", "{3}"},
-        {"ActiveCOS", "{3}"},
-        {"SupportedFC4Types", "{8,32}"},
-        {"ActiveFC4Types", "{8}"},
-        {"Speed", "16000000000"},
-        {"MaxSpeed", "16000000000"},
-        {"OtherPortType", "null"},
-        {"EnabledState", "5"}, // the schema's default
-    };
-    expect_rows(port.get(), rows);
+    expect_rows(port.get(),
+                {
+                    {"PortNumber", "0"},
+                    {"Description", "Norvane FC2162 16Gb Fibre Channel Host Bus Adapter"},
+                    {"SystemCreationClassName", "CIM_ComputerSystem"},
+                    {"CreationClassName", "NVRHBA_FCPort"},
+                    {"Name", first_wwpn},
+                    {"DeviceID", first_wwpn},
+                    {"PermanentAddress", first_wwpn},
+                    {"NetworkAddresses", "{10000000C9A00001}"},
+                    {"OtherIdentifyingInfo",
+                     "{Norvane FC2162 16Gb 2-Port PCIe Fibre Channel Adapter,FC2162-M8,NV216200001,A-5681,"
+                     "4E56,FC2162,Norvane FC2162 16Gb 2-Port PCIe Fibre Channel Adapter,FC2162-M8,0,"
+                     "slot 1,/sys/class/fc_host/host0,00:00:c9:a0:00:01}"},
+                    {"IdentifyingDescriptions", "{VPD:PRODUCT_NAME,VPD:PART_NUMBER,VPD:SERIAL_NUMBER,VPD:EC_LEVEL,"
+                                                "VPD:MANUFACTURER_ID,VPD:V0,VPD:V1,VPD:V2,VPD:V4,VPD:YA,OS Device Name,"
+                                                "NORVANE:IEEE_ADDRESS}"},
+                    {"LocationIndicator", "3"},
+                    {"ElementName", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"},
+                    {"UsageRestriction", "4"},
+                    {"FCID", "65792"},
+                    {"NumberOfDiscoveredPorts", "1"},
+                    {"OperationalFirmware", "SLI-3 Overlay:v2.01a4"},
+                    {"FabricName", "1000000533A00001"},
+                    {"AdapterName", "Norvane-FC2162-0"},
+                    {"LinkTechnology", "4"},
+                    {"SupportedMaximumTransmissionUnit", "2048"},
+                    {"ActiveMaximumTransmissionUnit", "2048"},
+                    {"OperationalStatus", "{2}"},
+                    {"StatusDescriptions", "{OK}"},
+                    {"SupportedCOS", "{3}"},
+                    {"ActiveCOS", "{3}"},
+                    {"SupportedFC4Types", "{8,32}"},
+                    {"ActiveFC4Types", "{8}"},
+                    {"Speed", "16000000000"},
+                    {"MaxSpeed", "16000000000"},
+                    {"OtherPortType", "null"},
+                    {"EnabledState", "5"}, // the schema's default
+                });
 }
 
 TEST_F(AdapterUpdate, TheClassesOfAnAdapterStandOnItsAttributes)
 {
     const Ref<Instance> package = only(agent().m_NVRHBA_PhysicalPackage_map);
-    const Row package_rows[] = {
-        {"Name", "FC2162"},
-        {"Model", "FC2162"},
-        {"PartNumber", "FC2162"},
-        {"Manufacturer", "Norvane Corporation"},
-        {"Tag", "20000000C9A00001"},
-        {"CreationClassName", "NVRHBA_PhysicalPackage"},
-        {"Description", "Norvane FC2162 16Gb Fibre Channel Host Bus Adapter"},
-        {"ElementName", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"},
-        {"SerialNumber", "NV216200001"},
-        {"Version", "31004549"},
-        {"SLIMode", "4"},
-        {"BoardTemperature", "45"},
-        {"ThresholdCriticalTemp", "100"},
-        {"ThresholdWarningTemp", "85"},
-        {"TemperatureUnit", "Celsius"},
-        {"VendorSpecID", "1314320738"},
-        {"DeviceID", "61794"},
-        {"ModelID", "8546"},
-        {"PackageType", "9"},
-    };
-    expect_rows(package.get(), package_rows);
+    expect_rows(package.get(), {
+                                   {"Name", "FC2162"},
+                                   {"Model", "FC2162"},
+                                   {"PartNumber", "FC2162"},
+                                   {"Manufacturer", "Norvane Corporation"},
+                                   {"Tag", "20000000C9A00001"},
+                                   {"CreationClassName", "NVRHBA_PhysicalPackage"},
+                                   {"Description", "Norvane FC2162 16Gb Fibre Channel Host Bus Adapter"},
+                                   {"ElementName", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"},
+                                   {"SerialNumber", "NV216200001"},
+                                   {"Version", "31004549"},
+                                   {"SLIMode", "4"},
+                                   {"BoardTemperature", "45"},
+                                   {"ThresholdCriticalTemp", "100"},
+                                   {"ThresholdWarningTemp", "85"},
+                                   {"TemperatureUnit", "Celsius"},
+                                   {"VendorSpecID", "1314320738"},
+                                   {"DeviceID", "61794"},
+                                   {"ModelID", "8546"},
+                                   {"PackageType", "9"},
+                               });
     const Ref<Instance> product = only(agent().m_NVRHBA_Product_map);
-    const Row product_rows[] = {{"Name", "FC2162"},
+    expect_rows(product.get(), {{"Name", "FC2162"},
                                 {"IdentifyingNumber", "20000000C9A00001"},
                                 {"Vendor", "Norvane Corporation"},
                                 {"Version", "31004549"},
-                                {"ElementName", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"}};
-    expect_rows(product.get(), product_rows);
+                                {"ElementName", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"}});
     const Ref<Instance> group = only(agent().m_NVRHBA_LogicalPortGroup_map);
-    const Row group_rows[] = {{"Description", "The Fibre Channel ports of the HBA."},
+    expect_rows(group.get(), {{"Description", "The Fibre Channel ports of the HBA."},
                               {"Name", "20000000C9A00001"},
                               {"InstanceID", "NVR FC HBA:20000000C9A00001"},
                               {"NameFormat", "WWN"},
-                              {"ElementName", "FC2162:20000000C9A00001"}};
-    expect_rows(group.get(), group_rows);
+                              {"ElementName", "FC2162:20000000C9A00001"}});
 }
 
 TEST_F(AdapterUpdate, ThePCIDeviceShowsTheHeaderInItsOrder)
 {
-    scenario("[[adapter]]\n[[adapter.port]]\npci = { vendor = 0x1234, device = 0xF162, command = 0x0146, status = 16, "
-             "revision = 3, prog_if = 1, sub_class = 4, base_class = 12, cache_line_size = 16, latency_timer = 5, "
-             "header_type = 128, bist = 7 }\n");
+    // Each byte is its own number, from 1.
+    char header[2 * 64 + 1];
+    for (int i = 0; i < 64; i++)
+        std::snprintf(header + 2 * i, 3, "%02X", i + 1);
+    scenario("[[adapter]]\n[[adapter.port]]\npci = { raw = \"" + std::string(header) + "\" }\n");
     refresh();
     const Ref<Instance> device = only(agent().m_NVRHBA_PCIDevice_map);
-    const Row rows[] = {
-        {"CreationClassName", "NVRHBA_PCIDevice"},
-        {"DeviceID", "10000000C9A00001:0xF162"},
-        {"ElementName", "Norvane:FCAdapter0"},
-        {"EnabledState", "5"},
-        {"RequestedState", "5"},
-        {"PrimaryStatus", "5"},
-        {"HealthState", "5"},
-        {"FunctionNumber", "0"},
-        {"BusNumber", "4"},
-        {"VendorID", "4660"},
-        {"Command", "326"},
-        {"PCIStatus", "16"},
-        {"RevisionID", "3"},
-        {"ProgIf", "1"},
-        {"SubClass", "4"},
-        {"BaseClass", "12"},
-        {"CacheLineSize", "16"},
-        {"LatencyTimer", "5"},
-        {"HeaderType", "128"},
-        {"BuiltInSelfTest", "7"},
-    };
-    expect_rows(device.get(), rows);
+    expect_rows(device.get(), {
+                                  {"CreationClassName", "NVRHBA_PCIDevice"},
+                                  {"DeviceID", "10000000C9A00001:0x0403"},
+                                  {"ElementName", "Norvane:FCAdapter0"},
+                                  {"EnabledState", "5"},
+                                  {"RequestedState", "5"},
+                                  {"PrimaryStatus", "5"},
+                                  {"HealthState", "5"},
+                                  {"FunctionNumber", "0"},
+                                  {"BusNumber", "4"},
+                                  {"VendorID", "513"},
+                                  {"Command", "1541"},
+                                  {"PCIStatus", "2055"},
+                                  {"RevisionID", "9"},
+                                  {"ProgIf", "10"},
+                                  {"SubClass", "11"},
+                                  {"BaseClass", "12"},
+                                  {"CacheLineSize", "13"},
+                                  {"LatencyTimer", "14"},
+                                  {"HeaderType", "15"},
+                                  {"BuiltInSelfTest", "16"},
+                                  {"BaseAddresses0", "336794129"},
+                                  {"BaseAddresses1", "404166165"},
+                                  {"BaseAddresses2", "471538201"},
+                                  {"BaseAddresses3", "538910237"},
+                                  {"BaseAddresses4", "606282273"},
+                                  {"BaseAddresses5", "673654309"},
+                                  {"CIS", "741026345"},
+                                  {"SubVendorID", "11821"},
+                                  {"SubsystemID", "12335"},
+                                  {"ExpansionROMBaseAddress", "875770417"},
+                                  {"CapabilitiesPtr", "53"},
+                                  {"InterruptLine", "61"},
+                                  {"InterruptPin", "62"},
+                                  {"MinimumGrant", "63"},
+                                  {"MaximumLatency", "64"},
+                              });
 }
 
 TEST_F(AdapterUpdate, UnreadablePCIRegistersReadAsZero)
@@ -195,23 +198,29 @@ TEST_F(AdapterUpdate, ABoardTemperatureOfZeroLeavesAllThreeNull)
 TEST_F(AdapterUpdate, ControllersAndStatisticsOfAPort)
 {
     const Ref<Instance> protocol = only(agent().m_NVRHBA_SCSIProtocolController_map);
-    const Row protocol_rows[] = {{"Name", first_wwpn},           {"DeviceID", first_wwpn}, {"OperationalStatus", "{2}"},
-                                 {"StatusDescriptions", "{OK}"}, {"NameFormat", "2"},      {"MaxUnitsControlled", "1"}};
-    expect_rows(protocol.get(), protocol_rows);
+    expect_rows(protocol.get(), {{"Name", first_wwpn},
+                                 {"DeviceID", first_wwpn},
+                                 {"OperationalStatus", "{2}"},
+                                 {"StatusDescriptions", "{OK}"},
+                                 {"NameFormat", "2"},
+                                 {"MaxUnitsControlled", "1"}});
     const Ref<Instance> controller = only(agent().m_NVRHBA_PortController_map);
-    const Row controller_rows[] = {{"DeviceID", first_wwpn},     {"Name", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"},
-                                   {"ControllerType", "4"},      {"ProtocolSupported", "10"},
-                                   {"MaxNumberControlled", "1"}, {"ProtocolDescription", "SCSI Fibre Channel Protocol"},
-                                   {"Availability", "3"},        {"EnabledState", "5"},
-                                   {"RequestedState", "5"},      {"EnabledDefault", "2"},
-                                   {"OperationalStatus", "{2}"}};
-    expect_rows(controller.get(), controller_rows);
+    expect_rows(controller.get(), {{"DeviceID", first_wwpn},
+                                   {"Name", "Norvane FC2162 FV2.01a4 DV8.3.7.18 HBA0"},
+                                   {"ControllerType", "4"},
+                                   {"ProtocolSupported", "10"},
+                                   {"MaxNumberControlled", "1"},
+                                   {"ProtocolDescription", "SCSI Fibre Channel Protocol"},
+                                   {"Availability", "3"},
+                                   {"EnabledState", "5"},
+                                   {"RequestedState", "5"},
+                                   {"EnabledDefault", "2"},
+                                   {"OperationalStatus", "{2}"}});
     const Ref<Instance> statistics = only(agent().m_NVRHBA_FCPortStatistics_map);
-    const Row statistics_rows[] = {{"InstanceID", "NVR FC HBA:HBA Statistics:10000000C9A00001"},
+    expect_rows(statistics.get(), {{"InstanceID", "NVR FC HBA:HBA Statistics:10000000C9A00001"},
                                    {"ElementName", first_wwpn},
                                    {"Description", "Statistics for the FC port."},
-                                   {"BytesTransmitted", "null"}};
-    expect_rows(statistics.get(), statistics_rows);
+                                   {"BytesTransmitted", "null"}});
 }
 
 TEST_F(AdapterUpdate, TheAssociationsOfAPortLeadToBothEnds)
@@ -256,18 +265,18 @@ TEST_F(AdapterUpdate, TheHostIsGeneratedWhereNobodyPublishesOne)
     plain(agent().m_NVRHBA_FCPort_map);
     EXPECT_TRUE(agent().m_bOwnComputerSystem);
     const Ref<Instance> host = only(agent().m_CIM_ComputerSystem_map);
-    const Row rows[] = {{"CreationClassName", "CIM_ComputerSystem"},
-                        {"EnabledState", "0"},
-                        {"RequestedState", "12"},
-                        {"EnabledDefault", "2"},
-                        {"TransitioningToState", "12"},
-                        {"Dedicated", "{0}"},
-                        {"NameFormat", "Other"},
-                        {"ResetCapability", "2"},
-                        {"PowerManagementCapabilities", "{0}"},
-                        {"OperationalStatus", "{2}"},
-                        {"IdentifyingDescriptions", "{NORVANE:IP_ADDRESS,NORVANE:OS_NAME,NORVANE:OS_EXTENDED_INFO}"}};
-    expect_rows(host.get(), rows);
+    expect_rows(host.get(),
+                {{"CreationClassName", "CIM_ComputerSystem"},
+                 {"EnabledState", "0"},
+                 {"RequestedState", "12"},
+                 {"EnabledDefault", "2"},
+                 {"TransitioningToState", "12"},
+                 {"Dedicated", "{0}"},
+                 {"NameFormat", "Other"},
+                 {"ResetCapability", "2"},
+                 {"PowerManagementCapabilities", "{0}"},
+                 {"OperationalStatus", "{2}"},
+                 {"IdentifyingDescriptions", "{NORVANE:IP_ADDRESS,NORVANE:OS_NAME,NORVANE:OS_EXTENDED_INFO}"}});
     EXPECT_EQ(value(host.get(), "Name"), agent().m_hostName.c_str());
     EXPECT_THAT(value(host.get(), "Description"), HasSubstr("with Norvane CMPI HBA Provider v2.5.19-1"));
     EXPECT_THAT(words(), contains_in_order({"up-call to enumerate CIM_ComputerSystem started",
