@@ -17,6 +17,7 @@ using namespace cimple;
 
 std::function<void(ProviderAgent&)> on_driver_log;
 bool no_more_threads = false;
+bool no_host_name = false;
 
 namespace {
 
@@ -85,6 +86,7 @@ SimulatedHost::SimulatedHost()
     agent_clock = &test_clock;
     on_driver_log = nullptr;
     no_more_threads = false;
+    no_host_name = false;
     install();
     scenario("[[adapter]]\n[[target]]\nluns = 2\n");
     CLogger::instance()->enable();
@@ -222,4 +224,13 @@ extern "C" int __wrap_pthread_create(pthread_t* thread, const pthread_attr_t* at
 {
     if (nvrtest::no_more_threads) return EAGAIN;
     return __real_pthread_create(thread, attributes, procedure, argument);
+}
+
+// And every call of gethostname here.
+extern "C" int __real_gethostname(char*, std::size_t);
+extern "C" int __wrap_gethostname(char* name, std::size_t size)
+{
+    if (!nvrtest::no_host_name) return __real_gethostname(name, size);
+    errno = ENAMETOOLONG;
+    return -1;
 }

@@ -27,6 +27,9 @@ extern std::function<void(cimple::ProviderAgent&)> on_driver_log;
 /// True: the next threads cannot be created.
 extern bool no_more_threads;
 
+/// True: the host does not tell its name.
+extern bool no_host_name;
+
 /// So many microseconds go by on the agent's clock.
 void advance_clock(cimple::uint64 usec);
 constexpr cimple::uint64 second = 1000000;

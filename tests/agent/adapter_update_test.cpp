@@ -1,3 +1,4 @@
+#include <cerrno>
 #include <cstdio>
 
 #include "agent/Agent_Wait.h"
@@ -300,6 +301,17 @@ TEST_F(AdapterUpdate, TheHostBearsItsOfficialNameAndItsFirstAddress)
     EXPECT_EQ(value(host.get(), "OtherIdentifyingInfo"), "{192.0.2.7," + system + "," + version + "}");
     EXPECT_EQ(value(host.get(), "Description"), system + " with Norvane CMPI HBA Provider v2.5.19-1");
     EXPECT_THAT(words(), contains_in_order({"Host Name : " + host_name(), "Host ipAddress : 192.0.2.7"}));
+}
+
+TEST_F(AdapterUpdate, AHostThatDoesNotTellItsNameIsUnknown)
+{
+    no_host_name = true;
+    const Ref<Instance> host = only(agent().m_CIM_ComputerSystem_map);
+    EXPECT_EQ(value(host.get(), "Name"), "unknown");
+    EXPECT_THAT(value(host.get(), "OtherIdentifyingInfo"), testing::StartsWith("{unknown,"));
+    EXPECT_EQ(value(plain(agent().m_NVRHBA_FCPort_map)[0].get(), "SystemName"), "unknown");
+    EXPECT_THAT(words(), Contains("Error! gethostname() failed err : " + std::to_string(ENAMETOOLONG) +
+                                  " , using 'unknown' for hostname and IP address"));
 }
 
 TEST_F(AdapterUpdate, AnUnknownHostNameHasAnUnknownAddress)
