@@ -20,13 +20,9 @@ constexpr char name_space[] = "root/norvane";
 constexpr char refresh_start[] = "PERF: Creating DataFetch_Handler Thread.";
 constexpr char refresh_end[] = "PERF: DataFetch_Handler Thread END";
 
-std::size_t lines_with_end(const std::string& path, const std::string& end)
+bool ends_with(const std::string& line, const std::string& end)
 {
-    std::size_t count = 0;
-    std::ifstream file(path);
-    for (std::string line; std::getline(file, line);)
-        count += line.size() >= end.size() && line.compare(line.size() - end.size(), end.size(), end) == 0;
-    return count;
+    return line.size() >= end.size() && line.compare(line.size() - end.size(), end.size(), end) == 0;
 }
 
 // The machine's own name stays what it is: the program has names of its own.
@@ -120,9 +116,21 @@ std::vector<std::string> Rig::classes()
     return names;
 }
 
+const Rig::Told& Rig::told() const
+{
+    std::ifstream trace(m_trace_path);
+    trace.seekg(m_told.read);
+    for (std::string line; std::getline(trace, line) && !trace.eof();) {
+        m_told.read += static_cast<std::streamoff>(line.size()) + 1;
+        m_told.starts += ends_with(line, refresh_start);
+        m_told.ends += ends_with(line, refresh_end);
+    }
+    return m_told;
+}
+
 std::size_t Rig::refreshes() const
 {
-    return lines_with_end(m_trace_path, refresh_end);
+    return told().ends;
 }
 
 void Rig::wait_for_refreshes(std::size_t count)
@@ -137,7 +145,7 @@ void Rig::wait_for_refreshes(std::size_t count)
 void Rig::refresh()
 {
     // One that runs already would take the question for its own.
-    const std::size_t before = lines_with_end(m_trace_path, refresh_start);
+    const std::size_t before = told().starts;
     wait_for_refreshes(before);
     advance_clock(std::chrono::minutes(31));
     const host::Answer answer = enumerate("NVRHBA_ProviderConfigSetting");

@@ -8,6 +8,7 @@
 /// For programs with a private host. One at a time; its server may be asked from many threads.
 #pragma once
 
+#include <ios>
 #include <memory>
 #include <string>
 #include <vector>
@@ -79,6 +80,13 @@ private:
     const Rig_Options m_options;
     std::string m_trace_path;
     std::size_t m_forgotten = 0;
+    /// What the trace has told of refreshes, read as far as `read`.
+    struct Told {
+        std::streamoff read = 0;
+        std::size_t starts = 0, ends = 0;
+    };
+    const Told& told() const;
+    mutable Told m_told;
     std::unique_ptr<host::Host> m_server;
 };
 
