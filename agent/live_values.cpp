@@ -121,10 +121,10 @@ void ProviderAgent::UpdateFCPortStatus()
     if (!m_pData || !m_pData->haveAdapters()) return;
     Finder<NVRHBA_FCPort> instances(m_NVRHBA_FCPort_map, &NVRHBA_FCPort::DeviceID);
     // One port that cannot be read ends the walk: the rest keep the status they have until the next one.
-    walkFCPorts(*m_pData, [&](FCAdapter& adapter, FCPort& port) {
-        auto* instance = instances.find(port.portName());
-        if (!instance) return true;
-        const bool updated = guarded([&] {
+    const bool walked = guarded([&] {
+        walkFCPorts(*m_pData, [&](FCAdapter& adapter, FCPort& port) {
+            auto* instance = instances.find(port.portName());
+            if (!instance) return true;
             std::unique_ptr<FCPortAttributes> attributes;
             const bool read = guarded([&] { attributes.reset(new FCPortAttributes(adapter, port.portIndex())); });
             if (!read) {
@@ -134,10 +134,10 @@ void ProviderAgent::UpdateFCPortStatus()
             const Status_Row& row = port_status(attributes->PortState);
             set(instance->OperationalStatus, {row.status});
             set(instance->StatusDescriptions, {row.text});
+            return true;
         });
-        if (!updated) NVR_LOG("Error while updating FC Port map");
-        return updated;
     });
+    if (!walked) NVR_LOG("Error while updating FC Port map");
 }
 
 } // namespace cimple
