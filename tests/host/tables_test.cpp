@@ -85,9 +85,13 @@ TEST_P(Tables, ObjectTablesHaveTheirVersionsAndHoles)
 
 TEST_P(Tables, PropertyQualifiersAreReadWhereTheSlotIs)
 {
-    if (!is("sfcb")) GTEST_SKIP() << "no such slot";
     server->on_request_thread([&](const CMPIBroker* mb, const CMPIContext*) {
         CMPIObjectPath* path = mb->eft->newObjectPath(mb, things::space, "TEST_Thing", nullptr);
+        if (!is("sfcb")) {
+            EXPECT_EQ(nullptr, path->ft->getPropertyQualifier);
+            path->ft->release(path);
+            return;
+        }
         CMPIStatus status{};
         CMPIData key = path->ft->getPropertyQualifier(path, "Id", "Key", &status);
         EXPECT_EQ(CMPI_RC_OK, status.rc);
@@ -127,7 +131,10 @@ TEST_P(Tables, AThreadKeyFillsFourOfEightBytes)
 
 TEST_P(Tables, MarkAndReleaseFreeWhatWasMadeBetween)
 {
-    if (!server->broker()->mft) GTEST_SKIP() << "no such table";
+    if (!is("sfcb")) {
+        EXPECT_EQ(nullptr, server->broker()->mft);
+        return;
+    }
     server->on_request_thread([&](const CMPIBroker* mb, const CMPIContext*) {
         CMPIString* before = mb->eft->newString(mb, "before", nullptr);
         CMPIGcStat* mark = mb->mft->mark(mb, nullptr);
@@ -143,7 +150,10 @@ TEST_P(Tables, MarkAndReleaseFreeWhatWasMadeBetween)
 
 TEST_P(Tables, ErrorsAreWholeObjectsWhereTheyCanBeMade)
 {
-    if (!server->broker()->eft->newCMPIError) GTEST_SKIP() << "no such slot";
+    if (!is("pegasus")) {
+        EXPECT_EQ(nullptr, server->broker()->eft->newCMPIError);
+        return;
+    }
     server->on_request_thread([&](const CMPIBroker* mb, const CMPIContext*) {
         CMPIError* error = mb->eft->newCMPIError(mb, "me", "M1", "broken", CMPIErrorSeverity(3),
                                                  CMPIErrorProbableCause(4), CMPI_RC_ERR_NOT_FOUND, nullptr);
