@@ -6,9 +6,9 @@
 ///
 /// Lock order: m_AdapterDataReadyMutex, m_AdapterMapsReadyMutex, m_SANMapsReadyMutex, m_DataMutex, and then the local
 /// mutex of an active enumeration. m_DataFetchMutex is innermost: nothing but the logger is taken under it. The
-/// lifetime mutex is taken before any of them. The members are open to the floors above, which read and write them
-/// under these locks: m_DataMutex guards the inventory and the content of the maps, each ready mutex its flag. The
-/// flags are atomic words, since the refresh gate looks at them without their mutex.
+/// lifetime mutex is taken before any of them, and never on the fetch thread. The members are open to the floors above,
+/// which read and write them under these locks: m_DataMutex guards the inventory and the content of the maps, each
+/// ready mutex its flag. The flags are atomic words, since the refresh gate looks at them without their mutex.
 #pragma once
 
 #include <atomic>

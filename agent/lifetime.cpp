@@ -12,10 +12,35 @@ namespace {
 Mutex lifetime_mutex(false);
 ProviderAgent* the_agent = nullptr;
 std::atomic<sint32> reference_count{0};
-uint32 refused_count = 0; // loads that were answered 30 and will be unloaded all the same
-uint32 releasing = 0;     // threads that wait in a last release
+std::atomic<sint32> refused_count{0}; // loads that were answered 30 and will be unloaded all the same
+uint32 releasing = 0;                 // threads that wait in a last release
 
 thread_local bool on_fetch_thread = false;
+
+/// Holds the lifetime mutex, but on the fetch thread: an up-call that comes back holds the agent's locks already, which
+/// the agent's end takes under this mutex. No lock is needed there, since the agent outlives its fetch thread.
+class Lifetime_Lock {
+public:
+    Lifetime_Lock()
+    {
+        if (!on_fetch_thread) lifetime_mutex.lock();
+    }
+    ~Lifetime_Lock()
+    {
+        if (!on_fetch_thread) lifetime_mutex.unlock();
+    }
+    Lifetime_Lock(const Lifetime_Lock&) = delete;
+    Lifetime_Lock& operator=(const Lifetime_Lock&) = delete;
+};
+
+/// Counts down, but not below 0: false if it was there.
+bool take_one(std::atomic<sint32>& count)
+{
+    sint32 before = count;
+    while (before > 0)
+        if (count.compare_exchange_weak(before, before - 1)) return true;
+    return false;
+}
 
 bool in_use()
 {
@@ -32,13 +57,13 @@ ProviderAgent* ProviderAgent::lockedInstance()
 
 ProviderAgent* ProviderAgent::GetInstance()
 {
-    Auto_Mutex lock(lifetime_mutex);
+    const Lifetime_Lock lock;
     return lockedInstance();
 }
 
 int ProviderAgent::load()
 {
-    Auto_Mutex lock(lifetime_mutex);
+    const Lifetime_Lock lock;
     if (!lockedInstance()->m_bLoaded) {
         refused_count++;
         return LOAD_FAILED;
@@ -57,7 +82,7 @@ int ProviderAgent::unload()
 void ProviderAgent::addRef()
 {
     NVR_LOG("ProviderAgent::addRef[%d]", reference_count.load());
-    Auto_Mutex lock(lifetime_mutex);
+    const Lifetime_Lock lock;
     reference_count++;
 }
 
@@ -66,23 +91,22 @@ void ProviderAgent::addRef()
 void ProviderAgent::releaseRef()
 {
     NVR_LOG("ProviderAgent::releaseRef[%d]", reference_count.load());
-    Auto_Mutex lock(lifetime_mutex);
-    if (reference_count > 0)
-        reference_count--;
-    else if (refused_count > 0)
-        refused_count--;
-    if (in_use() || !the_agent || on_fetch_thread) return;
+    const Lifetime_Lock lock;
+    if (!take_one(reference_count)) take_one(refused_count);
+    if (on_fetch_thread || in_use() || !the_agent) return;
 
-    // The fetch thread's up-call may come back to a provider of ours, whose load needs the lifetime mutex: wait without
-    // it. `releasing` keeps the agent for us if another thread loads and releases meanwhile.
+    // The fetch thread's up-call may have a provider of ours loaded by another thread of the server, which needs the
+    // lifetime mutex: wait without it. `releasing` keeps the agent for us if such a thread loads and releases
+    // meanwhile.
     releasing++;
-    while (!in_use() && the_agent->hasFetchThread()) {
+    bool used;
+    while (!(used = in_use()) && the_agent->hasFetchThread()) {
         lifetime_mutex.unlock();
         the_agent->joinFetchThread();
         lifetime_mutex.lock();
     }
     releasing--;
-    if (in_use() || releasing > 0) return;
+    if (used || releasing > 0) return;
     delete the_agent;
     the_agent = nullptr;
 }
