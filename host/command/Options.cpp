@@ -25,6 +25,8 @@ constexpr const char* footer =
     "  nvrcim enum NVRHBA_FCPort --properties DeviceID,Speed --json\n"
     "  nvrcim get 'NVRHBA_ProviderConfigSetting.InstanceID=\"Norvane HBA Provider:cachetimeout\"'\n"
     "  nvrcim set 'NVRHBA_ProviderConfigSetting.InstanceID=\"Norvane HBA Provider:cachetimeout\"' current=20\n"
+    "  nvrcim associators 'NVRHBA_PhysicalPackage.Tag=\"...\",CreationClassName=\"NVRHBA_PhysicalPackage\"' --names\n"
+    "  nvrcim --scenario typical.toml tree\n"
     "  nvrcim --manner pegasus --server-log - names NVRHBA_Product\n"
     "\n"
     "Exit status: 0 done; a CIM status code (1 failed, 2 access denied, 3 no such namespace, 4 bad parameter,\n"
@@ -75,7 +77,19 @@ int read_options(int count, char** arguments, Options& options)
     CLI::App* get = app.add_subcommand("get", "Show one instance, every property on a line");
     get->add_option("path", options.object, "Its object path")->required();
 
-    for (CLI::App* verb : {enumerate, get}) {
+    CLI::App* associators =
+        app.add_subcommand("associators", "Show the instances that associations tie to an instance");
+    CLI::App* references = app.add_subcommand("references", "Show the associations that hold an instance");
+    for (CLI::App* verb : {associators, references}) {
+        verb->add_option("path", options.object, "Its object path")->required();
+        verb->add_option("--class", options.association_class, "Only by associations of this class");
+        verb->add_option("--role", options.role, "Only where it stands as this end of the association");
+        verb->add_flag("--names", options.names_only, "Only the object paths");
+    }
+    associators->add_option("--result-class", options.result_class, "Only instances of this class");
+    associators->add_option("--result-role", options.result_role, "Only what stands as this end of the association");
+
+    for (CLI::App* verb : {enumerate, get, associators, references}) {
         verb->add_flag("--all", options.all,
                        verb == get ? "Also properties without a value" : "Every property, one on a line");
         verb->add_option("-p,--properties", options.properties, "Only these properties (a,b,c)")->delimiter(',');
@@ -90,6 +104,17 @@ int read_options(int count, char** arguments, Options& options)
         ->required();
     call->add_option("method", options.method, "The method")->required();
     call->add_option("name=value", options.arguments, "Its arguments");
+
+    app.add_subcommand("tree", "Show the host with its adapters, ports, targets and logical units");
+
+    CLI::App* graph = app.add_subcommand("graph", "Draw the tree as a picture (needs Graphviz)");
+    graph
+        ->add_option("file", options.file, "Where to: a name that ends in .svg or .png, or in .dot for the plain graph")
+        ->required();
+
+    CLI::App* check =
+        app.add_subcommand("check", "Verify that both ends of each association exist and find each other");
+    check->add_flag("--all", options.all, "Tell of each association class, not only of faults");
 
     try {
         app.parse(count, arguments);

@@ -7,11 +7,14 @@
 namespace host {
 
 struct Options {
-    std::string verb;                    ///< classes, enum, names, get, set, call
+    std::string verb;                    ///< classes, enum, names, get, set, call, associators, ...
     std::string object;                  ///< a class or an object path; of `classes` a pattern
     std::string method;                  ///< of `call`
     std::vector<std::string> arguments;  ///< name=value, of `set` and `call`
     std::vector<std::string> properties; ///< of `enum` and `get`: only these
+    std::string association_class, result_class, role, result_role; ///< of a traversal; empty: any
+    bool names_only = false;                                        ///< of a traversal: object paths only
+    std::string file;                                               ///< where `graph` draws to
     bool all = false;
     bool json = false;
 

@@ -2,7 +2,11 @@
 
 #include "host/PathText.h"
 #include "host/command/Arguments.h"
+#include "host/command/Check.h"
+#include "host/command/Graph.h"
 #include "host/command/Table.h"
+#include "host/command/Traversal.h"
+#include "host/command/Tree.h"
 #include "host/command/Views.h"
 
 #include <nlohmann/json.hpp>
@@ -25,6 +29,9 @@ public:
     int verb()
     {
         if (m_options.verb == "classes") return classes();
+        if (m_options.verb == "tree") return show_tree(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "graph") return draw_graph(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "check") return check_associations(m_server, m_options, m_out, m_complaints);
         Path_Parse object = parse_path(m_options.object, &m_server.schema(), m_options.name_space);
         if (!object.ok) return wrong(quote(m_options.object) + ": " + object.error);
         m_path = object.path;
@@ -35,25 +42,14 @@ public:
         if (m_options.verb == "names") return names();
         if (m_options.verb == "get") return get();
         if (m_options.verb == "set") return set();
-        return call();
+        if (m_options.verb == "call") return call();
+        if (std::string missing = missing_keys(); !missing.empty()) return wrong(missing);
+        return traverse(m_server, m_path, m_options, m_out, m_complaints);
     }
 
 private:
-    int wrong(const std::string& text)
-    {
-        m_complaints << "nvrcim: wrong command: " << printable(text) << "\n";
-        return usage_error;
-    }
-
-    /// The exit status of a failure; with --json the failure is told in JSON too.
-    int failed(const Status& status)
-    {
-        m_complaints << printable(complaint(status)) << "\n";
-        if (m_options.json)
-            m_out << json_text(
-                {{"status", status.code}, {"name", status_name(status.code)}, {"message", status.message}});
-        return status.code < 0 || status.code > 255 ? 255 : status.code;
-    }
+    int wrong(const std::string& text) { return tell_wrong(text, m_complaints); }
+    int failed(const Status& status) { return tell_failure(status, m_options, m_out, m_complaints); }
 
     Property_List wanted() const
     {
@@ -290,6 +286,21 @@ std::string complaint(const Status& status)
     default:
         return "nvrcim: the provider answers " + name + tail;
     }
+}
+
+int tell_wrong(const std::string& text, std::ostream& complaints)
+{
+    complaints << "nvrcim: wrong command: " << printable(text) << "\n";
+    return usage_error;
+}
+
+int tell_failure(const Status& status, const Options& options, std::ostream& out, std::ostream& complaints)
+{
+    out.flush(); // what came before the failure is seen before it
+    complaints << printable(complaint(status)) << "\n";
+    if (options.json)
+        out << json_text({{"status", status.code}, {"name", status_name(status.code)}, {"message", status.message}});
+    return status.code < 0 || status.code > 255 ? 255 : status.code;
 }
 
 int run_verb(Host& server, const Options& options, std::ostream& out, std::ostream& complaints)

@@ -15,4 +15,11 @@ int run_verb(Host& server, const Options& options, std::ostream& out, std::ostre
 /// "nvrcim: the provider answered CMPI_RC_ERR_NOT_FOUND (6): ..." and so on.
 std::string complaint(const Status& status);
 
+// For the verbs, the two ways to end without success; each gives the exit status.
+
+/// The command cannot be understood.
+int tell_wrong(const std::string& text, std::ostream& complaints);
+/// A request failed; with --json it is told in JSON too.
+int tell_failure(const Status& status, const Options& options, std::ostream& out, std::ostream& complaints);
+
 } // namespace host

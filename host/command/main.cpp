@@ -2,6 +2,7 @@
 #include "host/Host.h"
 #include "host/command/Options.h"
 #include "host/command/Places.h"
+#include "host/command/Streams.h"
 #include "host/command/Table.h"
 #include "host/command/Verbs.h"
 
@@ -30,6 +31,7 @@ int run(host::Options& options, char** arguments)
     std::shared_ptr<const host::Schema> schema = host::Schema::from_files({places.mof}, error);
     if (!schema) return refuse("the class files are wrong: " + error);
 
+    host::Own_Output output(options.server_log == "-");
     host::Host_Options server_options;
     server_options.manner = *host::Manner::find(options.manner);
     server_options.principal = options.user;
@@ -37,7 +39,7 @@ int run(host::Options& options, char** arguments)
     host::Host server(schema, server_options);
     if (server.add_module(places.module, options.name_space, &error) == 0)
         return refuse("the module is unfit: " + error);
-    return host::run_verb(server, options, std::cout, std::cerr);
+    return host::run_verb(server, options, output.stream(), std::cerr);
 }
 
 } // namespace
