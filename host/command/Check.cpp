@@ -90,7 +90,10 @@ private:
             std::vector<std::pair<const Element_Record*, const Path*>> ends;
             for (const Element_Record& property : record.properties) {
                 if (property.type != CMPI_ref) continue;
-                const Path* end = instance.get(property.name).as_path();
+                // A key may stand in the path alone.
+                const Value* value = instance.find(property.name);
+                if (!value) value = instance.path.find(property.name);
+                const Path* end = value ? value->as_path() : nullptr;
                 if (end)
                     ends.emplace_back(&property, end);
                 else

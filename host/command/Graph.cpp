@@ -22,9 +22,10 @@ namespace {
 constexpr const char* fabric_colours[] = {"#0072b2", "#d55e00", "#009e73", "#cc79a7", "#e69f00", "#56b4e9"};
 constexpr const char* quiet = "#5f6b7a";
 
-/// Text inside a label of Graphviz's HTML kind.
+/// Text inside a label of Graphviz's HTML kind, which takes no empty one.
 std::string escaped(const std::string& text)
 {
+    if (text.empty()) return " ";
     std::string out;
     for (char c : printable(text)) {
         if (c == '&')
@@ -84,8 +85,8 @@ struct Shared_Target {
         auto known = std::find_if(units.begin(), units.end(), [&](const auto& each) { return each.first == key; });
         if (known == units.end())
             units.emplace_back(key, std::move(parts));
-        else if (std::find(known->second.begin(), known->second.end(), parts.back()) == known->second.end())
-            known->second.push_back(parts.back());
+        else if (!unit.device.empty())
+            known->second.push_back(unit.device);
     }
 };
 
@@ -131,7 +132,8 @@ private:
             m_text += "    " + ids.back() + " [color=\"" + colour(port) +
                       "\", penwidth=2, label=" + label(facts(port, m_schema)) + "]\n";
             for (const Target_Node& target : port.targets)
-                m_edges += "  " + ids.back() + " -> " + shared(target) + " [color=\"" + colour(port) + "\"]\n";
+                m_edges += "  " + ids.back() + " -> " + shared(target) + " [tailport=e, headport=w, color=\"" +
+                           colour(port) + "\"]\n";
         }
         // An adapter without ports must have a node all the same, or its frame is not drawn.
         if (ids.empty()) {
@@ -141,7 +143,7 @@ private:
         }
         m_text += "  }\n";
         for (const std::string& id : ids)
-            m_edges += "  " + host + " -> " + id + "\n";
+            m_edges += "  " + host + " -> " + id + " [tailport=e, headport=w]\n";
     }
 
     /// The node of a target port, made when the first port of the host sees it.
@@ -161,6 +163,7 @@ private:
         std::string rows = row(bold(title.front()));
         title.erase(title.begin());
         std::string rest = target.node->endpoint.get("ElementName").as_text();
+        rest.erase(rest.find_last_not_of(' ') + 1); // the product, as wide as an inquiry has it
         for (const std::string& part : title)
             rest += (rest.empty() ? "" : "  ") + part;
         rows += row(small(rest)) + (target.units.empty() ? "" : "<hr/>");

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <unordered_map>
+#include <utility>
 
 namespace host {
 namespace {
@@ -90,8 +91,20 @@ private:
             const auto found = unit ? ends.find(identity(*unit)) : ends.end();
             if (found == ends.end()) continue;
             const std::string& text = endpoint->second.get("Name").as_text();
-            port.targets[place->second].units.push_back({number(text.substr(text.rfind(':') + 1)), found->second});
+            port.targets[place->second].units.push_back(
+                {number(text.substr(text.rfind(':') + 1)), device(endpoint->second), found->second});
         }
+        for (Target_Node& target : port.targets)
+            std::stable_sort(target.units.begin(), target.units.end(), [](const Unit_Node& a, const Unit_Node& b) {
+                return std::pair(a.number.size(), a.number) < std::pair(b.number.size(), b.number);
+            });
+    }
+
+    /// Each route to a unit has an endpoint of its own, which has the name of the unit's device and no other.
+    static std::string device(const Instance& endpoint)
+    {
+        const std::vector<Value>& names = endpoint.get("OtherIdentifyingInfo").elements();
+        return names.empty() ? "" : names.front().as_text();
     }
 
     /// The number that people know for eight bytes of FCP addressing, if it is of the peripheral or the flat kind.
@@ -116,16 +129,6 @@ std::string text_of(const Instance& instance, const Schema& schema, const char* 
     return value.is_null() ? "" : value_text(record ? record->property(property) : nullptr, value);
 }
 
-/// The element of OtherIdentifyingInfo that is said to be this.
-std::string other_name(const Instance& instance, const char* meaning)
-{
-    const std::vector<Value>& names = instance.get("OtherIdentifyingInfo").elements();
-    const std::vector<Value>& meanings = instance.get("IdentifyingDescriptions").elements();
-    for (std::size_t i = 0; i < std::min(names.size(), meanings.size()); ++i)
-        if (meanings[i].as_text() == meaning) return names[i].as_text();
-    return "";
-}
-
 /// A size in the binary unit that keeps it readable: "8 GiB", "1.5 TiB".
 std::string size_text(const Value& bytes)
 {
@@ -145,7 +148,7 @@ std::string size_text(const Value& bytes)
     return number + " " + names[unit];
 }
 
-/// "Target 5006..." from "Target" and a value; nothing without a value.
+/// "port 0" from "port" and a value; nothing without a value.
 std::string named(const char* name, const std::string& value)
 {
     return value.empty() ? "" : name + (" " + value);
@@ -214,7 +217,7 @@ std::vector<std::string> facts(const Unit_Node& unit, const Schema& schema)
     // "Storage Volume: 3" and "Tape Drive 3" end in the number that the operating system has for it.
     kind.erase(kind.find_last_not_of("0123456789: ") + 1);
     return without_empty({"LUN " + unit.number, kind, text_of(unit.unit, schema, "OperationalStatus"),
-                          size_text(unit.unit.get("Capacity")), other_name(unit.unit, "OS Device Name")});
+                          size_text(unit.unit.get("Capacity")), unit.device});
 }
 
 } // namespace host

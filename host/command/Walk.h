@@ -16,6 +16,7 @@ namespace host {
 
 struct Unit_Node {
     std::string number; ///< as FCP addresses it: "0", or the eight bytes where they are no flat number
+    std::string device; ///< what the operating system calls it on this route; may be empty
     Instance unit;
 };
 
@@ -46,7 +47,8 @@ struct Walk {
     std::vector<Host_Node> hosts;
 };
 
-/// Walks from each host that the module knows. Everything keeps the order in which the module tells it.
+/// Walks from each host that the module knows. Everything keeps the order in which the module tells
+/// it, but for the units of a target, which stand by their number.
 Walk walk_hosts(Host& server, const std::string& name_space);
 
 /// The same text for paths that mean the same object, whatever their namespace or the order of their keys.

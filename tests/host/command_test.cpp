@@ -1,14 +1,18 @@
 // The parts of nvrcim: arguments by type, tables within a width, places, and words for statuses.
 #include "host/command/Arguments.h"
+#include "host/command/Graph.h"
 #include "host/command/Places.h"
 #include "host/command/Table.h"
 #include "host/command/Verbs.h"
 #include "host/command/Views.h"
+#include "host/command/Walk.h"
 #include "tests/host/Things.h"
 
+#include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <nlohmann/json.hpp>
+#include <sstream>
 
 using namespace host;
 using testing::HasSubstr;
@@ -171,6 +175,81 @@ TEST(CommandComplaints, BeginWithWhoseFaultItIs)
     EXPECT_EQ("nvrcim: wrong request: the server has no class X",
               complaint({5, "the server has no class X", Fault::request}));
     EXPECT_EQ("nvrcim: the module fails: it cannot be loaded", complaint({1, "it cannot be loaded", Fault::module}));
+}
+
+std::string checked(Host& server)
+{
+    Options options;
+    options.verb = "check";
+    options.name_space = things::space;
+    std::ostringstream out, complaints;
+    run_verb(server, options, out, complaints);
+    return out.str();
+}
+
+TEST(CommandCheck, NamesAnEndThatDoesNotExist)
+{
+    things::reset();
+    auto server = things::make_host();
+    Instance link;
+    link.path.name_space = things::space;
+    link.path.class_name = "TEST_Link";
+    link.set("First", Value::reference(things::thing(7)));
+    link.set("Second", Value::reference(things::thing(1, "TEST_Silent")));
+    server->add_instance(link);
+    const std::string told = checked(*server);
+    EXPECT_THAT(told, HasSubstr("TEST_Link: First does not exist: root/test:TEST_Thing.Id=7"));
+    EXPECT_THAT(told, HasSubstr("TEST_Link: Second is of a class that nobody serves: root/test:TEST_Silent.Id=1"));
+    EXPECT_THAT(told, HasSubstr("1 instance; ends: 0 found"));
+}
+
+TEST(CommandWalk, IdentityLooksAtClassAndKeysAlone)
+{
+    Path one = things::thing(1), same = things::thing(1);
+    std::reverse(same.keys.begin(), same.keys.end());
+    same.name_space = "root/other";
+    same.class_name = "test_thing";
+    EXPECT_EQ(identity(one), identity(same));
+    EXPECT_NE(identity(one), identity(things::thing(2)));
+    Path split, joined;
+    split.class_name = joined.class_name = "C";
+    split.set("a", Value::string("1"));
+    split.set("b", Value::string("2"));
+    joined.set("a", Value::string("1,b=1:2"));
+    EXPECT_NE(identity(split), identity(joined)) << "a value that looks like two";
+}
+
+TEST(CommandGraph, KeepsTextsFromBreakingTheDrawing)
+{
+    Walk walk;
+    walk.hosts.emplace_back();
+    walk.hosts.back().path.set("Name", Value::string("a<b>&\"c\"\n"));
+    const std::string graph = dot_text(walk, *things::schema());
+    EXPECT_THAT(graph, HasSubstr("<b>a&lt;b&gt;&amp;&quot;c&quot;?</b>"));
+}
+
+TEST(CommandGraph, DrawsATargetOnceWithTheDevicesOfAllRoutes)
+{
+    auto port = [](const char* fabric, const char* device) {
+        Port_Node node;
+        node.port.set("FabricName", Value::string(fabric));
+        Unit_Node unit{"5", device, {}};
+        unit.unit.set("ElementName", Value::string("Storage Volume: 3"));
+        unit.unit.set("Capacity", Value::uint64(3ull << 29));
+        node.targets.push_back({"50060E8005A10000", {}, {unit}});
+        return node;
+    };
+    Walk walk;
+    walk.hosts.emplace_back();
+    walk.hosts.back().adapters.push_back({{}, {port("f1", "/dev/sda"), port("f2", "/dev/sdb")}});
+    const std::string graph = dot_text(walk, *things::schema());
+    const std::string title = "<b>target 50060E8005A10000</b>";
+    ASSERT_NE(std::string::npos, graph.find(title));
+    EXPECT_EQ(graph.find(title), graph.rfind(title));
+    EXPECT_THAT(graph, HasSubstr("<b>LUN 5</b>"));
+    EXPECT_THAT(graph, HasSubstr("  Storage Volume  1.5 GiB  /dev/sda  /dev/sdb</font>"));
+    EXPECT_THAT(graph, HasSubstr("-> target3 [tailport=e, headport=w, color=\"#0072b2\"]"));
+    EXPECT_THAT(graph, HasSubstr("-> target3 [tailport=e, headport=w, color=\"#d55e00\"]"));
 }
 
 } // namespace

@@ -194,4 +194,52 @@ TEST(Nvrcim, TheServersLogTellsOfTheModulesLife)
         EXPECT_THAT(outcome.out, HasSubstr(part));
 }
 
+TEST(Nvrcim, ShowsWhatAssociationsTieToAnInstance)
+{
+    const std::string thing = " 'TEST_Thing.Id=1,Realm=\"test \\\"realm\\\"\"'";
+    expect("associators" + thing, 0, "Id  Realm         Name\n 1  test \"realm\"  other\n");
+    expect("associators" + thing + " --names --class TEST_Link --result-class TEST_Other --result-role second", 0,
+           "root/test:TEST_Other.Id=1,Realm=\"test \\\"realm\\\"\"\n");
+    expect("references" + thing, 0,
+           "First                      Second\nTEST_Thing 1,test \"realm\"  TEST_Other 1,test \"realm\"\n");
+    expect("references" + thing + " --names --json", 0,
+           "{\n  \"status\": 0,\n  \"paths\": [\n    "
+           "\"root/test:TEST_Link.First=\\\"root/test:TEST_Thing.Id=1,Realm=\\\\\\\"test "
+           "\\\\\\\\\\\\\\\"realm\\\\\\\\\\\\\\\"\\\\\\\"\\\",Second=\\\"root/test:TEST_Other.Id=1,Realm=\\\\\\\"test "
+           "\\\\\\\\\\\\\\\"realm\\\\\\\\\\\\\\\"\\\\\\\"\\\"\"\n  ]\n}\n");
+    expect("references" + thing + " --role Second", 0, "no association holds it\n");
+    expect(
+        "associators TEST_Thing", 64,
+        "nvrcim: wrong command: an object path of TEST_Thing also needs Id, Realm (nvrcim names TEST_Thing shows whole "
+        "paths)\n");
+    expect("associators" + thing + " --class Nix", 4, "nvrcim: wrong request: the server has no class Nix\n");
+}
+
+// The test provider answers a traversal for its first thing alone, and not back from the other end.
+TEST(Nvrcim, ChecksThatBothEndsOfAnAssociationFindEachOther)
+{
+    Outcome outcome = run("check --all");
+    EXPECT_EQ(1, outcome.status);
+    EXPECT_THAT(outcome.out, HasSubstr("TEST_Link            2           4          0      0       5\n"));
+    EXPECT_THAT(outcome.out,
+                HasSubstr("TEST_Link: associators of the Second root/test:TEST_Other.Id=1,Realm=\"test \\\"realm\\\"\" "
+                          "lack root/test:TEST_Thing.Id=1,Realm=\"test \\\"realm\\\"\"\n"));
+    EXPECT_THAT(outcome.out, HasSubstr("TEST_Link: references of the First root/test:TEST_Thing.Id=2,"));
+    EXPECT_THAT(outcome.out, HasSubstr("; ends: 4 found, 0 of other providers, 0 loose by design; 5 faults\n"));
+    EXPECT_THAT(run("check", "TEST_count=0").out,
+                HasSubstr("1 association class, 0 with instances; 0 instances; ends: 0 found, 0 of other providers, 0 "
+                          "loose by design; 0 faults\n"));
+    EXPECT_THAT(run("check", "TEST_count=2 TEST_stop_after=1").out,
+                HasSubstr("TEST_Link: enumeration ends with CMPI_RC_ERR_FAILED (stopped early)\n"));
+}
+
+TEST(Nvrcim, TellsWhyItCannotDraw)
+{
+    expect("graph picture.gif", 64,
+           "nvrcim: wrong command: a picture's name ends in .svg, .png or .dot: picture.gif\n");
+    EXPECT_EQ(64, run("graph").status);
+    // A module without the classes of adapters has no tree.
+    expect("tree", 5, "nvrcim: wrong request: the server has no class NVRHBA_SystemPackaging\n");
+}
+
 } // namespace

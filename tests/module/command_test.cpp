@@ -19,9 +19,10 @@ struct Ended_Command {
     int status = -1;    // of the exit; -1 after a signal
 };
 
-Ended_Command nvrcim(const std::string& arguments, const std::string& scenario = "small")
+Ended_Command nvrcim(const std::string& arguments, const std::string& scenario = "small",
+                     const std::string& environment = "")
 {
-    const std::string command = std::string("'") + NVR_NVRCIM + "' --module '" + NVR_MODULE + "' --scenario '" +
+    const std::string command = environment + " '" + NVR_NVRCIM + "' --module '" + NVR_MODULE + "' --scenario '" +
                                 NVR_SCENARIO_DIR + "/" + scenario + ".toml' " + arguments + " 2>&1";
     FILE* child = popen(command.c_str(), "r");
     if (!child) throw std::runtime_error("cannot start a shell");
@@ -98,4 +99,62 @@ TEST(Command, TellsByItsExitStatusWhyTheModuleRefuses)
                   .status,
               CMPI_RC_ERR_NOT_FOUND);
     EXPECT_EQ(nvrcim("enum NVRHBA_Nonsense").status, CMPI_RC_ERR_INVALID_CLASS);
+}
+
+TEST(Command, AnswersATraversalWithNothingOfWhatTheModulePrints)
+{
+    const std::string package = "'NVRHBA_PhysicalPackage.Tag=\"20000000C9A00001\",CreationClassName=\"NVRHBA_Physical"
+                                "Package\"'";
+    EXPECT_EQ(nvrcim("associators " + package + " --class nvrhba_REALIZES -p DeviceID,ControllerType").output,
+              "DeviceID          ControllerType\n10000000C9A00001  FC\n");
+    EXPECT_EQ(nvrcim("references " + package + " --role antecedent -p Antecedent").output,
+              "CLASS                   OBJECT                                                              Antecedent\n"
+              "NVRHBA_Realizes         NVRHBA_PhysicalPackage 20000000C9A00001,NVRHBA_PortController 1...  "
+              "NVRHBA_PhysicalPack...\n");
+}
+
+TEST(Command, ShowsASmallHostAsATree)
+{
+    const Ended_Command run = nvrcim("tree");
+    EXPECT_EQ(run.status, 0);
+    EXPECT_EQ(run.output, "storage1.norvane.test\n"
+                          "└─ Norvane Corporation FC2162  serial NV216200001  node 20000000C9A00001\n"
+                          "   └─ port 0  10000000C9A00001  OK  16 Gbit/s  fabric 1000000533A00001  address 0x010100\n"
+                          "      ├─ target 50060E8005A10000  Unknown  address 0x020000\n"
+                          "      │  ├─ LUN 0  Storage Volume  Unknown  8 GiB  /dev/sda\n"
+                          "      │  ├─ LUN 1  Storage Volume  Unknown  16 GiB  /dev/sdb\n"
+                          "      │  └─ LUN 2  Storage Volume  Unknown  24 GiB  /dev/sdc\n"
+                          "      └─ target 50060E8005A10001  Unknown  address 0x020001\n"
+                          "         └─ LUN 0  Tape Drive  Unknown  /dev/st3\n");
+}
+
+TEST(Command, FindsNoFaultInTheAssociationsOfATypicalHostInEveryManner)
+{
+    for (const host::Manner* manner : every_manner()) {
+        const Ended_Command run = nvrcim(std::string("--manner ") + manner->name + " check", "typical");
+        EXPECT_EQ(run.status, 0) << manner->name << "\n" << run.output;
+        EXPECT_THAT(run.output, testing::StartsWith("91 association classes, ")) << manner->name;
+        EXPECT_THAT(run.output, testing::EndsWith("; 0 faults\n")) << manner->name;
+    }
+}
+
+TEST(Command, WritesTheGraphOfASmallHost)
+{
+    const std::string file = testing::TempDir() + "norvane_graph.dot";
+    EXPECT_EQ(nvrcim("graph " + file).output, "");
+    const std::string graph = read_file(file);
+    std::remove(file.c_str());
+    EXPECT_THAT(graph, HasSubstr("<b>target 50060E8005A10000</b>"));
+    EXPECT_THAT(graph, HasSubstr("<b>LUN 2</b><font point-size=\"10\" color=\"#5f6b7a\">  Storage Volume  Unknown  24 "
+                                 "GiB  /dev/sdc</font>"));
+    EXPECT_THAT(graph, HasSubstr("  port2 -> target3 [tailport=e, headport=w, color=\"#0072b2\"]\n"));
+}
+
+TEST(Command, SaysThatGraphvizIsMissing)
+{
+    const Ended_Command run = nvrcim("graph picture.svg", "small", "PATH=/nowhere");
+    EXPECT_EQ(run.status, CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(run.output,
+              "nvrcim: Graphviz is not there: its program dot is not in PATH. Install the package graphviz, or "
+              "name a file that ends in .dot for the plain graph\n");
 }
