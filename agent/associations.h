@@ -64,6 +64,13 @@ enum class Link {
     GlobalDriverServiceElementSettingData,
     DriverServiceElementSettingData,
     DriverParameterAffectsFCPort,
+    HostedDumpService,
+    DumpServiceAffectsElement,
+    ElementDumpData,
+    // Virtual ports.
+    HostedResourcePool,
+    VPortHostedDependency,
+    ElementAllocatedFromPool,
     // Logs and access points.
     RecordLogCapabilities,
     ProviderUseOfLog,

@@ -9,6 +9,7 @@
 #include "classes/NVRHBA_FCPort.h"
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
+#include "foundation/NVR_MethodWrapper.h"
 #include "foundation/ask_again.h"
 #include "foundation/management_binding.h"
 
@@ -19,17 +20,6 @@ namespace {
 constexpr uint32 status_no_memory = 8;
 constexpr uint32 status_failed = 1;
 constexpr uint32 most_records = 16 * 1024 * 1024 / sizeof(RM_DRIVERPARAM);
-
-bool isLocal(const HBA_WWN& wwn)
-{
-    NVR_LOG("Entering NVR_MethodWrapper::Validatewwpn()");
-    uint32 local = 0;
-    const uint32 status = RM_IsLocalHBA(wwn, &local);
-    NVR_LOG("RM_IsLocalHBA: status=%d", static_cast<int>(status));
-    if (status == RM_STATUS_OK && local != 0) return true;
-    NVR_LOG("HBA IS NOT LOCAL");
-    return false;
-}
 
 /// What both classes of parameters show of a record.
 template <class T>
@@ -122,10 +112,7 @@ uint32 nvrcimGetDriverParam(ProviderAgent& agent, const std::string& wwpn, bool 
     NVR_LOG("NVR_MethodWrapper::nvrcimGetDriverParam()");
     HBA_WWN wwn = {};
     if (string2HBAName(&wwn, wwpn.c_str()) == 0) return status_failed;
-    if (!isLocal(wwn)) {
-        NVR_LOG("INVALID wwpn");
-        return status_failed;
-    }
+    if (!NVR_MethodWrapper::isLocal(wwn)) return status_failed;
     std::vector<RM_DRIVERPARAM> records;
     if (const uint32 status = readDriverParams(wwn, global, records)) return status;
     if (global) NVR_LOG("number of driver parameters %d", static_cast<int>(records.size()));

@@ -33,6 +33,11 @@ String string_property(const Instance* instance, const char* name)
     return *static_cast<const String*>(feature_at(instance, property->offset));
 }
 
+void logCreationFailed(const char* failure)
+{
+    NVR_LOG("%s", failure);
+}
+
 void logInsertFailed(const Instance_Map& map, const char* failure)
 {
     if (failure)

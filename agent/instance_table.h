@@ -6,6 +6,7 @@
 #pragma once
 
 #include <initializer_list>
+#include <new>
 #include <string>
 
 #include "agent/Map.h"
@@ -16,12 +17,26 @@ namespace cimple {
 constexpr const char* norvane_name_space = "root/norvane";
 constexpr const char* interop_name_space = "root/pg_interop";
 
+void logCreationFailed(const char* failure);
+
 template <class T>
 Ref<T> make(const char* name_space = norvane_name_space)
 {
     Ref<T> instance(create_as<T>(true));
     instance->__name_space = name_space;
     return instance;
+}
+
+/// The same for a builder that answers with words: null without memory, after `failure` was logged.
+template <class T>
+Ref<T> makeOrLog(const char* failure)
+{
+    try {
+        return make<T>();
+    } catch (const std::bad_alloc&) {
+        logCreationFailed(failure);
+        return Ref<T>();
+    }
 }
 
 inline void set(Property<String>& property, const char* value)

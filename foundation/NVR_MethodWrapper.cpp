@@ -138,4 +138,31 @@ int NVR_MethodWrapper::string2HBAName(HBA_WWN* wwn, const char* text)
     return cimple::string2HBAName(wwn, text);
 }
 
+int NVR_MethodWrapper::Validatewwpn(const HBA_WWN& port)
+{
+    NVR_LOG("Entering NVR_MethodWrapper::Validatewwpn()");
+    uint32 local = 0;
+    const uint32 status = RM_IsLocalHBA(port, &local);
+    NVR_LOG("RM_IsLocalHBA: status=%d", static_cast<int>(status));
+    if (status == RM_STATUS_OK && local != 0) return 0;
+    NVR_LOG("HBA IS NOT LOCAL");
+    return 1;
+}
+
+bool NVR_MethodWrapper::isLocal(const HBA_WWN& port)
+{
+    if (Validatewwpn(port) == 0) return true;
+    NVR_LOG("INVALID wwpn");
+    return false;
+}
+
+void NVR_MethodWrapper::logStatus(uint32 status)
+{
+    const StatusText text(status);
+    if (*text.c_str())
+        NVR_LOG("Status: <%d>:%s", static_cast<int>(status), text.c_str());
+    else
+        NVR_LOG("Status: <%d>", static_cast<int>(status));
+}
+
 } // namespace cimple

@@ -36,12 +36,6 @@ long fetches(const std::vector<std::string>& words)
            std::count(words.begin(), words.end(), "PERF: DataFetch_Handler Thread END");
 }
 
-uint32 driverLog(ProviderAgent& agent)
-{
-    if (on_driver_log) on_driver_log(agent);
-    return 0;
-}
-
 std::string scalar(const void* place, uint16 type)
 {
     switch (type) {
@@ -210,12 +204,6 @@ std::string end(const Instance* association, const char* reference, const char* 
 }
 
 } // namespace nvrtest
-
-namespace cimple {
-
-const Agent_Builders agent_builders = {nullptr, nullptr, nullptr, &nvrtest::driverLog, nullptr, nullptr, nullptr};
-
-} // namespace cimple
 
 // The linker sends every call of pthread_create in this program here.
 extern "C" int __real_pthread_create(pthread_t*, const pthread_attr_t*, void* (*)(void*), void*);

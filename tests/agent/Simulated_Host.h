@@ -21,7 +21,7 @@ namespace nvrtest {
 using cimple::Instance;
 using cimple::Ref;
 
-/// What the refresh reaches on higher floors: nothing, until a test says so.
+/// What the refresh of this room's tests reaches on higher floors: nothing, until a test says so.
 extern std::function<void(cimple::ProviderAgent&)> on_driver_log;
 
 /// True: the next threads cannot be created.

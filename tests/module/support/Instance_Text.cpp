@@ -2,9 +2,11 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstdlib>
 #include <ctime>
 #include <map>
 #include <sstream>
+#include <unistd.h>
 
 namespace nvrtest {
 
@@ -24,9 +26,17 @@ bool is_present(const std::string& datetime)
     return false;
 }
 
+std::string own_dumps()
+{
+    const char* base = std::getenv("TMPDIR");
+    return std::string(base && *base ? base : "/tmp") + "/nvrsim-dumps-" + std::to_string(getpid());
+}
+
 std::string text_of(const host::Value& value)
 {
     if (value.type() == CMPI_dateTime && is_present(value.as_text())) return "<now>";
+    // The simulator keeps dumps in a directory of the process.
+    if (value.type() == CMPI_string && value.to_text() == own_dumps()) return "<the simulator's dumps>";
     std::string text;
     for (const char c : value.to_text()) {
         char escaped[8] = {c, '\0'};

@@ -1,0 +1,208 @@
+// What the management library tells about the virtual ports of a port.
+#include "foundation/NVR_MethodWrapper.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <new>
+
+#include "foundation/AttributeBlock.h"
+#include "foundation/CLogger.h"
+#include "foundation/NVR_Common.h"
+#include "foundation/management_binding.h"
+
+namespace cimple {
+
+namespace {
+
+constexpr int status_failed = 1;
+constexpr int status_null = 4;
+
+// No more are asked for, whatever the library reports.
+constexpr uint32 most_targets = 65536;
+constexpr uint32 most_machines = 4096;
+
+/// A list as the library fills it: a count word, `head` bytes up to its records, and room for some of them.
+class Counted_List {
+public:
+    Counted_List(std::size_t head, std::size_t record) : m_head(head), m_record(record) {}
+
+    /// Asks with room for one record, and once more, with as much as the library then says, after status 7; `most`
+    /// bounds that. False without memory.
+    template <class Ask>
+    bool fill(uint32 most, Ask ask)
+    {
+        if (!give(1)) return false;
+        status = ask(m_bytes.data());
+        if (status != RM_STATUS_MORE_DATA) return true;
+        if (!give(std::min(count(), most))) return false;
+        status = ask(m_bytes.data());
+        return true;
+    }
+
+    uint32 status = RM_STATUS_ERROR;
+
+    /// As the library left it.
+    uint32 count() const
+    {
+        uint32 count = 0;
+        std::memcpy(&count, m_bytes.data(), sizeof count);
+        return count;
+    }
+    /// The records that were counted and had room.
+    template <class Record>
+    std::vector<Record> records() const
+    {
+        std::vector<Record> all(std::min(count(), m_room));
+        if (!all.empty()) std::memcpy(all.data(), m_bytes.data() + m_head, all.size() * sizeof(Record));
+        return all;
+    }
+
+private:
+    bool give(uint32 room)
+    {
+        try {
+            m_bytes.assign(m_head + m_record * room, 0);
+        } catch (const std::bad_alloc&) {
+            return false;
+        }
+        m_room = room;
+        std::memcpy(m_bytes.data(), &room, sizeof room);
+        return true;
+    }
+
+    const std::size_t m_head;
+    const std::size_t m_record;
+    uint32 m_room = 0;
+    std::vector<unsigned char> m_bytes;
+};
+
+void logVPortFailure(uint32 status)
+{
+    if (status == RM_STATUS_HOST_NOT_SUPPORTED) {
+        NVR_LOG("FMCMD does not support listing virtual ports on this host.");
+        return;
+    }
+    NVR_MethodWrapper::logStatus(status);
+    NVR_LOG("Unable to list virtual ports!!");
+}
+
+RM_VMINFO machineInfo(const RM_VMNAME& name)
+{
+    RM_VMINFO info = {};
+    if (RM_GetVMInfo(&name, &info) != RM_STATUS_OK) info = {};
+    NVR_LOG("VM Details: %s, %s", fieldText(info.identity).c_str(), fieldText(info.virtualPort).c_str());
+    NVR_LOG("Server Name:  %s", fieldText(info.serverName).c_str());
+    NVR_LOG("Virtual Machine Name:  %s", fieldText(info.machineName).c_str());
+    NVR_LOG("Guest OS Name:  %s", fieldText(info.guestOsName).c_str());
+    NVR_LOG("Memory Size:  %d", static_cast<int>(info.memorySize));
+    return info;
+}
+
+} // namespace
+
+int NVR_MethodWrapper::ListVPorts(const HBA_WWN& port, VPort_List* list)
+{
+    NVR_LOG("NVR_MethodWrapper::ListVPorts");
+    if (!isLocal(port)) return status_failed;
+    if (!list) {
+        NVR_LOG("Invalid input pointer");
+        return status_null;
+    }
+    Counted_List found(offsetof(RM_VPORTLIST, entry), sizeof(RM_VPORTENTRY));
+    if (!found.fill(RM_VPORT_MAX_ENTRIES, [&](void* room) { return RM_VPList(port, room); })) {
+        NVR_LOG("FMCMD_ListVPorts: Unable to allocate buffer");
+        return status_failed;
+    }
+    if (found.status != RM_STATUS_OK) {
+        logVPortFailure(found.status);
+        return status_failed;
+    }
+    list->count = found.count();
+    list->entries = found.records<RM_VPORTENTRY>();
+    NVR_LOG("Exit the ListVPorts method");
+    return 0;
+}
+
+int NVR_MethodWrapper::ListVPortAttributes(const HBA_WWN& port, const HBA_WWN& vport, RM_VPORTATTRIBUTES* attributes)
+{
+    NVR_LOG("NVR_MethodWrapper::ListVPortAttributes");
+    if (!isLocal(port)) return status_failed;
+    if (!attributes) {
+        NVR_LOG("Invalid input vp attributes pointer");
+        return status_null;
+    }
+    RM_VPORTATTRIBUTES found = {};
+    found.version = RM_VPORT_VERSION;
+    if (const uint32 status = RM_VPGetAttributes(port, vport, &found)) {
+        logVPortFailure(status);
+        return status_failed;
+    }
+    NVR_LOG("VPort details");
+    NVR_LOG("VPort Name %s ", fieldText(found.name).c_str());
+    NVR_LOG("Exit the ListVPortattributes method");
+    *attributes = found;
+    return 0;
+}
+
+int NVR_MethodWrapper::ListVPortTargets(const HBA_WWN& port, const HBA_WWN& vport)
+{
+    if (!isLocal(port) || !isLocal(vport)) return status_failed;
+    Counted_List found(offsetof(RM_TARGETLIST, entry), sizeof(HBA_FCPSCSIENTRY));
+    if (!found.fill(most_targets, [&](void* room) { return RM_VPListTargets(port, vport, room); })) {
+        NVR_LOG("FMCMD_VportTargets: Unable to allocate buffer");
+        return status_failed;
+    }
+    if (found.status == RM_STATUS_OK) {
+        NVR_LOG("Exit the ListVPortTargets method");
+        return 0;
+    }
+    if (found.status == RM_STATUS_HOST_NOT_SUPPORTED)
+        NVR_LOG("FMCMD does not support listing virtual port targets on this host.");
+    else
+        NVR_LOG("Unable to list virtual port's targets!");
+    return status_failed;
+}
+
+int NVR_MethodWrapper::ListVMfromVPort(const HBA_WWN& port, const RM_VPORTENTRY& vport,
+                                       std::vector<RM_VMINFO>* machines)
+{
+    NVR_LOG("NVR_MethodWrapper::ListVMfromVPort %s", wwnText(vport.wwpn).c_str());
+    if (!isLocal(port)) return status_failed;
+    if (!machines) {
+        NVR_LOG("Invalid input pointer");
+        return status_null;
+    }
+    machines->clear();
+    uint32 mapping = 0;
+    uint32 status = 0;
+    AttributeBlock block(RM_HBA_BLOCK_SIZE);
+    if (block.valid() && block.fill(RM_GetHBAAttributes, port) == RM_STATUS_OK)
+        block.number(RM_ATTR_VPORT_MAPPING, mapping, status);
+    if (mapping != 1 && mapping != 2) {
+        std::fputs("This physical WWPN does not support virtual port mappings.\n", stdout);
+        return 0;
+    }
+    Counted_List found(offsetof(RM_VMLIST, entry), sizeof(RM_VMNAME));
+    bool again = false;
+    const bool asked = found.fill(most_machines, [&](void* room) {
+        const uint32 answer = RM_GetVMFromVPort(vport.wwpn, room);
+        again = answer == RM_STATUS_MORE_DATA;
+        return answer;
+    });
+    if (!asked) {
+        if (again)
+            NVR_LOG("FMCMD_ListVMS: Unable to allocate buffer\n");
+        else
+            NVR_LOG("FMCMD_ListVMS: Unable to allocate buffer.");
+        return status_failed;
+    }
+    NVR_LOG("FMCMD_ListVMS: Status: %d", static_cast<int>(found.status));
+    if (found.status != RM_STATUS_OK) return status_failed;
+    for (const RM_VMNAME& name : found.records<RM_VMNAME>())
+        machines->push_back(machineInfo(name));
+    NVR_LOG("Exit the ListVMs method");
+    return 0;
+}
+
+} // namespace cimple
