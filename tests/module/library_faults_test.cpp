@@ -103,6 +103,9 @@ const char* const faulty_calls[] = {
     "RM_GetSffData",
     "RM_DiagGetLoadListParams",
     "RM_IsLocalHBA",
+    "RM_VPList",
+    "RM_GetDumpDirectoryA",
+    "RM_GetDumpRetentionCount",
 };
 
 // `sample`: under a sanitizer each call gets every sixth fault, another sixth than the call before it, since there each
