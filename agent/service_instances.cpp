@@ -13,30 +13,16 @@
 #include "classes/NVRHBA_SoftwareInstallationService.h"
 #include "classes/NVRHBA_SoftwareInstallationServiceCapabilities.h"
 #include "foundation/CLogger.h"
+#include "foundation/curl_places.h"
 
 namespace cimple {
 
 namespace {
 
-struct Curl_Row {
-    const char* words;
-    const char* library;
-};
-
-constexpr Curl_Row curl_places[] = {
-    {"Searching for /lib Curl on the machine", "/lib/libcurl.so.4"},
-    {"Searching for /usr/lib/ Curl on the machine", "/usr/lib/libcurl.so.4"},
-    {"Checking with libcurl.so system location for libcurl", "libcurl.so"},
-    {"Checking with curl.dll windows system location for libcurl", "curl.dll"},
-};
-
 /// Can firmware be fetched by more than a file's path?
 bool hasCurl()
 {
-    for (const Curl_Row& place : curl_places) {
-        NVR_LOG("%s", place.words);
-        void* library = dlopen(place.library, RTLD_NOW | RTLD_GLOBAL);
-        if (!library) continue;
+    if (void* library = openCurl()) {
         if (dlclose(library) != 0) NVR_LOG("ERROR: UNABLE TO CLOSE DYNAMIC LIB");
         return true;
     }

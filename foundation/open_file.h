@@ -15,4 +15,9 @@ using File = std::unique_ptr<std::FILE, Close_File>;
 /// that would wait fails. The file is closed in programs that the process starts.
 File open_file(const char* path, const char* mode);
 
+/// The same for paths that clients name, which may lead anywhere: as fopen with mode "rb" or "wb", but for regular
+/// files alone (errno EINVAL for others). Writing empties a file that is there, also behind a link, and else makes it;
+/// a link that leads nowhere is refused (EEXIST).
+File open_regular_file(const char* path, const char* mode);
+
 } // namespace cimple

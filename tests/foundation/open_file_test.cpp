@@ -1,0 +1,113 @@
+#include "foundation/open_file.h"
+
+#include <cerrno>
+#include <string>
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "tests/support/private_host.h"
+
+using namespace cimple;
+using namespace nvrtest;
+
+namespace {
+
+const std::string path = "/var/log/file";
+const std::string other = "/var/log/other";
+
+/// Writes "new" to the file at the path; false, with errno, if it cannot be opened.
+bool rewrite()
+{
+    File file = open_regular_file(path.c_str(), "wb");
+    if (!file) return false;
+    EXPECT_EQ(std::fputs("new", file.get()), 1);
+    return true;
+}
+
+void expect_refused(const char* mode, int error)
+{
+    EXPECT_FALSE(open_regular_file(path.c_str(), mode)) << mode;
+    EXPECT_EQ(errno, error) << mode;
+}
+
+} // namespace
+
+TEST(OpenRegularFile, ReadsWritesAndMakesFiles)
+{
+    expect_refused("rb", ENOENT);
+    ASSERT_TRUE(rewrite());
+    EXPECT_EQ(read_file(path), "new");
+    char text[8] = {};
+    EXPECT_EQ(std::fread(text, 1, sizeof text, open_regular_file(path.c_str(), "rb").get()), 3u);
+    EXPECT_STREQ(text, "new");
+    write_file(path, "something longer");
+    ASSERT_TRUE(rewrite());
+    EXPECT_EQ(read_file(path), "new");
+}
+
+TEST(OpenRegularFile, MakesFilesAsTheUmaskSays)
+{
+    const mode_t before = ::umask(027);
+    ASSERT_TRUE(rewrite());
+    ::umask(before);
+    struct stat status;
+    ASSERT_EQ(::stat(path.c_str(), &status), 0);
+    EXPECT_EQ(status.st_mode & 07777, 0640u);
+}
+
+TEST(OpenRegularFile, FollowsALinkToAFile)
+{
+    write_file(other, "old");
+    link(other, path);
+    ASSERT_TRUE(rewrite());
+    EXPECT_EQ(read_file(other), "new");
+}
+
+TEST(OpenRegularFile, MakesNothingBehindALinkThatLeadsNowhere)
+{
+    link(other, path);
+    expect_refused("wb", EEXIST);
+    expect_refused("rb", ENOENT);
+    EXPECT_FALSE(exists(other));
+}
+
+TEST(OpenRegularFile, RefusesFolders)
+{
+    make_folder(path);
+    expect_refused("wb", EINVAL);
+    expect_refused("rb", EINVAL);
+}
+
+TEST(OpenRegularFile, RefusesFifosWithoutWaitingForTheirOtherEnd)
+{
+    ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
+    expect_refused("wb", EINVAL);
+    expect_refused("rb", EINVAL);
+    const int end = ::open(path.c_str(), O_RDWR | O_NONBLOCK);
+    ASSERT_GE(end, 0);
+    expect_refused("wb", EINVAL);
+    expect_refused("rb", EINVAL);
+    ::close(end);
+}
+
+TEST(OpenRegularFile, RefusesDevices)
+{
+    link("/dev/null", path);
+    expect_refused("wb", EINVAL);
+    expect_refused("rb", EINVAL);
+}
+
+TEST(OpenRegularFile, TellsWhyAPathIsNone)
+{
+    for (const char* mode : {"rb", "wb"}) {
+        EXPECT_FALSE(open_regular_file("", mode));
+        EXPECT_EQ(errno, ENOENT);
+        EXPECT_FALSE(open_regular_file("/var/log/none/file", mode));
+        EXPECT_EQ(errno, ENOENT);
+        EXPECT_FALSE(open_regular_file(std::string(65536, 'x').c_str(), mode));
+        EXPECT_EQ(errno, ENAMETOOLONG);
+    }
+}
