@@ -5,6 +5,7 @@
 namespace cimple {
 
 std::atomic<uint64 (*)()> agent_clock{&Time::now};
+std::atomic<void (*)(uint64)> agent_sleep{&Time::sleep};
 
 Datetime agent_now()
 {

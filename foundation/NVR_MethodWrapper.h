@@ -53,6 +53,9 @@ public:
     static uint32 nvrcimGetDumpDirectory(const HBA_WWN& port, char (&directory)[RM_DUMP_DIRECTORY_SIZE]);
     /// `count` is 0 after a failure.
     static uint32 nvrcimGetRetentionCount(const HBA_WWN& port, uint32& count);
+
+    /// Resets the adapter behind the port. Result the library's status, 1 for a port that is not local.
+    static uint32 nvrcimReset(const HBA_WWN& port);
 };
 
 } // namespace cimple

@@ -23,10 +23,17 @@ namespace {
 
 constexpr uint64 start_of_time = 1700000000000000;
 std::atomic<uint64> now{start_of_time};
+std::atomic<uint64> asleep{0};
 
 uint64 test_clock()
 {
     return now;
+}
+
+void test_sleep(uint64 usec)
+{
+    asleep += usec;
+    now += usec;
 }
 
 /// Fetch threads that begin less those that end in these words.
@@ -75,9 +82,16 @@ void advance_clock(uint64 usec)
     now += usec;
 }
 
+uint64 slept()
+{
+    return asleep;
+}
+
 SimulatedHost::SimulatedHost()
 {
     agent_clock = &test_clock;
+    agent_sleep = &test_sleep;
+    asleep = 0;
     on_driver_log = nullptr;
     no_more_threads = false;
     no_host_name = false;

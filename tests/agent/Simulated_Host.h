@@ -1,7 +1,7 @@
 /// The agent over the simulated libraries: what the tests of this room stand on.
 ///
 /// Each test has a process and an /etc of its own. The trace holds the log's words since the last agent began; the
-/// agent's clock is the test's.
+/// agent's clock is the test's, and its sleeps move that clock and take no time.
 #pragma once
 
 #include <functional>
@@ -30,8 +30,10 @@ extern bool no_more_threads;
 /// True: the host does not tell its name.
 extern bool no_host_name;
 
-/// So many microseconds go by on the agent's clock.
+/// So many microseconds go by on the agent's clock, as the agent's sleeps let them.
 void advance_clock(cimple::uint64 usec);
+/// How long the agent has slept since the host began, in microseconds.
+cimple::uint64 slept();
 constexpr cimple::uint64 second = 1000000;
 constexpr cimple::uint64 minute = 60 * second;
 

@@ -1,6 +1,8 @@
-/// The time of day that the test program and the module in it see: the machine's, set forward at will.
+/// The time of day that the test program and the module in it see: the machine's, set forward at will; and the sleeps
+/// of the module, which take no time here.
 ///
-/// The program defines gettimeofday, which the loader then binds for all that it loads. Waiting is not touched.
+/// The program defines gettimeofday and select, which the loader then binds for all that it loads. Waiting for
+/// something is not touched.
 #pragma once
 
 #include <chrono>
@@ -9,5 +11,8 @@ namespace nvrtest {
 
 /// From now on the time of day is later by so much more. Any thread.
 void advance_clock(std::chrono::seconds by);
+
+/// How long all sleeps so far would have lasted. They leave the time of day alone. Any thread.
+std::chrono::microseconds slept();
 
 } // namespace nvrtest
