@@ -4,7 +4,7 @@
 # libhbaapi2 is the system's own Common HBA API library: one test runs the module over it.
 # shellcheck disable=SC2034 # the scripts that source this file use it
 packages="g++ cmake ninja-build ccache binutils libhbaapi-dev libhbaapi2 libtomlplusplus-dev libcli11-dev
-    nlohmann-json3-dev libgtest-dev libgmock-dev libbenchmark-dev"
+    nlohmann-json3-dev libgtest-dev libgmock-dev libbenchmark-dev cmark-gfm"
 
 # install_packages NAMES...: asks apt for those that are not there yet, so that a second run costs nothing.
 install_packages() {
