@@ -9,8 +9,8 @@
 #include "agent/guarded.h"
 #include "agent/map_classes.h"
 #include "foundation/CLogger.h"
+#include "foundation/Management_Session.h"
 #include "foundation/NVR_Common.h"
-#include "foundation/NVR_MethodWrapper.h"
 #include "foundation/management_binding.h"
 #include "inventory/NVR_Data.h"
 
@@ -41,8 +41,8 @@ void ProviderAgent::construct(int errno_found)
     if (loadLibraries() == 1) NVR_LOG("Error : In Loading Library ");
     const uint32 status = CPQFC_LoadLibrary();
     if (status != 0) NVR_LOG("Provider Agent::CPQFC_LoadLibrary() Failed:%d ", static_cast<int>(status));
-    m_pMethodWrapper.reset(new (std::nothrow) NVR_MethodWrapper);
-    if (!m_pMethodWrapper) NVR_LOG("Error : Could not allocate RMAPI --returning ");
+    m_pSession.reset(new (std::nothrow) Management_Session);
+    if (!m_pSession) NVR_LOG("Error : Could not allocate RMAPI --returning ");
 
     NVR_LOG("Initializing Data Pointer ");
     m_pData.reset(new NVR_Data);
@@ -74,7 +74,7 @@ void ProviderAgent::destruct()
         Auto_Mutex data(m_DataMutex);
         m_pData.reset();
         NVR_LOG("MethodWrapper");
-        m_pMethodWrapper.reset();
+        m_pSession.reset();
     }
     CPQFC_FreeLibrary();
     ClearMaps();

@@ -29,7 +29,7 @@
 namespace cimple {
 
 class NVR_Data;
-class NVR_MethodWrapper;
+class Management_Session;
 
 /// The module's version, as "v%d.%d.%d-%d" prints it.
 constexpr int agent_major = 2;
@@ -111,7 +111,7 @@ public:
     std::atomic<uint32> m_cacheTimeout{10}; // minutes
     std::atomic<bool> m_bLoaded{false};     // the constructor finished and the destructor has not begun
     std::unique_ptr<NVR_Data> m_pData;
-    std::unique_ptr<NVR_MethodWrapper> m_pMethodWrapper;
+    std::unique_ptr<Management_Session> m_pSession;
     NVR_FileLogger m_fileLogger;
     NVR_CIMLogger m_cimLogger;
     NVR_SysLogger m_sysLogger;

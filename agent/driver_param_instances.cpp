@@ -9,9 +9,9 @@
 #include "classes/NVRHBA_FCPort.h"
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
-#include "foundation/NVR_MethodWrapper.h"
 #include "foundation/ask_again.h"
 #include "foundation/management_binding.h"
+#include "foundation/shared_operations.h"
 
 namespace cimple {
 
@@ -112,7 +112,7 @@ uint32 nvrcimGetDriverParam(ProviderAgent& agent, const std::string& wwpn, bool 
     NVR_LOG("NVR_MethodWrapper::nvrcimGetDriverParam()");
     HBA_WWN wwn = {};
     if (string2HBAName(&wwn, wwpn.c_str()) == 0) return status_failed;
-    if (!NVR_MethodWrapper::isLocal(wwn)) return status_failed;
+    if (!isLocal(wwn)) return status_failed;
     std::vector<RM_DRIVERPARAM> records;
     if (const uint32 status = readDriverParams(wwn, global, records)) return status;
     if (global) NVR_LOG("number of driver parameters %d", static_cast<int>(records.size()));

@@ -9,7 +9,7 @@
 #include "classes/NVRHBA_VirtualFCPort.h"
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
-#include "foundation/NVR_MethodWrapper.h"
+#include "services/NVR_MethodWrapper.h"
 
 namespace cimple {
 

@@ -2,7 +2,7 @@
 #include <thread>
 #include <unistd.h>
 
-#include "foundation/NVR_MethodWrapper.h"
+#include "foundation/Management_Session.h"
 #include "inventory/NVR_Data.h"
 #include "simulator/nvrsim.h"
 #include "tests/agent/Simulated_Host.h"

@@ -1,4 +1,4 @@
-#include "foundation/NVR_MethodWrapper.h"
+#include "foundation/Management_Session.h"
 
 #include <condition_variable>
 #include <exception>
@@ -49,7 +49,7 @@ TEST_F(Session, InitialisesTheLibraryAndSaysSo)
 {
     Log_Capture log;
     {
-        NVR_MethodWrapper wrapper;
+        Management_Session wrapper;
         EXPECT_EQ(initialised, 1);
         EXPECT_TRUE(there(guard));
         EXPECT_TRUE(there(done));
@@ -69,20 +69,20 @@ TEST_F(Session, RefusesToStandWhenTheLibraryDoes)
     for (int status : {1, 64}) {
         result = status;
         Log_Capture log;
-        EXPECT_THROW(NVR_MethodWrapper(), std::exception);
+        EXPECT_THROW(Management_Session(), std::exception);
         EXPECT_FALSE(there(guard));
         EXPECT_EQ(log.words().back(),
                   "Error : Initialization of RMLib:: RM_InitLib failed with[" + std::to_string(status) + "]");
     }
     result = 0;
-    NVR_MethodWrapper wrapper;
+    Management_Session wrapper;
     EXPECT_TRUE(there(guard)) << "a later one may succeed";
 }
 
 TEST_F(Session, TakesANegativeResultForSuccess)
 {
     result = -1;
-    EXPECT_NO_THROW(NVR_MethodWrapper());
+    EXPECT_NO_THROW(Management_Session());
 }
 
 TEST_F(Session, WithoutALibraryIsRefused)
@@ -90,7 +90,7 @@ TEST_F(Session, WithoutALibraryIsRefused)
     unloadLibraries();
     fake::install({});
     loadLibraries();
-    EXPECT_THROW(NVR_MethodWrapper(), std::exception);
+    EXPECT_THROW(Management_Session(), std::exception);
 }
 
 TEST_F(Session, WithoutASemaphoreStandsUninitialised)
@@ -98,7 +98,7 @@ TEST_F(Session, WithoutASemaphoreStandsUninitialised)
     make_folder("/dev/shm/sem." + guard.substr(1));
     Log_Capture log;
     {
-        NVR_MethodWrapper wrapper;
+        Management_Session wrapper;
     }
     EXPECT_EQ(initialised, 0);
     EXPECT_THAT(log.words(), ElementsAre("Constructor", "Setting Up for FIFO.. ", "RMLIB initialized", "Destructor",
@@ -108,23 +108,23 @@ TEST_F(Session, WithoutASemaphoreStandsUninitialised)
 TEST_F(Session, DoesWithoutTheSecondSemaphore)
 {
     make_folder("/dev/shm/sem." + done.substr(1));
-    EXPECT_NO_THROW(NVR_MethodWrapper());
+    EXPECT_NO_THROW(Management_Session());
     EXPECT_EQ(initialised, 1);
 }
 
 TEST_F(Session, ComesUpAgainAndAgain)
 {
     for (int round = 1; round <= 10; round++) {
-        NVR_MethodWrapper wrapper;
+        Management_Session wrapper;
         EXPECT_EQ(initialised, round);
     }
 }
 
 TEST_F(Session, OfASecondInstanceInitialisesAgain)
 {
-    NVR_MethodWrapper first;
+    Management_Session first;
     {
-        NVR_MethodWrapper second;
+        Management_Session second;
         EXPECT_EQ(initialised, 2);
     }
     EXPECT_FALSE(there(guard));
@@ -136,7 +136,7 @@ TEST_F(Session, TakesALeftOverSemaphoreForAnInstanceThatInitialises)
     ASSERT_NE(left_over, SEM_FAILED);
     Log_Capture log;
     {
-        NVR_MethodWrapper wrapper;
+        Management_Session wrapper;
     }
     EXPECT_EQ(initialised, 0);
     EXPECT_THAT(log.words(),
@@ -146,15 +146,6 @@ TEST_F(Session, TakesALeftOverSemaphoreForAnInstanceThatInitialises)
                             "Destructor", "Value of Sem in destructor=3", "RMLIB uninitialzed"));
     EXPECT_FALSE(there(guard));
     ::sem_close(left_over);
-}
-
-TEST_F(Session, ReadsNames)
-{
-    NVR_MethodWrapper wrapper;
-    HBA_WWN wwn{};
-    EXPECT_EQ(wrapper.string2HBAName(&wwn, "10000000C9123456"), 1);
-    EXPECT_EQ(wwn.wwn[4], 0xC9);
-    EXPECT_EQ(wrapper.string2HBAName(&wwn, "10000000C912345"), 0);
 }
 
 namespace {
@@ -188,16 +179,16 @@ private:
 TEST_F(Session, WaitsForTheInstanceThatInitialises)
 {
     Watched_Log log("Waiting on Completed Semaphore.. To issue RM Calls.." + guard + ".. sem = ");
-    std::unique_ptr<NVR_MethodWrapper> second;
+    std::unique_ptr<Management_Session> second;
     std::thread waiting;
     fake::operations().RM_InitLib = [&] {
         initialised++;
-        waiting = std::thread([&] { second = std::make_unique<NVR_MethodWrapper>(); });
+        waiting = std::thread([&] { second = std::make_unique<Management_Session>(); });
         log.wait();
         EXPECT_EQ(second, nullptr);
         return 0;
     };
-    auto first = std::make_unique<NVR_MethodWrapper>();
+    auto first = std::make_unique<Management_Session>();
     waiting.join();
     EXPECT_EQ(initialised, 1);
     EXPECT_THAT(log.words(), testing::Contains("Recieved signal on Completed Semaphore.. To issue RM Calls"));
@@ -210,14 +201,14 @@ TEST_F(Session, WaitsForTheInstanceThatInitialises)
 TEST_F(Session, OfAWaitingInstanceStandsWhenTheInitialiserFails)
 {
     Watched_Log log("Waiting on Completed Semaphore..");
-    std::unique_ptr<NVR_MethodWrapper> second;
+    std::unique_ptr<Management_Session> second;
     std::thread waiting;
     fake::operations().RM_InitLib = [&] {
-        waiting = std::thread([&] { second = std::make_unique<NVR_MethodWrapper>(); });
+        waiting = std::thread([&] { second = std::make_unique<Management_Session>(); });
         log.wait();
         return 5;
     };
-    EXPECT_THROW(NVR_MethodWrapper(), std::exception);
+    EXPECT_THROW(Management_Session(), std::exception);
     waiting.join();
     EXPECT_NE(second, nullptr);
     second.reset();

@@ -2,7 +2,7 @@
 
 #include <gmock/gmock.h>
 
-#include "foundation/NVR_MethodWrapper.h"
+#include "foundation/Management_Session.h"
 #include "foundation/management_binding.h"
 #include "inventory/Adapter.h"
 #include "inventory/AdapterAttributes.h"
@@ -44,7 +44,7 @@ TEST(SimulatedHost, IsFoundWhole)
     Simulator sim;
     Loaded libraries;
     EXPECT_EQ(libraries.result, 0);
-    NVR_MethodWrapper session;
+    Management_Session session;
     NVR_Data data;
     EXPECT_EQ(scan(data), "1/1/3");
     auto& attributes = dynamic_cast<FCAdapterAttributes&>(*data.getAdapters()[0]->getAttributes());
@@ -65,7 +65,7 @@ TEST(SimulatedHost, OfADataCentreIsFoundWhole)
     Simulator sim;
     sim.load_shipped("typical");
     Loaded libraries;
-    NVR_MethodWrapper session;
+    Management_Session session;
     NVR_Data data;
     EXPECT_EQ(scan(data), "4/4/64");
 }
@@ -74,7 +74,7 @@ TEST(SimulatedHost, ShowsWhatChanged)
 {
     Simulator sim;
     Loaded libraries;
-    NVR_MethodWrapper session;
+    Management_Session session;
     NVR_Data data;
     EXPECT_EQ(scan(data), "1/1/3");
     sim.set("0", "present", 0);
@@ -91,7 +91,7 @@ TEST(SimulatedHost, IsFoundThroughTheSystemsLibrary)
     for (int round = 0; round < 2; round++) {
         Loaded libraries;
         EXPECT_EQ(libraries.result, 0);
-        NVR_MethodWrapper session;
+        Management_Session session;
         NVR_Data data;
         EXPECT_EQ(scan(data), "1/1/3");
         EXPECT_EQ(data.getPorts()[0]->portName(), sim.get("0", "wwpn"));
@@ -119,9 +119,9 @@ TEST_P(SimulatedLibraries, ThatAreMissingCostWhatTheyMust)
     Loaded libraries;
     EXPECT_EQ(libraries.result, variant.result);
     if (variant.session)
-        EXPECT_NO_THROW(NVR_MethodWrapper());
+        EXPECT_NO_THROW(Management_Session());
     else
-        EXPECT_THROW(NVR_MethodWrapper(), std::exception);
+        EXPECT_THROW(Management_Session(), std::exception);
     NVR_Data data;
     EXPECT_EQ(scan(data), variant.found);
 }
@@ -153,7 +153,7 @@ TEST_P(SimulatedDamage, EndsWithTheScan)
     const auto [operation, damage] = GetParam();
     Simulator sim;
     Loaded libraries;
-    NVR_MethodWrapper session;
+    Management_Session session;
     NVR_Data data;
     sim.fail(operation).damaged(damage);
     scan(data);

@@ -3,7 +3,7 @@
 #include <algorithm>
 
 #include "foundation/NVR_Common.h"
-#include "foundation/NVR_MethodWrapper.h"
+#include "services/NVR_MethodWrapper.h"
 #include "tests/agent/Simulated_Host.h"
 
 using namespace cimple;

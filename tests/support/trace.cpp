@@ -4,21 +4,30 @@
 
 namespace nvrtest {
 
-std::vector<std::string> trace_file_words(const std::string& path)
+std::vector<Trace_Line> trace_file_lines(const std::string& path)
 {
-    std::vector<std::string> words;
+    std::vector<Trace_Line> lines;
     std::ifstream file(path);
     for (std::string line; std::getline(file, line);) {
         if (line.rfind("[threadid =", 0) != 0) {
-            if (!words.empty()) words.back() += "\n" + line;
+            if (!lines.empty()) lines.back().words += "\n" + line;
             continue;
         }
         // Three groups, "[thread] [time] [file:line]", then the level's, directly behind the third.
         std::size_t end = 0;
         for (int group = 0; group < 4 && end != std::string::npos; group++)
             end = line.find(']', end + 1);
-        words.push_back(end == std::string::npos || end + 2 > line.size() ? line : line.substr(end + 2));
+        lines.push_back({line.substr(0, line.find(']') + 1),
+                         end == std::string::npos || end + 2 > line.size() ? line : line.substr(end + 2)});
     }
+    return lines;
+}
+
+std::vector<std::string> trace_file_words(const std::string& path)
+{
+    std::vector<std::string> words;
+    for (Trace_Line& line : trace_file_lines(path))
+        words.push_back(std::move(line.words));
     return words;
 }
 

@@ -13,6 +13,14 @@
 
 namespace nvrtest {
 
+struct Trace_Line {
+    std::string thread; ///< as the line names it
+    std::string words;
+};
+
+/// The messages of a trace file, in order, with the thread that logged each. A message of several lines is one.
+std::vector<Trace_Line> trace_file_lines(const std::string& path);
+
 /// The messages of a trace file, in order, without thread, time, file and level. A message of several lines is one.
 std::vector<std::string> trace_file_words(const std::string& path);
 

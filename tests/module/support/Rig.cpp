@@ -10,7 +10,6 @@
 #include "tests/module/support/Simulated_Hardware.h"
 #include "tests/module/support/Test_Clock.h"
 #include "tests/support/private_host.h"
-#include "tests/support/trace.h"
 
 namespace nvrtest {
 
@@ -142,6 +141,11 @@ void Rig::wait_for_refreshes(std::size_t count)
     }
 }
 
+void Rig::settle()
+{
+    wait_for_refreshes(told().starts);
+}
+
 void Rig::refresh()
 {
     // One that runs already would take the question for its own.
@@ -158,6 +162,13 @@ std::vector<std::string> Rig::words() const
     std::vector<std::string> words = trace_file_words(m_trace_path);
     words.erase(words.begin(), words.begin() + static_cast<std::ptrdiff_t>(m_forgotten));
     return words;
+}
+
+std::vector<Trace_Line> Rig::lines() const
+{
+    std::vector<Trace_Line> lines = trace_file_lines(m_trace_path);
+    lines.erase(lines.begin(), lines.begin() + static_cast<std::ptrdiff_t>(m_forgotten));
+    return lines;
 }
 
 void Rig::forget_words()

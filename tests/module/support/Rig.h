@@ -16,6 +16,7 @@
 #include <gmock/gmock.h>
 
 #include "host/Host.h"
+#include "tests/support/trace.h"
 
 namespace nvrtest {
 
@@ -61,11 +62,15 @@ public:
     void refresh();
     /// Waits until so many refreshes have ended since the start of the trace.
     void wait_for_refreshes(std::size_t count);
+    /// Waits until every refresh that has started has ended.
+    void settle();
     /// How many have ended.
     std::size_t refreshes() const;
 
     /// The words of the module's log so far, or since the last forget_words().
     std::vector<std::string> words() const;
+    /// The same with the threads that logged them.
+    std::vector<Trace_Line> lines() const;
     void forget_words();
     /// How many of them are this one.
     std::size_t count_words(const std::string& word) const;

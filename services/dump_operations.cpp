@@ -1,25 +1,20 @@
 // What the management library tells about a port's dumps.
-#include "foundation/NVR_MethodWrapper.h"
+#include "services/NVR_MethodWrapper.h"
 
 #include <cstring>
 
 #include "foundation/CLogger.h"
 #include "foundation/management_binding.h"
+#include "foundation/shared_operations.h"
 
 namespace cimple {
-
-namespace {
-
-constexpr uint32 status_not_local = 1;
-
-} // namespace
 
 // Both reads begin with the words of the second.
 uint32 NVR_MethodWrapper::nvrcimGetDumpDirectory(const HBA_WWN& port, char (&directory)[RM_DUMP_DIRECTORY_SIZE])
 {
     NVR_LOG("NVR_MethodWrapper::nvrcimGetRetentionCount");
     std::memset(directory, 0, sizeof directory);
-    if (!isLocal(port)) return status_not_local;
+    if (!isLocal(port)) return RM_STATUS_ERROR;
     const uint32 status = RM_GetDumpDirectoryA(port, directory, sizeof directory);
     if (status == RM_STATUS_OK) return status;
     std::memset(directory, 0, sizeof directory);
@@ -32,7 +27,7 @@ uint32 NVR_MethodWrapper::nvrcimGetRetentionCount(const HBA_WWN& port, uint32& c
 {
     NVR_LOG("NVR_MethodWrapper::nvrcimGetRetentionCount");
     count = 0;
-    if (!isLocal(port)) return status_not_local;
+    if (!isLocal(port)) return RM_STATUS_ERROR;
     const uint32 status = RM_GetDumpRetentionCount(port, &count);
     if (status == RM_STATUS_OK) return status;
     count = 0;

@@ -1,5 +1,5 @@
 // What the management library tells about the virtual ports of a port.
-#include "foundation/NVR_MethodWrapper.h"
+#include "services/NVR_MethodWrapper.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -10,6 +10,7 @@
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
 #include "foundation/management_binding.h"
+#include "foundation/shared_operations.h"
 
 namespace cimple {
 
@@ -83,7 +84,7 @@ void logVPortFailure(uint32 status)
         NVR_LOG("FMCMD does not support listing virtual ports on this host.");
         return;
     }
-    NVR_MethodWrapper::logStatus(status);
+    logStatus(status);
     NVR_LOG("Unable to list virtual ports!!");
 }
 

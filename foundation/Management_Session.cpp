@@ -1,4 +1,4 @@
-#include "foundation/NVR_MethodWrapper.h"
+#include "foundation/Management_Session.h"
 
 #include <cerrno>
 #include <cstdint>
@@ -9,7 +9,6 @@
 #include <unistd.h>
 
 #include "foundation/CLogger.h"
-#include "foundation/NVR_Common.h"
 #include "foundation/management_binding.h"
 #include "runtime/Immortal.h"
 #include "runtime/Mutex.h"
@@ -94,7 +93,7 @@ void initialise(sem_t* guard, const std::string& name)
 
 // The guard is made with the value 2. Who finds 2 initialises, with 1 in between, and puts it back to 2; who finds less
 // takes what is left and waits for that.
-NVR_MethodWrapper::NVR_MethodWrapper()
+Management_Session::Management_Session()
 {
     NVR_LOG("Constructor");
     NVR_LOG("Setting Up for FIFO.. ");
@@ -115,7 +114,7 @@ NVR_MethodWrapper::NVR_MethodWrapper()
     NVR_LOG("RMLIB initialized");
 }
 
-NVR_MethodWrapper::~NVR_MethodWrapper()
+Management_Session::~Management_Session()
 {
     NVR_LOG("Destructor");
     sem_t* guard = nullptr;
@@ -131,38 +130,6 @@ NVR_MethodWrapper::~NVR_MethodWrapper()
         close_guard(guard, guard_name());
     }
     NVR_LOG("RMLIB uninitialzed");
-}
-
-int NVR_MethodWrapper::string2HBAName(HBA_WWN* wwn, const char* text)
-{
-    return cimple::string2HBAName(wwn, text);
-}
-
-int NVR_MethodWrapper::Validatewwpn(const HBA_WWN& port)
-{
-    NVR_LOG("Entering NVR_MethodWrapper::Validatewwpn()");
-    uint32 local = 0;
-    const uint32 status = RM_IsLocalHBA(port, &local);
-    NVR_LOG("RM_IsLocalHBA: status=%d", static_cast<int>(status));
-    if (status == RM_STATUS_OK && local != 0) return 0;
-    NVR_LOG("HBA IS NOT LOCAL");
-    return 1;
-}
-
-bool NVR_MethodWrapper::isLocal(const HBA_WWN& port)
-{
-    if (Validatewwpn(port) == 0) return true;
-    NVR_LOG("INVALID wwpn");
-    return false;
-}
-
-void NVR_MethodWrapper::logStatus(uint32 status)
-{
-    const StatusText text(status);
-    if (*text.c_str())
-        NVR_LOG("Status: <%d>:%s", static_cast<int>(status), text.c_str());
-    else
-        NVR_LOG("Status: <%d>", static_cast<int>(status));
 }
 
 } // namespace cimple
