@@ -1,0 +1,21 @@
+/// Which libcurl the loader finds as "libcurl.so". For programs with a private host.
+#pragma once
+
+#include <string>
+
+#include "tests/support/curl_stand_in.h"
+
+namespace nvrtest {
+
+/// The system's own.
+void install_curl();
+/// None: a file of that name that is no library.
+void install_no_curl();
+/// One that forwards to the system's own but lacks an entry ("nothing": has them all). The record is the library's,
+/// which stays open; one a process for each entry.
+Curl_Stand_In& install_curl_without(const std::string& entry);
+
+/// The files of these, for tests that put them elsewhere.
+std::string system_curl();
+
+} // namespace nvrtest
