@@ -1,15 +1,19 @@
 // The main job: what a client reads of a host's adapters and ports, class by class and value by value.
 #include <algorithm>
+#include <iomanip>
 #include <set>
+#include <sstream>
 #include <string>
 #include <vector>
 
 #include <gmock/gmock.h>
 
+#include "mof/Model.h"
 #include "tests/module/support/Expected.h"
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
 #include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/private_host.h"
 
 using namespace nvrtest;
 using testing::ElementsAre;
@@ -64,6 +68,89 @@ TEST_P(Inventory, NamesAreThePathsOfTheInstancesInTheSameOrder)
         EXPECT_EQ(found, wanted) << name;
         EXPECT_EQ(std::set<std::string>(found.begin(), found.end()).size(), found.size()) << name << " repeats a name";
     }
+}
+
+namespace {
+
+/// A row of filled.txt: what instances of one class whose InstanceID begins so have.
+struct Filled {
+    std::string class_name, id_begins;
+    std::set<std::string> always, sometimes;
+    bool seen = false;
+};
+
+std::vector<Filled> filled_rows()
+{
+    std::vector<Filled> rows;
+    std::istringstream lines(expected_text("filled.txt"));
+    for (std::string line; std::getline(lines, line);) {
+        if (line.empty()) continue;
+        std::istringstream words(line);
+        Filled row;
+        words >> row.class_name >> std::quoted(row.id_begins);
+        for (std::string word; words >> word;)
+            if (word.back() == '?')
+                row.sometimes.insert(word.substr(0, word.size() - 1));
+            else
+                row.always.insert(word);
+        rows.push_back(row);
+    }
+    return rows;
+}
+
+/// What an instance has, but for references.
+std::set<std::string> filled_properties(const host::Instance& instance)
+{
+    std::set<std::string> names;
+    for (const host::Named_Value& property : instance.properties)
+        if (!property.value.is_null() && property.value.type() != CMPI_ref) names.insert(property.name);
+    return names;
+}
+
+/// What a new instance of the class has.
+std::set<std::string> defaults(const host::Class_Record& record)
+{
+    std::set<std::string> names;
+    for (const auto& feature : record.declaration->features)
+        if (feature->has_default) names.insert(feature->name);
+    return names;
+}
+
+} // namespace
+
+TEST(InventoryProperties, AreThoseThatTheClassesAreToHaveAndNoOthers)
+{
+    write_file("/etc/nvr_smis.conf", "https://storage1.norvane.test:8443/launch\n");
+    Rig rig;
+    std::vector<Filled> rows = filled_rows();
+    for (const auto& provider : expected_rows("providers.txt")) {
+        const std::string& name = provider.front();
+        if (name == "NVRHBA_AlertIndication") continue;
+        // The counters alone begin with nothing.
+        std::set<std::string> from_schema;
+        if (name != "NVRHBA_FCPortStatistics") from_schema = defaults(*rig.server().schema().find(name));
+        for (const host::Instance& instance : rig.enumerate(name).instances) {
+            Filled none;
+            Filled* row = &none;
+            for (Filled& one : rows)
+                if (one.class_name == name && instance.get("InstanceID").as_text().rfind(one.id_begins, 0) == 0)
+                    row = &one;
+            row->seen = true;
+            std::set<std::string> has = filled_properties(instance);
+            for (const std::string& property : row->always)
+                EXPECT_EQ(has.erase(property), 1u) << instance.path.to_text() << " lacks " << property;
+            for (const std::string& property : row->sometimes)
+                has.erase(property);
+            for (const std::string& property : from_schema) {
+                if (row->always.count(property) || row->sometimes.count(property)) continue;
+                EXPECT_EQ(has.erase(property), 1u) << instance.path.to_text() << " lost the default " << property;
+            }
+            EXPECT_THAT(has, IsEmpty()) << instance.path.to_text();
+        }
+    }
+    for (const Filled& row : rows)
+        EXPECT_TRUE(row.seen) << row.class_name << ' ' << row.id_begins;
+    nvrtest::remove("/etc/nvr_smis.conf");
 }
 
 // Each reference leads to an instance that the module itself gives, but for the host, which other providers publish.
