@@ -98,6 +98,8 @@ private:
     }
     /// An association of the walk: without it the run ends.
     Instance* tie(Link link, const Instance* first, const Instance* second);
+    /// The same, but a missing end, which the association's words tell, answers false and ends nothing.
+    bool tieIfMade(Link link, const Instance* first, const Instance* second);
 
     ProviderAgent& m_agent;
     Instance* m_host = nullptr;

@@ -81,6 +81,12 @@ Instance* Adapter_Update::tie(Link link, const Instance* first, const Instance* 
     return association;
 }
 
+bool Adapter_Update::tieIfMade(Link link, const Instance* first, const Instance* second)
+{
+    if (first && second) return tie(link, first, second) != nullptr;
+    return associate(m_agent, link, first, second) != nullptr;
+}
+
 void Adapter_Update::walkAdapters()
 {
     uint32 number = 0;

@@ -42,7 +42,8 @@ Instance* Adapter_Update::buildPCIDevice(const Port_Scope& scope)
 {
     const PCI_Header header(scope.wwn);
     NVR_LOG("Creating NVRHBA_PCIDevice");
-    auto made = make<NVRHBA_PCIDevice>();
+    auto made = makeOrLog<NVRHBA_PCIDevice>("Failed to create NVRHBA_PCIDevice");
+    if (!made) return nullptr;
     setHost(*made);
     set(made->CreationClassName, "NVRHBA_PCIDevice");
     set(made->DeviceID, text("%s:0x%04X", scope.wwpn, header.word(2)));
@@ -81,13 +82,9 @@ Instance* Adapter_Update::buildPCIDevice(const Port_Scope& scope)
     set(made->MaximumLatency, header.byte(63));
     Instance* device = insert(m_agent.m_NVRHBA_PCIDevice_map, made);
 
-    if (!m_pciDevice) {
-        NVR_LOG("Failed to create NVRHBA_PCIElementConformsToProfile");
-        return nullptr;
-    }
-    tie(Link::PCIElementConformsToProfile, m_pciDevice, device);
-    tie(Link::SystemDevice, m_host, device);
-    return device;
+    const bool tied = tieIfMade(Link::PCIElementConformsToProfile, m_pciDevice, device) &&
+                      tieIfMade(Link::SystemDevice, m_host, device);
+    return tied ? device : nullptr;
 }
 
 } // namespace cimple
