@@ -200,7 +200,9 @@ std::string methods_text(const Catalogue& catalogue, const mof::Class& target)
             inherited += "\n- " + method->name + ", from " + link(catalogue, method->origin);
     std::string text;
     if (!own.empty()) text += "\n## Methods\n" + own;
-    if (!inherited.empty()) text += "\n## Inherited methods\n" + inherited + "\n";
+    if (!inherited.empty())
+        text += "\n## Inherited methods\n\nThose that the module does not serve answer \"not supported\".\n" +
+                inherited + "\n";
     return text;
 }
 

@@ -39,21 +39,23 @@ TEST(ClassFiles, ReadWithoutAFault)
     EXPECT_EQ(class_files().classes().size(), 260u);
 }
 
-TEST(ClassFiles, EverythingOfTheModulesIsDescribed)
+TEST(ClassFiles, EverythingIsDescribed)
 {
-    int described = 0;
+    int own = 0;
     for (const Class* target : class_files().classes()) {
-        if (target->name.rfind("CIM_", 0) == 0) continue;
+        const bool is_schema = target->name.rfind("CIM_", 0) == 0;
+        own += !is_schema;
         expect_described(target->qualifiers, target->name);
-        ++described;
         for (const auto& feature : target->declared) {
             const std::string what = target->name + "." + feature->name;
-            expect_described(feature->qualifiers, what);
+            // An override of the schema's may mean what the overridden one says.
+            if (!is_schema || !feature->overridden) expect_described(feature->qualifiers, what);
+            if (is_schema) continue;
             for (const auto& parameter : feature->parameters)
                 expect_described(parameter.qualifiers, what + "." + parameter.name);
         }
     }
-    EXPECT_EQ(described, 143);
+    EXPECT_EQ(own, 143);
 }
 
 TEST(ClassFiles, ValueMapsAndValuesPairUp)

@@ -106,6 +106,8 @@ Returns `uint8`.
 
 ## Inherited methods
 
+Those that the module does not serve answer "not supported".
+
 - Start, from [Base](Base.md)
 
 ## Associations
