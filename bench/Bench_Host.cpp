@@ -9,18 +9,22 @@
 
 namespace nvrbench {
 
-void prepare_host(unsigned ports)
+void prepare_host(unsigned ports, unsigned targets, unsigned luns)
 {
     nvrtest::compose_libraries({"HBAAPI", "lrmapi", "rmapi", "tssdm"});
     nvrtest::remove(nvrtest::dmp_path);
+    // One side of the refresh at a time, so that its cost can be told.
+    const bool has_san = targets != 0;
     nvrtest::write_file(nvrtest::conf_path,
-                        "NVR_PROVIDER_REFRESH_ADAPTERDATA = TRUE\nNVR_PROVIDER_REFRESH_SANDATA = FALSE\n");
-    std::string scenario(nvrsim_generate(ports, 0, 0, nullptr, 0) + 1, '\0');
-    scenario.resize(nvrsim_generate(ports, 0, 0, scenario.data(), scenario.size()));
+                        has_san ? "NVR_PROVIDER_REFRESH_ADAPTERDATA = FALSE\nNVR_PROVIDER_REFRESH_SANDATA = TRUE\n"
+                                : "NVR_PROVIDER_REFRESH_ADAPTERDATA = TRUE\nNVR_PROVIDER_REFRESH_SANDATA = FALSE\n");
+    std::string scenario(nvrsim_generate(ports, targets, luns, nullptr, 0) + 1, '\0');
+    scenario.resize(nvrsim_generate(ports, targets, luns, scenario.data(), scenario.size()));
     nvrtest::load_scenario(scenario);
 }
 
-Bench_Host::Bench_Host(unsigned ports) : m_server((prepare_host(ports), nvrtest::module_schema()))
+Bench_Host::Bench_Host(unsigned ports, unsigned targets, unsigned luns)
+    : m_server((prepare_host(ports, targets, luns), nvrtest::module_schema()))
 {
     std::string error;
     if (m_server.add_module(NVR_MODULE, "root/norvane", &error) == 0) throw std::runtime_error(error);

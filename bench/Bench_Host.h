@@ -11,8 +11,9 @@ namespace nvrbench {
 
 class Bench_Host {
 public:
-    /// Adapters of two ports, without targets.
-    explicit Bench_Host(unsigned ports);
+    /// Adapters of two ports, each of which sees so many targets of so many units. A time-out refreshes the adapters,
+    /// or, where there are targets, the SAN.
+    explicit Bench_Host(unsigned ports, unsigned targets = 0, unsigned luns = 0);
     ~Bench_Host() { m_server.stop(); }
 
     host::Host& server() { return m_server; }
@@ -23,7 +24,7 @@ private:
 };
 
 /// The host's hardware, libraries and settings, without a server.
-void prepare_host(unsigned ports);
+void prepare_host(unsigned ports, unsigned targets = 0, unsigned luns = 0);
 
 /// Measures the first answer of a module in this fresh process and prints it; the exit status.
 int answer_first(unsigned ports);

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
+#include <ctime>
 #include <thread>
 
 namespace nvrsim {
@@ -11,10 +12,18 @@ namespace {
 
 constexpr size_t longestLog = 20000;
 
+uint64_t processor_nanoseconds()
+{
+    timespec now{};
+    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &now);
+    return static_cast<uint64_t>(now.tv_sec) * 1000000000 + static_cast<uint64_t>(now.tv_nsec);
+}
+
 } // namespace
 
 Call::Call(Call_Id id, const Subject& subject) : m_simulator(Simulator::instance()), m_lock(m_simulator.mutex), m_id(id)
 {
+    if (m_simulator.timesCalls) m_start = processor_nanoseconds();
     resolve(subject);
     ++m_simulator.counters[static_cast<size_t>(id)];
     const char* name = to_text(id);
@@ -44,6 +53,7 @@ Call::~Call()
     } catch (const std::exception&) {
         // A log without this line is all that is lost.
     }
+    if (m_start != 0) m_simulator.callNanoseconds += processor_nanoseconds() - m_start;
 }
 
 void Call::resolve(const Subject& subject)

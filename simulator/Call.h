@@ -97,6 +97,7 @@ private:
     Port* m_port = nullptr;
     Wwn m_wwpn = 0;
     int64_t m_result = 0;
+    uint64_t m_start = 0; // 0: not timed
     uint32_t m_noise = 0x9E3779B9;
 };
 

@@ -114,6 +114,21 @@ NVRSIM_EXPORT uint64_t nvrsim_calls(const char* operation)
     return calls;
 }
 
+NVRSIM_EXPORT void nvrsim_time_calls(int on)
+{
+    Simulator& simulator = Simulator::instance();
+    std::lock_guard<std::mutex> lock(simulator.mutex);
+    simulator.timesCalls = on != 0;
+    simulator.callNanoseconds = 0;
+}
+
+NVRSIM_EXPORT double nvrsim_call_seconds(void)
+{
+    Simulator& simulator = Simulator::instance();
+    std::lock_guard<std::mutex> lock(simulator.mutex);
+    return static_cast<double>(simulator.callNanoseconds) * 1e-9;
+}
+
 NVRSIM_EXPORT size_t nvrsim_log(char* buffer, size_t size)
 {
     return guarded<size_t>(0, [&] { return give(describe_log(), buffer, size); });

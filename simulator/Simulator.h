@@ -46,6 +46,8 @@ struct Simulator {
     uint64_t counters[static_cast<size_t>(Call_Id::count)] = {};
     std::deque<Log_Entry> log; // the newest; bounded
     uint64_t refreshes = 0;
+    bool timesCalls = false;
+    uint64_t callNanoseconds = 0; // processor time of calls while they are timed
 
     /// Each replaces the whole state but registered callbacks; false with `error` set leaves a host without adapters.
     bool load_file(const std::string& path);

@@ -34,6 +34,10 @@ size_t nvrsim_faults(char* buffer, size_t size);
 
 /* Calls of one operation since the load, e.g. "RM_GetVPD"; 0 for an unknown name. With a null name, of all. */
 uint64_t nvrsim_calls(const char* operation);
+/* Whether calls are timed from now on (they are not at first: it costs more than some calls), and the processor time in
+ * seconds that timed ones have taken since: what a caller measures can be told from what the libraries cost. */
+void nvrsim_time_calls(int on);
+double nvrsim_call_seconds(void);
 /* The newest calls in order, one line each: name, port or "-", result. */
 size_t nvrsim_log(char* buffer, size_t size);
 void nvrsim_clear_log(void);

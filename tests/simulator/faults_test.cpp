@@ -219,6 +219,24 @@ TEST_F(Faults, WrongFaultsAreRefusedWithTheirReason)
     EXPECT_EQ(-1, nvrsim_fault(nullptr));
 }
 
+TEST_F(Faults, CallsAreTimedWhenToldTo)
+{
+    const auto work = [] {
+        for (int i = 0; i < 1000; ++i)
+            (void)nvrsim_HBA_GetNumberOfAdapters();
+    };
+    work();
+    EXPECT_EQ(0.0, nvrsim_call_seconds());
+    nvrsim_time_calls(1);
+    work();
+    const double taken = nvrsim_call_seconds();
+    EXPECT_GT(taken, 0.0);
+    nvrsim_time_calls(0);
+    EXPECT_EQ(0.0, nvrsim_call_seconds());
+    work();
+    EXPECT_EQ(0.0, nvrsim_call_seconds());
+}
+
 TEST_F(Faults, EveryOperationSurvivesEveryDamage)
 {
     load("[[adapter]]\n[[adapter.port]]\n[[adapter.port.vport]]\n[[adapter.port.vport.vm]]\n[[target]]\nluns = 2\n");

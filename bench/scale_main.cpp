@@ -1,0 +1,282 @@
+// What the module costs as the SAN grows: each point of scale in a fresh process, and a table of them all.
+//
+// Times are processor time of the process, so that other work on the machine counts little; the time of the simulated
+// libraries is taken off a refresh. What the traversals print goes to /dev/null.
+#include <algorithm>
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <dlfcn.h>
+#include <exception>
+#include <fcntl.h>
+#include <fstream>
+#include <iostream>
+#include <malloc.h>
+#include <map>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <time.h>
+#include <unistd.h>
+#include <vector>
+
+#include "bench/Bench_Host.h"
+#include "simulator/nvrsim.h"
+#include "tests/module/support/Rig.h"
+#include "tests/module/support/Test_Clock.h"
+#include "tests/support/private_host_setup.h"
+
+namespace {
+
+struct Point {
+    const char* name;
+    unsigned ports, targets, luns;
+    unsigned paths() const { return ports * targets * luns; }
+};
+
+constexpr Point points[] = {
+    {"64", 2, 4, 8},  {"S", 2, 8, 8},        {"1000", 4, 10, 25}, {"M", 4, 16, 16},
+    {"L", 8, 32, 16}, {"10000", 10, 20, 50}, {"XL", 16, 32, 32},  {"XXL", 16, 125, 50},
+};
+
+constexpr char name_space[] = "root/norvane";
+constexpr char mapping_call[] = "HBA_GetFcpTargetMapping";
+constexpr char volume_class[] = "NVRHBA_StorageVolume";
+
+/// The figures of a point by name. Times in microseconds, memory in bytes.
+using Figures = std::map<std::string, double>;
+
+const char* const figure_names[] = {
+    "first_answer",    "refresh", "refresh_total", "resident", "heap",         "peak_ratio", "instances",
+    "instances_floor", "names",   "names_floor",   "get",      "volume_paths", "volume_all", "port_devices",
+};
+
+// --- One point
+// -------------------------------------------------------------------------------------------------------
+
+double processor_microseconds()
+{
+    timespec now{};
+    clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &now);
+    return static_cast<double>(now.tv_sec) * 1e6 + static_cast<double>(now.tv_nsec) * 1e-3;
+}
+
+template <class Work>
+double microseconds_of(Work work)
+{
+    const double start = processor_microseconds();
+    work();
+    return processor_microseconds() - start;
+}
+
+/// The least of some runs, for as long as they stay short.
+template <class Work>
+double least_of(Work work)
+{
+    double least = microseconds_of(work), spent = least;
+    for (int i = 0; i < 9 && spent < 1.5e6; i++) {
+        const double run = microseconds_of(work);
+        least = std::min(least, run);
+        spent += run;
+    }
+    return least;
+}
+
+double status_bytes(const char* key)
+{
+    std::ifstream status("/proc/self/status");
+    for (std::string line; std::getline(status, line);)
+        if (line.compare(0, std::strlen(key), key) == 0) return std::stod(line.substr(std::strlen(key) + 1)) * 1024;
+    throw std::runtime_error("no such line in the process's status");
+}
+
+double resident()
+{
+    malloc_trim(0);
+    return status_bytes("VmRSS");
+}
+
+void forget_peak()
+{
+    std::ofstream("/proc/self/clear_refs") << "5";
+}
+
+double heap()
+{
+    const struct mallinfo2 info = mallinfo2();
+    return static_cast<double>(info.uordblks + info.hblkhd);
+}
+
+/// Lets the cache grow old and waits until the SAN is read anew. The thread holds the lock that an enumeration of ports
+/// takes from its first call into the libraries until the new maps are ready. An earlier thread that is still at its
+/// end takes the new time for its own, so the time-out may have to come twice.
+void refresh_san(nvrbench::Bench_Host& host)
+{
+    const std::uint64_t calls = nvrsim_calls(mapping_call);
+    while (nvrsim_calls(mapping_call) == calls) {
+        nvrtest::advance_clock(std::chrono::minutes(31));
+        (void)host.enumerate("NVRHBA_Product");
+        std::this_thread::sleep_for(std::chrono::milliseconds(2));
+    }
+    (void)host.enumerate("NVRHBA_FCPort");
+}
+
+void require(bool is_so, const char* what)
+{
+    if (!is_so) throw std::runtime_error(what);
+}
+
+void measure_memory(nvrbench::Bench_Host& host, const Point& point, Figures& figures)
+{
+    const double resident_before = resident(), heap_before = heap();
+    figures["first_answer"] = microseconds_of([&] { (void)host.enumerate("NVRHBA_TapeDrive"); });
+    figures["heap"] = (heap() - heap_before) / point.paths();
+    const double steady = resident() - resident_before;
+    figures["resident"] = steady / point.paths();
+    forget_peak();
+    refresh_san(host);
+    figures["peak_ratio"] = (status_bytes("VmHWM") - resident_before) / steady;
+}
+
+void measure_refresh(nvrbench::Bench_Host& host, const Point& point, Figures& figures)
+{
+    double total = 0, own = 0;
+    constexpr int rounds = 3;
+    for (int i = 0; i < rounds; i++) {
+        nvrsim_time_calls(1);
+        const double run = microseconds_of([&] { refresh_san(host); });
+        const double mine = run - nvrsim_call_seconds() * 1e6;
+        nvrsim_time_calls(0);
+        total = i == 0 ? run : std::min(total, run);
+        own = i == 0 ? mine : std::min(own, mine);
+    }
+    figures["refresh"] = own / point.paths();
+    figures["refresh_total"] = total / point.paths();
+}
+
+void measure_enumerations(host::Host& server, const Point& point, const std::string& suffix, Figures& figures)
+{
+    const auto count = [&](std::size_t got) { require(got == point.paths(), "not all volumes were told"); };
+    figures["instances" + suffix] =
+        least_of([&] { count(server.enumerate(name_space, volume_class).instances.size()); }) / point.paths();
+    figures["names" + suffix] =
+        least_of([&] { count(server.names(name_space, volume_class).paths.size()); }) / point.paths();
+}
+
+void measure_lookups(nvrbench::Bench_Host& host, const Point& point, Figures& figures)
+{
+    host::Host& server = host.server();
+    const host::Path volume = server.names(name_space, volume_class).paths.at(point.paths() / 2);
+    figures["get"] = least_of([&] { require(server.get(volume).ok(), "a volume was not found"); });
+    figures["volume_paths"] = least_of([&] {
+        const char* path_class = "NVRHBA_SCSIInitiatorTargetStorageVolumePath";
+        require(server.associators(volume, path_class).instances.size() == 2, "a volume lost its ends");
+    });
+    figures["volume_all"] =
+        least_of([&] { require(server.associators(volume).instances.size() >= 2, "a volume lost its ends"); });
+    const host::Path initiator = server.names(name_space, "NVRHBA_SCSIProtocolInitiatorEndpoint").paths.at(0);
+    const std::size_t ends = 2 * point.targets * point.luns;
+    figures["port_devices"] =
+        least_of([&] {
+            const char* path_class = "NVRHBA_SCSIInitiatorTargetStorageVolumePath";
+            require(server.associators(initiator, path_class).instances.size() == ends, "a port lost its devices");
+        }) /
+        static_cast<double>(ends);
+}
+
+void measure_floor(const Point& point, Figures& figures)
+{
+    void* library = dlopen(NVR_FLOOR_VOLUMES, RTLD_NOW | RTLD_LOCAL);
+    if (!library) throw std::runtime_error(dlerror());
+    reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_volumes"))(point.paths());
+    host::Host server(nvrtest::module_schema());
+    server.add(
+        {volume_class, "NVRHBA_StorageVolume_Provider", NVR_FLOOR_VOLUMES, host::instance_kind, {name_space}, false});
+    measure_enumerations(server, point, "_floor", figures);
+}
+
+const Point& point_of(const std::string& name)
+{
+    for (const Point& point : points)
+        if (name == point.name) return point;
+    throw std::runtime_error("no point of scale is named " + name);
+}
+
+void measure(const Point& point)
+{
+    const int answer = dup(STDOUT_FILENO);
+    const int nowhere = open("/dev/null", O_WRONLY);
+    dup2(nowhere, STDOUT_FILENO);
+    Figures figures;
+    {
+        nvrbench::Bench_Host host(point.ports, point.targets, point.luns);
+        measure_memory(host, point, figures);
+        measure_refresh(host, point, figures);
+        measure_enumerations(host.server(), point, "", figures);
+        measure_lookups(host, point, figures);
+        measure_floor(point, figures);
+    }
+    for (const char* name : figure_names)
+        dprintf(answer, "%.6g\n", figures.at(name));
+}
+
+// --- The tables
+// ------------------------------------------------------------------------------------------------------
+
+Figures measured_apart(const char* name)
+{
+    const std::string command = std::string("NVR_SCALE_POINT=") + name + " /proc/" + std::to_string(getpid()) + "/exe";
+    FILE* child = popen(command.c_str(), "r");
+    require(child, "no process could be started");
+    Figures figures;
+    for (const char* figure : figure_names)
+        if (std::fscanf(child, "%lf", &figures[figure]) != 1) figures[figure] = 0;
+    require(pclose(child) == 0, "a point of scale failed");
+    return figures;
+}
+
+void print_row(const Point& point, const Figures& f)
+{
+    std::printf("| %s | %u | %.3f | %.1f | %.1f | %.0f | %.0f | %.2f | %.1f | %.2f | %.1f | %.2f | %.0f | %.1f | %.1f "
+                "| %.1f |\n",
+                point.name, point.paths(), f.at("first_answer") * 1e-6, f.at("refresh"), f.at("refresh_total"),
+                f.at("resident"), f.at("heap"), f.at("peak_ratio"), f.at("instances"),
+                f.at("instances") / f.at("instances_floor"), f.at("names"), f.at("names") / f.at("names_floor"),
+                f.at("get"), f.at("volume_paths") * 1e-3, f.at("volume_all") * 1e-3, f.at("port_devices"));
+    std::fflush(stdout);
+}
+
+void print_table(const std::vector<std::string>& names)
+{
+    std::puts(
+        "| point | paths | first answer s | refresh us/path | with libraries | resident B/path | heap B/path | peak | "
+        "instances us | of floor | names us | of floor | get us | associators ms | all classes ms | from a port us |");
+    std::puts("|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|");
+    for (const std::string& name : names) {
+        const Point& point = point_of(name);
+        print_row(point, measured_apart(point.name));
+    }
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    try {
+        nvrtest::enter_private_host(argv);
+        if (const char* name = std::getenv("NVR_SCALE_POINT")) {
+            measure(point_of(name));
+            return 0;
+        }
+        std::vector<std::string> names(argv + 1, argv + argc);
+        if (names.empty())
+            for (const Point& point : points)
+                names.push_back(point.name);
+        print_table(names);
+    } catch (const std::exception& error) {
+        std::cerr << "nvr_scale: " << error.what() << '\n';
+        return 1;
+    }
+    return 0;
+}
