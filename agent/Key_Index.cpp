@@ -52,17 +52,11 @@ void mix_property(uint64& value, const Instance* instance, const Meta_Property* 
     }
 }
 
-/// Calls `visit` with each key feature that key_eq looks at; stops when it answers false.
-template <class Visit>
-bool for_each_key(const Meta_Class* meta_class, Visit visit)
+/// True for the features that key_eq looks at.
+bool is_compared(const Meta_Feature* feature)
 {
-    for (std::size_t i = 0; i < meta_class->num_meta_features; i++) {
-        const Meta_Feature* feature = meta_class->meta_features[i];
-        if (!is_key(feature)) continue;
-        if (is_reference(feature) && as_reference(feature)->subscript != 0) continue;
-        if (!visit(feature)) return false;
-    }
-    return true;
+    if (!is_key(feature)) return false;
+    return is_property(feature) || (is_reference(feature) && as_reference(feature)->subscript == 0);
 }
 
 } // namespace
@@ -70,14 +64,16 @@ bool for_each_key(const Meta_Class* meta_class, Visit visit)
 bool Key_Index::walk(const Instance* instance, std::size_t& depth, uint64& value) const
 {
     const Meta_Class* meta_class = instance ? instance->meta_class : nullptr;
-    if (depth == m_shape.size() || m_shape[depth] != meta_class) return false;
-    depth++;
-    if (!instance) return true;
-    return for_each_key(meta_class, [&](const Meta_Feature* feature) {
-        if (is_reference(feature)) return walk(reference_of(instance, as_reference(feature)), depth, value);
-        if (is_property(feature)) mix_property(value, instance, as_property(feature));
-        return true;
-    });
+    if (depth == m_shape.size() || m_shape[depth].meta_class != meta_class) return false;
+    const Node& node = m_shape[depth++];
+    for (std::size_t i = node.first; i < node.first + node.count; i++) {
+        const Meta_Feature* key = m_keys[i];
+        if (is_property(key))
+            mix_property(value, instance, as_property(key));
+        else if (!walk(reference_of(instance, as_reference(key)), depth, value))
+            return false;
+    }
+    return true;
 }
 
 bool Key_Index::hash(const Instance* instance, uint64& value) const
@@ -89,12 +85,14 @@ bool Key_Index::hash(const Instance* instance, uint64& value) const
 
 void Key_Index::learn_shape(const Instance* instance)
 {
-    m_shape.push_back(instance ? instance->meta_class : nullptr);
-    if (!instance) return;
-    for_each_key(instance->meta_class, [&](const Meta_Feature* feature) {
-        if (is_reference(feature)) learn_shape(reference_of(instance, as_reference(feature)));
-        return true;
-    });
+    const std::size_t first = m_keys.size();
+    if (instance)
+        for (const Meta_Feature* feature : features_of(instance->meta_class))
+            if (is_compared(feature)) m_keys.push_back(feature);
+    const std::size_t count = m_keys.size() - first;
+    m_shape.push_back({instance ? instance->meta_class : nullptr, first, count});
+    for (std::size_t i = first; i < first + count; i++)
+        if (is_reference(m_keys[i])) learn_shape(reference_of(instance, as_reference(m_keys[i])));
 }
 
 void Key_Index::append(const Array<Instance*>& list)

@@ -35,8 +35,14 @@ private:
         uint64 hash;
         bool strange; // of another shape, not in the slots
     };
-    std::vector<const Meta_Class*> m_shape; // in walking order; of the first element
-    std::vector<Entry> m_entries;           // one an element
+    /// One instance of the shape: its class (null: no instance) and its keys, `count` of m_keys from `first` on.
+    struct Node {
+        const Meta_Class* meta_class;
+        std::size_t first, count;
+    };
+    std::vector<Node> m_shape; // in walking order; of the first element
+    std::vector<const Meta_Feature*> m_keys;
+    std::vector<Entry> m_entries; // one an element
     std::size_t m_strangers = 0;
     std::vector<uint32> m_slots; // open addressing: position + 1, or 0; a power of two, at most half full
 };

@@ -1,8 +1,10 @@
 #include <cstdio>
+#include <vector>
 
 #include "cmpi/Converter.h"
 #include "cmpi/operation.h"
 #include "cmpi/operations.h"
+#include "runtime/Selection.h"
 #include "runtime/associations.h"
 
 namespace cimple {
@@ -94,20 +96,61 @@ int deliver_reference(Answer& answer, Instance* instance)
 // --- Traversals
 // --------------------------------------------------------------------------------------------------------
 
-struct Reference_Filter {
+struct Reference_Filter : Selection {
+    Reference_Filter(const Instance* source, const String& role, Enum_Handler_Proc proc, void* data)
+        : Selection(this, Values::keys_of_ends), source(source), role(role), proc(proc), data(data)
+    {
+    }
+    bool wants(const Instance* association) override { return ref_of(source, association, role); }
+
     const Instance* source;
     String role;
     Enum_Handler_Proc proc;
     void* data;
 };
 
-struct Associator_Filter {
+// Each association is told on standard output, wanted or not; of those that the provider left out, their number before
+// each wanted one is kept until that is handed out.
+struct Associator_Filter : Selection {
+    Associator_Filter(const Instance* source, const String& result_class, const String& role, const String& result_role,
+                      Enum_Handler_Proc proc, void* data)
+        : Selection(this, Values::all), source(source), result_class(result_class), role(role),
+          result_role(result_role), proc(proc), data(data)
+    {
+    }
+    bool wants(const Instance* association) override
+    {
+        if (!ref_of(source, association, role)) {
+            unwanted++;
+            return false;
+        }
+        unwanted_before.push_back(unwanted);
+        unwanted = 0;
+        return true;
+    }
+    void asked_all() override { is_complete = true; }
+
+    void tell() const { std::puts("cimple _proc _enum_associator_names"); }
+    void tell_unwanted()
+    {
+        if (!is_complete) return;
+        std::size_t count = handed_out < unwanted_before.size() ? unwanted_before[handed_out++] : unwanted;
+        for (; count; --count)
+            tell();
+    }
+
     const Instance* source;
     String result_class;
     String role;
     String result_role;
     Enum_Handler_Proc proc;
     void* data;
+
+private:
+    std::vector<std::size_t> unwanted_before;
+    std::size_t unwanted = 0;
+    std::size_t handed_out = 0;
+    bool is_complete = false;
 };
 
 bool pass_reference(Instance* instance, int, void* data)
@@ -122,8 +165,9 @@ bool pass_associators(Instance* instance, int, void* data)
 {
     Ref<Instance> owned(instance);
     auto& filter = *static_cast<Associator_Filter*>(data);
+    filter.tell_unwanted();
     if (!instance) return true;
-    std::puts("cimple _proc _enum_associator_names");
+    filter.tell();
     Array<Instance*> ends; // borrowed from the association
     get_associators(filter.source, instance, filter.result_class, filter.role, filter.result_role, ends);
     for (Instance* end : ends) {
@@ -155,7 +199,7 @@ int traverse_references(const CMPI_Adapter& adapter, const Instance* source, con
     int status = adapter.call(OP_ENUM_REFERENCES, adapter.provider, source, model, &role, proc, data);
     if (status != ENUM_REFERENCES_UNSUPPORTED) return status;
 
-    Reference_Filter filter{source, role, proc, data};
+    Reference_Filter filter(source, role, proc, data);
     status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, model, &pass_reference, &filter);
     proc(nullptr, 0, data);
     switch (status) {
@@ -179,7 +223,7 @@ int traverse_associators(const CMPI_Adapter& adapter, const Instance* source, co
     if (status != ENUM_ASSOCIATOR_NAMES_UNSUPPORTED) return status;
 
     Ref<Instance> model = keys_only_model(adapter);
-    Associator_Filter filter{source, result_class, role, result_role, proc, data};
+    Associator_Filter filter(source, result_class, role, result_role, proc, data);
     status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, model.get(), &pass_associators, &filter);
     proc(nullptr, 0, data);
     switch (status) {

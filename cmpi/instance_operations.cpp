@@ -2,6 +2,7 @@
 #include "cmpi/cmpi_data.h"
 #include "cmpi/operation.h"
 #include "cmpi/operations.h"
+#include "runtime/Selection.h"
 
 namespace cimple {
 
@@ -50,7 +51,10 @@ bool deliver_instance(Instance* instance, int, void* data)
 }
 
 // Keeps the first instance with the keys of a model.
-struct Search {
+struct Search : Selection {
+    explicit Search(const Instance* model) : Selection(this, Values::keys_of_ends), model(model) {}
+    const Instance* key() const override { return model; }
+
     const Instance* model;
     Ref<Instance> found;
 };
@@ -66,7 +70,7 @@ bool keep_match(Instance* instance, int, void* data)
 // For providers that can only enumerate.
 int get_by_enumeration(const CMPI_Adapter& adapter, const Instance* model, Ref<Instance>& found)
 {
-    Search search{model, Ref<Instance>()};
+    Search search(model);
     int status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, model, &keep_match, &search);
     if (status != ENUM_INSTANCES_OK || !search.found) return GET_INSTANCE_NOT_FOUND;
     found = std::move(search.found);
@@ -110,6 +114,7 @@ CMPIStatus enumerateInstanceNames(CMPIInstanceMI* mi, const CMPIContext* ctx, co
         nullify_properties(read, false, true, 1);
 
         Delivery delivery{adapter.broker, rslt, name_space_of(op), nullptr, 0};
+        const Selection names(&delivery, Selection::Values::keys);
         int status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, read, &deliver_name, &delivery);
         if (status == ENUM_INSTANCES_OK) return return_done(rslt);
         return enum_instances_codes.code(status);
@@ -128,6 +133,7 @@ CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* ctx, const 
         filter_properties(read, properties, true);
 
         Delivery delivery{adapter.broker, rslt, name_space_of(op), properties, 0};
+        const Selection instances(&delivery, Selection::Values::keys_of_ends); // references become paths
         int status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, read, &deliver_instance, &delivery);
         if (const Status_Row* failure = enum_instances_codes.find(status)) return failure->code;
         return return_done(rslt);

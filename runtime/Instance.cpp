@@ -110,8 +110,11 @@ Instance* create_record(const Meta_Record* record, bool defaults)
     return instance;
 }
 
-// What the bytes of a copied record do not carry. If it throws, the feature is not made.
-void clone_feature(Instance* instance, const Instance* source, const Meta_Feature* feature)
+using Clone = Instance* (*)(const Instance*);
+
+// What the bytes of a copied record do not carry; `clone_end` copies the end of a reference. If it throws, the feature
+// is not made.
+void clone_feature(Instance* instance, const Instance* source, const Meta_Feature* feature, Clone clone_end)
 {
     if (is_property(feature)) {
         const Meta_Property* property = as_property(feature);
@@ -126,7 +129,7 @@ void clone_feature(Instance* instance, const Instance* source, const Meta_Featur
     } else if (is_reference(feature)) {
         const Meta_Reference* reference = as_reference(feature);
         if (!reference->subscript) {
-            reference_of(instance, reference) = clone(reference_of(source, reference));
+            reference_of(instance, reference) = clone_end(reference_of(source, reference));
             return;
         }
         Owned_References clones(reference_array_of(source, reference));
@@ -158,6 +161,31 @@ void end_feature(Instance* instance, const Meta_Feature* feature) noexcept
     }
 }
 
+// A copy of the bytes and the namespace, of which `make(copy, source, feature)` makes each feature, or throws and does
+// not.
+template <class Make>
+Instance* clone_record(const Instance* source, Make make)
+{
+    if (!source) return nullptr;
+    const Meta_Record* record = record_of(source);
+    Instance* instance = new_head(record);
+    instance->__name_space = source->__name_space;
+    // The head has a count of its own, which other threads may be writing to in the source.
+    std::memcpy(feature_at(instance, sizeof(Instance)), feature_at(source, sizeof(Instance)),
+                record->size - sizeof(Instance));
+    std::size_t i = 0;
+    try {
+        for (; i < record->num_meta_features; ++i)
+            make(instance, source, record->meta_features[i]);
+    } catch (...) {
+        for (; i < record->num_meta_features; ++i)
+            make_empty(instance, record->meta_features[i]);
+        destroy(instance);
+        throw;
+    }
+    return instance;
+}
+
 } // namespace
 
 Instance* create(const Meta_Class* meta_class, bool defaults)
@@ -172,24 +200,29 @@ Instance* create(const Meta_Method* meta_method, bool defaults)
 
 Instance* clone(const Instance* source)
 {
-    if (!source) return nullptr;
-    const Meta_Record* record = record_of(source);
-    Instance* instance = new_head(record);
-    instance->__name_space = source->__name_space;
-    // The head has a count of its own, which other threads may be writing to in the source.
-    std::memcpy(feature_at(instance, sizeof(Instance)), feature_at(source, sizeof(Instance)),
-                record->size - sizeof(Instance));
-    std::size_t i = 0;
-    try {
-        for (; i < record->num_meta_features; ++i)
-            clone_feature(instance, source, record->meta_features[i]);
-    } catch (...) {
-        for (; i < record->num_meta_features; ++i)
-            make_empty(instance, record->meta_features[i]);
-        destroy(instance);
-        throw;
-    }
-    return instance;
+    return clone_record(source, [](Instance* instance, const Instance* from, const Meta_Feature* feature) {
+        clone_feature(instance, from, feature, &clone);
+    });
+}
+
+Instance* clone_keys(const Instance* source)
+{
+    return clone_record(source, [](Instance* instance, const Instance* from, const Meta_Feature* feature) {
+        if (is_key(feature)) return clone_feature(instance, from, feature, &clone_keys);
+        make_empty(instance, feature);
+        if (is_property(feature))
+            null_of(instance, as_property(feature)) = 1;
+        else if (is_reference(feature) && as_reference(feature)->subscript)
+            null_of(instance, as_reference(feature)) = 1;
+    });
+}
+
+Instance* clone_with_keys_of_ends(const Instance* source)
+{
+    return clone_record(source, [](Instance* instance, const Instance* from, const Meta_Feature* feature) {
+        constexpr uint32 embedded = META_FLAG_EMBEDDED_OBJECT | META_FLAG_EMBEDDED_INSTANCE;
+        clone_feature(instance, from, feature, feature->flags & embedded ? &clone : &clone_keys);
+    });
 }
 
 void destroy(Instance* instance)

@@ -39,6 +39,11 @@ Instance* create(const Meta_Method* meta_method, bool defaults);
 /// A deep copy, refs 1: it shares no instance with its source. Null gives null.
 Instance* clone(const Instance* instance);
 
+/// As clone, but with the keys alone, in the ends of references too: all other properties are null.
+Instance* clone_keys(const Instance* instance);
+/// As clone, but the ends of references, unless they are embedded, have their keys alone.
+Instance* clone_with_keys_of_ends(const Instance* instance);
+
 /// Destructs and frees, whatever `refs` says. Null is ignored.
 void destroy(Instance* instance);
 

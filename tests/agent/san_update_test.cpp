@@ -2,9 +2,11 @@
 
 #include <set>
 
+#include "classes/NVRHBA_StorageVolume.h"
 #include "inventory/NVR_Data.h"
 #include "inventory/Port.h"
 #include "inventory/Target.h"
+#include "runtime/Selection.h"
 #include "tests/agent/Other_Adapter.h"
 #include "tests/agent/expect_rows.h"
 
@@ -634,6 +636,57 @@ TEST_F(SANUpdate, WhatIsHandedOutIsTheCallersOwn)
     }
     EXPECT_EQ(end(path.get(), "LogicalUnit", "DeviceID"), id);
     EXPECT_EQ(end(path.get(), "Initiator", "Name"), first_wwpn);
+}
+
+// --- What a caller selects
+// ------------------------------------------------------------------------------------------------------------------
+
+TEST_F(SANUpdate, ASelectionByKeyIsTheOneInstance)
+{
+    refresh();
+    const Instances all = san(agent().m_NVRHBA_StorageVolume_map);
+    ASSERT_GT(all.size(), 1u);
+    struct By_Key : Selection {
+        By_Key(const void* data, const Instance* wanted) : Selection(data, Values::all), wanted(wanted) {}
+        const Instance* key() const override { return wanted; }
+        const Instance* wanted;
+    };
+    Instances found;
+    By_Key selection(&found, all[1].get());
+    enumerateSAN(agent(), agent().m_NVRHBA_StorageVolume_map, {collect, &found});
+    ASSERT_THAT(found, SizeIs(1));
+    EXPECT_TRUE(identical(found[0].get(), all[1].get()));
+
+    const Ref<Instance> stranger(clone(all[1].get()));
+    static_cast<NVRHBA_StorageVolume*>(stranger.get())->DeviceID.set("nobody's");
+    Instances none;
+    By_Key other(&none, stranger.get());
+    enumerateSAN(agent(), agent().m_NVRHBA_StorageVolume_map, {collect, &none});
+    EXPECT_THAT(none, SizeIs(0));
+}
+
+TEST_F(SANUpdate, ASelectionIsAskedForEachInOrderAndGetsItsOwnInTheirOrder)
+{
+    refresh();
+    const Instances all = san(agent().m_NVRHBA_StorageVolumeSystemDevice_map);
+    ASSERT_GT(all.size(), 1u);
+    struct All_But_The_First : Selection {
+        explicit All_But_The_First(const void* data) : Selection(data, Values::keys) {}
+        bool wants(const Instance*) override { return asked++ != 0; }
+        void asked_all() override { is_complete = true; }
+        std::size_t asked = 0;
+        bool is_complete = false;
+    };
+    Instances found;
+    All_But_The_First selection(&found);
+    enumerateSAN(agent(), agent().m_NVRHBA_StorageVolumeSystemDevice_map, {collect, &found});
+    EXPECT_EQ(selection.asked, all.size());
+    EXPECT_TRUE(selection.is_complete);
+    ASSERT_EQ(found.size() + 1, all.size());
+    for (std::size_t i = 0; i < found.size(); i++) {
+        EXPECT_TRUE(key_eq(found[i].get(), all[i + 1].get()));
+        EXPECT_EQ(end(found[i].get(), "PartComponent", "Description"), "null") << "the keys are all that is looked at";
+    }
 }
 
 TEST_F(SANUpdate, AnAssociationOutlivesTheMapsOfItsEnds)

@@ -1,4 +1,5 @@
 // Associations that the bridge computes from the enumeration of an association class.
+#include "runtime/Selection.h"
 #include "tests/cmpi/Bridge_Test.h"
 
 namespace cimple {
@@ -241,6 +242,57 @@ TEST_F(Associations, TheTraversalTalksOnStandardOutput)
     testing::internal::CaptureStdout();
     associators(none);
     EXPECT_EQ(testing::internal::GetCapturedStdout().find("TEST_Base\n{\n"), 0u);
+}
+
+namespace {
+
+/// Hands out what the caller selected, as a provider that looks does.
+int enumerate_selected(const std::vector<Instance*>& all, void** words)
+{
+    const Enum_Handler handler{reinterpret_cast<Enum_Handler_Proc>(words[2]), words[3]};
+    Selection* selection = Selection::of(handler);
+    std::vector<Instance*> wanted;
+    for (Instance* instance : all) {
+        if (selection && !selection->wants(instance))
+            unref(instance);
+        else
+            wanted.push_back(instance);
+    }
+    if (selection) selection->asked_all();
+    for (Instance* instance : wanted)
+        handler.handle(instance);
+    handler.proc(nullptr, 0, handler.data);
+    return 0;
+}
+
+} // namespace
+
+TEST_F(Associations, AProviderThatHeedsTheSelectionChangesNothing)
+{
+    const auto all_answers = [&] {
+        std::string all;
+        testing::internal::CaptureStdout();
+        for (const fake::Path& source : {one, p2, none}) {
+            associator_names(source);
+            for (const std::string& id : ids())
+                all += id + ' ';
+            reference_names(source);
+            all += std::to_string(returned().paths.size()) + ' ';
+            references(source);
+            all += std::to_string(returned().instances.size()) + '\n';
+            returned() = {};
+        }
+        return all + testing::internal::GetCapturedStdout();
+    };
+    const std::string before = all_answers();
+    EXPECT_THAT(before, HasSubstr("p1 p2 2 2\none two 2 2\n0 0\ncimple"));
+    int enumerations = 0;
+    provider.on[OP_ENUM_INSTANCES] = [&](void** words) {
+        enumerations++;
+        return enumerate_selected(provider.instances(), words);
+    };
+    EXPECT_EQ(all_answers(), before);
+    EXPECT_EQ(enumerations, 9);
 }
 
 // Both ends have the same class, so that either may hold the source.

@@ -122,6 +122,53 @@ TEST(InstanceClone, EveryFeatureIsEqualAndNoInstanceIsShared)
     EXPECT_NE(copy->Texts.value.begin(), thing->Texts.value.begin()) << "arrays are not";
 }
 
+TEST(InstanceClone, OfTheKeysAloneHasNothingElse)
+{
+    const Thing thing(make_full_thing());
+    const Thing copy(static_cast<Test_Thing*>(clone_keys(thing.get())));
+    EXPECT_TRUE(key_eq(thing.get(), copy.get()));
+    EXPECT_EQ(copy->__name_space, thing->__name_space);
+    EXPECT_EQ(copy->refs, 1u);
+    EXPECT_EQ(copy->Text.null, 1);
+    EXPECT_TRUE(copy->Text.value.empty());
+    EXPECT_EQ(copy->Texts.null, 1);
+    EXPECT_EQ(copy->Texts.value.size(), 0u);
+    EXPECT_EQ(copy->Uint64.null, 1);
+    EXPECT_EQ(copy->Peers.null, 1);
+    EXPECT_EQ(copy->Peers.value.size(), 0u);
+    EXPECT_EQ(copy->Peer, nullptr);
+    EXPECT_EQ(copy->Inside, nullptr);
+    EXPECT_EQ(clone_keys(nullptr), nullptr);
+}
+
+TEST(InstanceClone, OfTheKeysOfAnAssociationReachesTheKeysOfItsEnds)
+{
+    const Ref<Test_Link> link(create_as<Test_Link>());
+    link->Left = make_keyed("a", 1);
+    link->Right = make_full_thing();
+    link->Word.set("word");
+    const Ref<Instance> keys(clone_keys(link.get()));
+    const Ref<Instance> whole(clone_with_keys_of_ends(link.get()));
+    for (const auto* copy : {static_cast<Test_Link*>(keys.get()), static_cast<Test_Link*>(whole.get())}) {
+        EXPECT_TRUE(key_eq(link.get(), copy));
+        EXPECT_NE(copy->Left, link->Left);
+        EXPECT_EQ(copy->Right->Text.null, 1);
+    }
+    EXPECT_EQ(static_cast<Test_Link*>(keys.get())->Word.null, 1);
+    EXPECT_EQ(static_cast<Test_Link*>(whole.get())->Word.value, "word");
+    EXPECT_EQ(clone_with_keys_of_ends(nullptr), nullptr);
+}
+
+TEST(InstanceClone, WithKeysOfEndsKeepsWhatIsEmbeddedWhole)
+{
+    const Thing thing(make_full_thing());
+    const Thing copy(static_cast<Test_Thing*>(clone_with_keys_of_ends(thing.get())));
+    EXPECT_TRUE(identical(copy->Inside, thing->Inside));
+    EXPECT_NE(copy->Inside, thing->Inside);
+    EXPECT_TRUE(key_eq(thing->Peer, copy->Peer));
+    EXPECT_EQ(copy->Texts.value, thing->Texts.value);
+}
+
 TEST(InstanceClone, ANullElementOfAReferenceArrayStaysNull)
 {
     const Thing thing(make_full_thing());
