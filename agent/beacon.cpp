@@ -57,4 +57,17 @@ uint32 GetBeaconState(const char* wwpn, uint16* indicator)
     return 0;
 }
 
+uint32 SetBeaconState(const HBA_WWN& port, uint16 indicator)
+{
+    NVR_LOG("NVR_DiagTestFunc::SetBeaconState");
+    for (const State_Row& row : states) {
+        if (row.indicator != indicator) continue;
+        if (RM_DiagBeacon(port, row.state) != RM_STATUS_OK)
+            NVR_LOG("Failed to set the beacon state to %d ", static_cast<int>(row.state));
+        NVR_LOG("Successfully set the beacon state");
+        return 0;
+    }
+    return bad_argument;
+}
+
 } // namespace cimple

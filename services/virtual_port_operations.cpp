@@ -1,16 +1,14 @@
 // What the management library tells about the virtual ports of a port.
 #include "services/NVR_MethodWrapper.h"
 
-#include <algorithm>
 #include <cstdio>
-#include <cstring>
-#include <new>
 
 #include "foundation/AttributeBlock.h"
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
 #include "foundation/management_binding.h"
 #include "foundation/shared_operations.h"
+#include "services/Counted_List.h"
 
 namespace cimple {
 
@@ -22,61 +20,6 @@ constexpr int status_null = 4;
 // No more are asked for, whatever the library reports.
 constexpr uint32 most_targets = 65536;
 constexpr uint32 most_machines = 4096;
-
-/// A list as the library fills it: a count word, `head` bytes up to its records, and room for some of them.
-class Counted_List {
-public:
-    Counted_List(std::size_t head, std::size_t record) : m_head(head), m_record(record) {}
-
-    /// Asks with room for one record, and once more, with as much as the library then says, after status 7; `most`
-    /// bounds that. False without memory.
-    template <class Ask>
-    bool fill(uint32 most, Ask ask)
-    {
-        if (!give(1)) return false;
-        status = ask(m_bytes.data());
-        if (status != RM_STATUS_MORE_DATA) return true;
-        if (!give(std::min(count(), most))) return false;
-        status = ask(m_bytes.data());
-        return true;
-    }
-
-    uint32 status = RM_STATUS_ERROR;
-
-    /// As the library left it.
-    uint32 count() const
-    {
-        uint32 count = 0;
-        std::memcpy(&count, m_bytes.data(), sizeof count);
-        return count;
-    }
-    /// The records that were counted and had room.
-    template <class Record>
-    std::vector<Record> records() const
-    {
-        std::vector<Record> all(std::min(count(), m_room));
-        if (!all.empty()) std::memcpy(all.data(), m_bytes.data() + m_head, all.size() * sizeof(Record));
-        return all;
-    }
-
-private:
-    bool give(uint32 room)
-    {
-        try {
-            m_bytes.assign(m_head + m_record * room, 0);
-        } catch (const std::bad_alloc&) {
-            return false;
-        }
-        m_room = room;
-        std::memcpy(m_bytes.data(), &room, sizeof room);
-        return true;
-    }
-
-    const std::size_t m_head;
-    const std::size_t m_record;
-    uint32 m_room = 0;
-    std::vector<unsigned char> m_bytes;
-};
 
 void logVPortFailure(uint32 status)
 {

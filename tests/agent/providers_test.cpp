@@ -154,7 +154,7 @@ TEST_F(Providers, PortsShowTheirLiveStatus)
     advance_clock(10 * second);
     EXPECT_EQ(value(enumerate(provider)[0].get(), "StatusDescriptions"), "{Stopped}");
     EXPECT_THAT(words(), Contains("NVRHBA_FCPort_Provider::enum_instances()"));
-    EXPECT_EQ(provider.modify_instance(nullptr, nullptr), 101);
+    EXPECT_EQ(provider.modify_instance(nullptr, nullptr), 102);
 }
 
 TEST_F(Providers, ProfilesAreThereBeforeAnyRefresh)

@@ -4,10 +4,11 @@
 
 namespace nvrtest {
 
-std::vector<Trace_Line> trace_file_lines(const std::string& path)
+std::vector<Trace_Line> trace_file_lines(const std::string& path, std::streamoff from)
 {
     std::vector<Trace_Line> lines;
     std::ifstream file(path);
+    file.seekg(from);
     for (std::string line; std::getline(file, line);) {
         if (line.rfind("[threadid =", 0) != 0) {
             if (!lines.empty()) lines.back().words += "\n" + line;

@@ -5,6 +5,7 @@
 /// For all words of a trace use testing::ElementsAre, for a missing one testing::Not(testing::Contains(...)).
 #pragma once
 
+#include <ios>
 #include <ostream>
 #include <string>
 #include <vector>
@@ -18,8 +19,9 @@ struct Trace_Line {
     std::string words;
 };
 
-/// The messages of a trace file, in order, with the thread that logged each. A message of several lines is one.
-std::vector<Trace_Line> trace_file_lines(const std::string& path);
+/// The messages of a trace file from that byte on, in order, with the thread that logged each. A message of several
+/// lines is one.
+std::vector<Trace_Line> trace_file_lines(const std::string& path, std::streamoff from = 0);
 
 /// The messages of a trace file, in order, without thread, time, file and level. A message of several lines is one.
 std::vector<std::string> trace_file_words(const std::string& path);

@@ -164,11 +164,14 @@ std::vector<std::string> Rig::words() const
     return words;
 }
 
-std::vector<Trace_Line> Rig::lines() const
+std::streamoff Rig::log_size() const
 {
-    std::vector<Trace_Line> lines = trace_file_lines(m_trace_path);
-    lines.erase(lines.begin(), lines.begin() + static_cast<std::ptrdiff_t>(m_forgotten));
-    return lines;
+    return std::ifstream(m_trace_path, std::ios::ate).tellg();
+}
+
+std::vector<Trace_Line> Rig::lines_from(std::streamoff size) const
+{
+    return trace_file_lines(m_trace_path, size);
 }
 
 void Rig::forget_words()

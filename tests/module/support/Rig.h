@@ -69,9 +69,10 @@ public:
 
     /// The words of the module's log so far, or since the last forget_words().
     std::vector<std::string> words() const;
-    /// The same with the threads that logged them.
-    std::vector<Trace_Line> lines() const;
     void forget_words();
+    /// Bytes of the log so far, and its words behind so many with the threads that logged them.
+    std::streamoff log_size() const;
+    std::vector<Trace_Line> lines_from(std::streamoff size) const;
     /// How many of them are this one.
     std::size_t count_words(const std::string& word) const;
 

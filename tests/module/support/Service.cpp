@@ -8,12 +8,10 @@
 
 namespace nvrtest {
 
-const std::string gate = "(gate)";
-const std::string gate_refreshing = "(gate: a refresh was started)";
-const std::string gate_running = "(gate: a refresh runs)";
-
 namespace {
 
+// A refresh asks the server for profiles, and a server with pooled threads may take the one that has just become free.
+constexpr char up_call[] = "NVRHBA_RegisteredProfile_Provider::enum_instances()";
 constexpr char gate_begin[] = "PERF: ---BuildCimpleInfo BEGIN---";
 
 bool starts_with(const std::string& text, const char* start)
@@ -30,12 +28,14 @@ std::string gate_that_ends_with(const std::string& line)
     return {};
 }
 
+// As Id2HBAName writes it: a text that is too short ends behind its last character, or behind the colon there.
 std::string with_colons(const std::string& digits)
 {
     std::string text;
-    for (std::size_t i = 0; i < digits.size() && text.size() < 23; i++) {
-        if (text.size() % 3 == 2) text += ':';
-        text += digits[i];
+    for (char digit : digits) {
+        if (text.size() == 23) break;
+        text += digit;
+        if (text.size() % 3 == 2 && text.size() != 23) text += ':';
     }
     return text;
 }
@@ -70,6 +70,15 @@ Service::Service(Rig& rig, const std::string& class_name, const std::string& nam
     throw std::runtime_error("there is no service " + class_name + ' ' + name + ": " + names.status.message);
 }
 
+Service::~Service()
+{
+    try {
+        m_rig.settle();
+    } catch (const std::runtime_error& error) {
+        ADD_FAILURE() << error.what();
+    }
+}
+
 Called Service::call(const std::string& method, const Arguments& arguments)
 {
     return call_on(m_path, method, arguments);
@@ -78,12 +87,10 @@ Called Service::call(const std::string& method, const Arguments& arguments)
 Called Service::call_on(const host::Path& path, const std::string& method, const Arguments& arguments)
 {
     m_rig.settle();
-    const std::size_t before = m_rig.lines().size();
+    const std::streamoff before = m_rig.log_size();
     Called called;
     called.answer = m_rig.server().call(path, method, arguments);
-    std::vector<Trace_Line> lines = m_rig.lines();
-    lines.erase(lines.begin(), lines.begin() + static_cast<std::ptrdiff_t>(before));
-    called.words = words_of_thread(lines);
+    called.words = words_of_thread(m_rig.lines_from(before));
     return called;
 }
 
@@ -121,7 +128,8 @@ Words words_of_thread(const std::vector<Trace_Line>& lines)
     Words words;
     bool in_gate = false;
     for (const Trace_Line& line : lines) {
-        if (line.thread != lines.front().thread || starts_with(line.words, "ProviderAgent::addRef[")) continue;
+        if (line.thread != lines.front().thread || line.words == up_call) continue;
+        if (starts_with(line.words, "ProviderAgent::addRef[")) continue;
         if (line.words == gate_begin) in_gate = true;
         if (!in_gate) {
             words.push_back(line.words);

@@ -42,6 +42,10 @@ class Service {
 public:
     /// The service's instance, the first one or the one with that key "Name". Throws std::runtime_error without one.
     Service(Rig& rig, const std::string& class_name, const std::string& name = {});
+    /// Waits for what its calls have started.
+    ~Service();
+    Service(const Service&) = delete;
+    Service& operator=(const Service&) = delete;
 
     /// Calls when no refresh runs. One that the call starts may still run at its end.
     Called call(const std::string& method, const Arguments& arguments = {});
@@ -71,11 +75,12 @@ constexpr char second_port[] = "10000000C9A00002";
 
 // ---- Words. The passage through the refresh gate is one word in the lists, as are the waits behind it.
 
-extern const std::string gate;            ///< no refresh was needed
-extern const std::string gate_refreshing; ///< a refresh was started
-extern const std::string gate_running;    ///< one ran already
+constexpr char gate[] = "(gate)";                                   ///< no refresh was needed
+constexpr char gate_refreshing[] = "(gate: a refresh was started)"; ///< there was need, or one was asked for
+constexpr char gate_running[] = "(gate: a refresh runs)";           ///< and it ran already
 
-/// The words of the thread that logged first; gates as above, and without what loading a provider says.
+/// The words of the thread that logged first; gates as above, and without what loading a provider and the up-calls of
+/// a refresh say.
 Words words_of_thread(const std::vector<Trace_Line>& lines);
 
 Words joined(const std::vector<Words>& parts);

@@ -78,6 +78,18 @@ std::uint64_t calls(const std::string& operation)
     return nvrsim_calls(operation.c_str());
 }
 
+void set_port(unsigned number, const std::string& name, std::uint64_t value)
+{
+    if (nvrsim_set(std::to_string(number).c_str(), name.c_str(), value) != 0) fail();
+}
+
+std::string port_value(unsigned number, const std::string& name)
+{
+    return text_of([&](char* buffer, std::size_t size) {
+        return nvrsim_get(std::to_string(number).c_str(), name.c_str(), buffer, size);
+    });
+}
+
 void compose_libraries(const std::vector<std::string>& present)
 {
     compose_from(NVR_SIMULATOR_LIB_DIR, present);

@@ -20,6 +20,10 @@ std::uint64_t fault_hits();
 
 std::uint64_t calls(const std::string& operation);
 
+/// A value of a port, by its number over the host, as nvrsim_set and nvrsim_get name them.
+void set_port(unsigned number, const std::string& name, std::uint64_t value);
+std::string port_value(unsigned number, const std::string& name);
+
 /// Puts links to these simulated libraries ("HBAAPI", "lrmapi", "rmapi", "tssdm") into the folder that the loader
 /// searches first, and in the places of the others files that no loader takes. Libraries that are open stay.
 void compose_libraries(const std::vector<std::string>& present);
