@@ -1,4 +1,5 @@
 #include "generator/Emit.h"
+#include "generator/Entry_Kinds.h"
 
 #include <set>
 
@@ -10,33 +11,6 @@ constexpr const char* module_name = "norvane_fc_provider_Module";
 constexpr const char* proc_parameters = "(const Registration*, int code, void* arg0, void* arg1, void* arg2, void* "
                                         "arg3, void* arg4, void* arg5, void* arg6, "
                                         "void* arg7)";
-
-enum class Class_Kind { plain, association, indication };
-
-Class_Kind kind_of(const mof::Class& target)
-{
-    const std::uint32_t flags = class_flags(target);
-    if (flags & (1u << 7)) return Class_Kind::association;
-    return flags & (1u << 19) ? Class_Kind::indication : Class_Kind::plain;
-}
-
-/// The MI kinds that a class exports: word in the factory's name, and letter for the bridge.
-struct Entry_Kind {
-    const char* word;
-    char letter;
-};
-
-std::vector<Entry_Kind> entries_of(const mof::Class& target)
-{
-    switch (kind_of(target)) {
-    case Class_Kind::association:
-        return {{"Instance", 'I'}, {"Method", 'M'}, {"Association", 'A'}};
-    case Class_Kind::indication:
-        return {{"Indication", 'N'}, {"Method", 'M'}};
-    default:
-        return {{"Instance", 'I'}, {"Method", 'M'}};
-    }
-}
 
 bool has_inherited_methods(const mof::Class& target)
 {

@@ -183,6 +183,15 @@ void Repository::link_supers()
     }
 }
 
+/// What a bare boolean qualifier says.
+static Value truth()
+{
+    Literal literal;
+    literal.kind = Literal::Kind::boolean;
+    literal.boolean = true;
+    return {false, {literal}};
+}
+
 void Repository::check_qualifiers(Qualifiers& qualifiers)
 {
     for (auto& qualifier : qualifiers) {
@@ -193,7 +202,7 @@ void Repository::check_qualifiers(Qualifiers& qualifiers)
             continue;
         }
         if (qualifier.value.items.empty() && !qualifier.value.is_array) {
-            if (declared->type != Type::boolean) qualifier.value = declared->default_value;
+            qualifier.value = declared->type == Type::boolean ? truth() : declared->default_value;
             continue;
         }
         if (qualifier.value.is_array != declared->is_array) {

@@ -62,6 +62,8 @@ public:
     const std::vector<const Class*>& classes() const { return order_; }
     /// Classes whose superclass is `name`, in the order of their declaration.
     std::vector<const Class*> subclasses(std::string_view name) const;
+    /// All qualifier declarations, in their order.
+    const std::deque<Qualifier_Declaration>& qualifiers() const { return qualifiers_; }
     /// The qualifier declaration of that name, or null.
     const Qualifier_Declaration* find_qualifier(std::string_view name) const;
 

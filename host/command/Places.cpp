@@ -44,10 +44,15 @@ Places find_places(const std::string& folder)
     Places places;
     // A build tree has <build>/host/nvrcim, <build>/lib and <build>/simulator below the sources; an installation has
     // bin, lib and share side by side.
-    places.module = first_that_exists({here / "../lib" / module_file, here / "../lib/x86_64-linux-gnu" / module_file,
-                                       here / "../lib64" / module_file, here / "../lib/cmpi" / module_file});
+    std::vector<fs::path> modules = {here / "../lib" / module_file};
+    std::vector<fs::path> simulators = {here / "../simulator/lib"};
+    for (const char* lib : {"../lib", "../lib/x86_64-linux-gnu", "../lib64"}) {
+        modules.push_back(here / lib / "cmpi" / module_file);
+        simulators.push_back(here / lib / "norvane-fc-provider/simulator");
+    }
+    places.module = first_that_exists(modules);
     places.mof = first_that_exists({here / "../../../classes/mof", here / "../share/norvane-fc-provider/mof"});
-    places.simulator = first_that_exists({here / "../simulator/lib", here / "../lib/norvane-fc-provider/simulator"});
+    places.simulator = first_that_exists(simulators);
     return places;
 }
 
