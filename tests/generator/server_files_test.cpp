@@ -102,11 +102,14 @@ void expect_same_class(const mof::Class& read, const cimple::Meta_Class& record)
 /// The classes that an element needs before it, but for ends of associations.
 void expect_declared_before(const mof::Class& target, const std::set<std::string>& seen)
 {
-    if (!target.super_name.empty()) EXPECT_EQ(seen.count(target.super_name), 1u) << target.name;
+    if (!target.super_name.empty()) {
+        EXPECT_EQ(seen.count(target.super_name), 1u) << target.name;
+    }
     for (const auto& feature : target.declared)
         for (const mof::Parameter& parameter : feature->parameters)
-            if (parameter.type == mof::Type::reference)
+            if (parameter.type == mof::Type::reference) {
                 EXPECT_EQ(seen.count(parameter.target), 1u) << target.name << "." << feature->name;
+            }
 }
 
 } // namespace
