@@ -201,13 +201,7 @@ public:
 
     Driver_Log_Store m_driverLogStore;
 
-    // Link alerts: constructed here, used by the alert provider alone.
-    Mutex m_IndicationSignalMutex{false};
-    std::atomic<bool> m_bIndicationCleanUp{false};
-    Cond m_IndicationSignalCond;
-    Thread m_IndicationThread;
-    std::vector<HBA_CALLBACKHANDLE> m_callbackHandles;
-    uint32 m_indicationSequence = 0;
+    uint32 m_indicationSequence = 0; // number of the next link alert
 
     // Management services and driver parameters.
     Map<struct NVRHBA_SoftwareInstallationService> m_NVRHBA_SoftwareInstallationService_map;

@@ -21,7 +21,7 @@
 ///
 /// and an indication, besides load and unload, only
 ///
-///     Enable_Indications_Status    enable_indications(Indication_Handler* handler);  // keeps it, deletes it later
+///     Enable_Indications_Status    enable_indications(std::unique_ptr<Indication_Handler> handler);
 ///     Disable_Indications_Status   disable_indications();
 ///
 /// Each method M of C, inherited ones too, is a member too: the target, a reference to each field of the method record
@@ -39,6 +39,7 @@
 #pragma once
 
 #include <cstddef>
+#include <memory>
 
 #include "runtime/Registration.h"
 #include "runtime/String.h"
@@ -192,8 +193,8 @@ int indication_proc(int code, const Proc_Arguments& arguments)
 {
     switch (code) {
     case OP_ENABLE_INDICATIONS:
-        return arguments.pointer<Provider>(0)->enable_indications(
-            new Indication_Handler{reinterpret_cast<Indication_Handler_Proc>(arguments.words[1]), arguments.words[2]});
+        return arguments.pointer<Provider>(0)->enable_indications(std::make_unique<Indication_Handler>(
+            Indication_Handler{reinterpret_cast<Indication_Handler_Proc>(arguments.words[1]), arguments.words[2]}));
     case OP_DISABLE_INDICATIONS:
         return arguments.pointer<Provider>(0)->disable_indications();
     default:

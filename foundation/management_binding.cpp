@@ -11,6 +11,8 @@ namespace {
 
 std::atomic<void*> slots[number_of_slots];
 
+std::atomic<bool> keptMapped{false};
+
 std::atomic<bool> hbaApiMissing{false};
 std::atomic<bool> lrmApiMissing{false};
 std::atomic<bool> rmApiMissing{false};
@@ -119,9 +121,10 @@ NVR_CPQFC_OPERATIONS(NVR_DEFINE_CPQFC)
 
 int unloadLibraries()
 {
-    if (slots[SLOT_HBAAPI]) call_if_there("HBA_FreeLibrary");
+    const bool kept = keptMapped;
+    if (slots[SLOT_HBAAPI] && !kept) call_if_there("HBA_FreeLibrary");
     for (std::atomic<void*>& slot : slots)
-        if (void* library = slot.exchange(nullptr)) ::dlclose(library);
+        if (void* library = slot.exchange(nullptr); library && !kept) ::dlclose(library);
 #define NVR_FORGET(result, name, missing, parameters, arguments) name.m_symbol = nullptr;
     NVR_MANAGEMENT_OPERATIONS(NVR_FORGET)
     NVR_PLAIN_MANAGEMENT_OPERATIONS(NVR_FORGET)
@@ -130,6 +133,11 @@ int unloadLibraries()
 #undef NVR_FORGET
     hbaApiMissing = lrmApiMissing = rmApiMissing = sdmMissing = false;
     return 0;
+}
+
+void keepLibrariesMapped(bool keep)
+{
+    keptMapped = keep;
 }
 
 StatusText::StatusText(uint32 status)

@@ -28,6 +28,10 @@ int loadLibraries();
 /// operation may be running. Result 0.
 int unloadLibraries();
 
+/// While `keep` is in force, unloadLibraries forgets the libraries but leaves them in the process, for one of them that
+/// may still call back. False at the start.
+void keepLibrariesMapped(bool keep);
+
 /// Which libraries a name is looked up in, and under which names.
 enum class Family {
     management,       ///< LRM_x in lrmapi; in its stead LRM_x, then RM_x in rmapi

@@ -1,6 +1,47 @@
 #include "logs/NVRHBA_AlertIndication_Provider.h"
 
+#include "agent/guarded.h"
+#include "foundation/CLogger.h"
+#include "foundation/NVR_Common.h"
+#include "logs/Alert_Queue.h"
+#include "logs/alert_callbacks.h"
+#include "logs/alert_instance.h"
+#include "runtime/Thread_Context.h"
+
 namespace cimple {
+
+namespace {
+
+/// Held through each enabling and each clean-up, also while the latter waits for the worker. Before
+/// m_IndicationProviderMutex.
+Mutex change_mutex(false);
+
+Mutex m_IndicationProviderMutex(false);
+
+/// The worker's hold of m_IndicationProviderMutex, with its words.
+class Spoken_Lock {
+public:
+    Spoken_Lock()
+    {
+        NVR_LOG("Waiting for m_IndicationProviderMutex lock...");
+        m_IndicationProviderMutex.lock();
+        NVR_LOG("m_IndicationProviderMutex lock acquired");
+    }
+    ~Spoken_Lock()
+    {
+        m_IndicationProviderMutex.unlock();
+        NVR_LOG("m_IndicationProviderMutex lock released");
+    }
+    Spoken_Lock(const Spoken_Lock&) = delete;
+    Spoken_Lock& operator=(const Spoken_Lock&) = delete;
+};
+
+bool same(const Indication_Handler& a, const Indication_Handler& b)
+{
+    return a.proc == b.proc && a.data == b.data;
+}
+
+} // namespace
 
 Load_Status NVRHBA_AlertIndication_Provider::load()
 {
@@ -9,18 +50,131 @@ Load_Status NVRHBA_AlertIndication_Provider::load()
 
 Unload_Status NVRHBA_AlertIndication_Provider::unload()
 {
-    return static_cast<Unload_Status>(ProviderAgent::unload());
+    const uint32 result = cleanUp();
+    {
+        Auto_Mutex lock(m_IndicationProviderMutex);
+        retryRemovals();
+    }
+    ProviderAgent::releaseRef();
+    return result == 0 ? UNLOAD_OK : UNLOAD_FAILED;
 }
 
-Enable_Indications_Status NVRHBA_AlertIndication_Provider::enable_indications(Indication_Handler* handler)
+Enable_Indications_Status
+NVRHBA_AlertIndication_Provider::enable_indications(std::unique_ptr<Indication_Handler> handler)
 {
-    delete handler;
-    return ENABLE_INDICATIONS_FAILED;
+    Auto_Mutex change(change_mutex);
+    Auto_Mutex lock(m_IndicationProviderMutex);
+    NVR_LOG("NVRHBA_AlertIndication_Provider::enable_indications()");
+    if (const Indication_Handler* in_use = _indication_handler)
+        return same(*in_use, *handler) ? ENABLE_INDICATIONS_OK : ENABLE_INDICATIONS_FAILED;
+    m_agent = ProviderAgent::GetInstance();
+    _indication_handler = handler.get();
+    Alert_Queue::instance().open();
+    if (Thread::create_attached(m_IndicationThread, &providerThreadProc, this) != 0) {
+        Alert_Queue::instance().close();
+        _indication_handler = nullptr;
+        return ENABLE_INDICATIONS_FAILED;
+    }
+    handler.release();
+    m_agent->BuildCimpleInfo();
+    return setHBACallbacks(true) == 0 ? ENABLE_INDICATIONS_OK : ENABLE_INDICATIONS_FAILED;
 }
 
 Disable_Indications_Status NVRHBA_AlertIndication_Provider::disable_indications()
 {
-    return DISABLE_INDICATIONS_OK;
+    NVR_LOG("NVRHBA_AlertIndication_Provider::disable_indications()");
+    return cleanUp() == 0 ? DISABLE_INDICATIONS_OK : DISABLE_INDICATIONS_FAILED;
+}
+
+void NVRHBA_AlertIndication_Provider::hbaThreadProc(void*, HBA_WWN portWWN, HBA_UINT32 eventType,
+                                                    HBA_UINT32 fabricPortID)
+{
+    NVR_LOG("NVRHBA_AlertIndication_Provider::hbaThreadProc");
+    NVR_LOG("For link event, type= 0x%x fabricPortID= 0x%d, eventType std::string is %s .", eventType,
+            static_cast<int>(fabricPortID), port_event(eventType).log_text);
+    if (eventType != HBA_EVENT_PORT_OFFLINE && eventType != HBA_EVENT_PORT_ONLINE) {
+        NVR_LOG("Could not generate the indication as the event type is not supported");
+        return;
+    }
+    Alert_Queue::instance().push({portWWN, eventType, fabricPortID});
+}
+
+void* NVRHBA_AlertIndication_Provider::providerThreadProc(void* data)
+{
+    NVR_LOG("NVRHBA_AlertIndication_Provider::providerThreadProc()");
+    auto* provider = static_cast<NVRHBA_AlertIndication_Provider*>(data);
+    if (!provider) {
+        NVR_LOG("Error in converting the pointer to NVRHBA_AlertIndication_Provider");
+        return nullptr;
+    }
+    while (provider->_indication_handler) {
+        indication_data record;
+        if (!Alert_Queue::instance().pop(record)) {
+            NVR_LOG("NVRHBA_AlertIndication_Provider::providerThreadProc() Received signal from cleanup()");
+            break;
+        }
+        NVR_LOG("Popped from Queue: IndicationType 0x%x", record.eventType);
+        guarded([&] { provider->generateIndication(record.portWWN, record.eventType); });
+    }
+    NVR_LOG("NVRHBA_AlertIndication_Provider::providerThreadProc() finished");
+    return nullptr;
+}
+
+uint32 NVRHBA_AlertIndication_Provider::generateIndication(HBA_WWN portWWN, uint32 eventType)
+{
+    NVR_LOG("NVRHBA_AlertIndication_Provider::generateIndication");
+    {
+        const Spoken_Lock lock;
+        if (!_indication_handler) {
+            NVR_LOG("Indication Handler is not passed properly");
+            return NVR_FAILURE;
+        }
+    }
+    Ref<NVRHBA_AlertIndication> alert = makeAlert(*m_agent, portWWN, eventType);
+    if (!alert) return NVR_FAILURE;
+    const Spoken_Lock lock;
+    const Indication_Handler* handler = _indication_handler;
+    // A thread whose context could not be set up has no way to the server.
+    if (handler && !Alert_Queue::instance().isCleanUp() && Thread_Context::top()) {
+        NVR_LOG("Calling Indication handler to deliver Indication to the specified client");
+        handler->handle(alert.release());
+        NVR_LOG("Indication Delivered to the specified client");
+    } else {
+        NVR_LOG("Error: Failed to deliver indication as the indication handler is 0 or cleanUp signalled !");
+    }
+    return 0;
+}
+
+uint32 NVRHBA_AlertIndication_Provider::cleanUp()
+{
+    NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp()");
+    Auto_Mutex change(change_mutex);
+    uint32 result;
+    {
+        Auto_Mutex lock(m_IndicationProviderMutex);
+        if (!_indication_handler) {
+            NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp() Nothing to cleanUp, Exiting...");
+            return 0;
+        }
+        result = setHBACallbacks(false);
+        Alert_Queue::instance().close();
+        NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp():: Worker thread signalled for cancellation.");
+    }
+    NVR_LOG("Waiting for Worker thread termination...");
+    void* ignored = nullptr;
+    Thread::join(m_IndicationThread, ignored);
+    NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp():: Worker thread terminated successfully");
+
+    Auto_Mutex lock(m_IndicationProviderMutex);
+    const std::unique_ptr<Indication_Handler> handler(_indication_handler.exchange(nullptr));
+    if (!handler) {
+        NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp() Nothing to cleanUp at this moment, Exiting...");
+        return 0;
+    }
+    handler->handle(nullptr); // the stop word
+    NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp():: _indication_handler deleted.");
+    NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp() finished");
+    return result;
 }
 
 } // namespace cimple

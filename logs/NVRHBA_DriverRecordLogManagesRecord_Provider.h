@@ -1,4 +1,4 @@
-/// The provider of the ties between the driver's log and its lines. It has none to hand out.
+/// The provider of the ties between the driver's log and its lines.
 #pragma once
 
 #include "agent/Read_Only_Provider.h"

@@ -1,4 +1,4 @@
-/// The provider of the lines of the driver's log. It has none to hand out.
+/// The provider of the lines of the driver's log.
 #pragma once
 
 #include "agent/Read_Only_Provider.h"

@@ -1,4 +1,4 @@
-/// The provider of the records of the provider's log. It has none to hand out.
+/// The provider of the records of the provider's log.
 #pragma once
 
 #include "agent/Read_Only_Provider.h"

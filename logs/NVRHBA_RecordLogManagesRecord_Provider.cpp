@@ -1,11 +1,28 @@
 #include "logs/NVRHBA_RecordLogManagesRecord_Provider.h"
 
+#include "foundation/CLogger.h"
+#include "logs/log_records.h"
+#include "logs/record_walk.h"
+
 namespace cimple {
 
 Enum_Instances_Status NVRHBA_RecordLogManagesRecord_Provider::enum_instances(const NVRHBA_RecordLogManagesRecord*,
-                                                                             const Enum_Handler&)
+                                                                             const Enum_Handler& handler)
 {
-    return ENUM_INSTANCES_OK;
+    static constexpr Record_Walk walk = {
+        NVRHBA_RecordLogManagesRecord::meta,
+        Record_Log::provider,
+        "logs/NVRHBA_RecordLogManagesRecord_Provider.cpp",
+        [](const Log_Records& records, std::size_t position, const NVRHBA_RecordLog* log) {
+            return makeManagesRecord<NVRHBA_RecordLogManagesRecord>(
+                log, makeLogEntry(records.entries[position], position, log));
+        },
+        [] { NVR_LOG("Entering NVRHBA_RecordLogManagesRecord::enum_instances"); },
+        [](int position) { NVR_LOG("NVRHBA_RecordLogManagesRecord returned instance %d", position); },
+        [] { NVR_LOG("Could not create NVRVCNA_LogEntry instance"); },
+        [] { NVR_LOG("NVRVCNA_LogEntry_Provider::enum_instances()"); },
+    };
+    return walkRecords(walk, handler);
 }
 
 } // namespace cimple

@@ -1,4 +1,4 @@
-/// The provider of the ties between the provider's log and its records. It has none to hand out.
+/// The provider of the ties between the provider's log and its records.
 #pragma once
 
 #include "agent/Read_Only_Provider.h"

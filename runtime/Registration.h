@@ -31,7 +31,7 @@ enum Operation : int {
 
 /// Statuses of a provider's operations; 0 is success everywhere.
 enum Load_Status { LOAD_OK = 0, LOAD_FAILED = 30 };
-enum Unload_Status { UNLOAD_OK = 0 };
+enum Unload_Status { UNLOAD_OK = 0, UNLOAD_FAILED = 40 };
 enum Get_Instance_Status {
     GET_INSTANCE_OK = 0,
     GET_INSTANCE_NOT_FOUND = 60,
@@ -106,8 +106,7 @@ struct Enum_Handler {
 /// Takes one indication and its ownership; null is the provider's stop word and gives false.
 using Indication_Handler_Proc = bool (*)(Instance* instance, void* data);
 
-/// What an indication provider keeps from enable_indications to disable_indications; allocated with new by the proc,
-/// freed by the provider.
+/// What an indication provider is given by enable_indications and keeps until disable_indications.
 struct Indication_Handler {
     Indication_Handler_Proc proc;
     void* data;

@@ -112,7 +112,9 @@ void* _thread_proc(void* arg)
     return result;
 }
 
-int create(pthread_t& thread, int detach_state, Thread::Proc proc, void* arg)
+enum class Context { if_there_is, needed };
+
+int create(pthread_t& thread, int detach_state, Thread::Proc proc, void* arg, Context wanted)
 {
     std::unique_ptr<Start> start;
     try {
@@ -121,6 +123,7 @@ int create(pthread_t& thread, int detach_state, Thread::Proc proc, void* arg)
     } catch (const std::bad_alloc&) {
         return ENOMEM;
     }
+    if (wanted == Context::needed && !start->context) return ENOTSUP;
     pthread_attr_t attributes;
     int status = pthread_attr_init(&attributes);
     if (status != 0) return status;
@@ -139,13 +142,19 @@ int create(pthread_t& thread, int detach_state, Thread::Proc proc, void* arg)
 int Thread::create_detached(Thread& thread, Proc proc, void* arg)
 {
     thread.reset();
-    return create(thread.m_thread, PTHREAD_CREATE_DETACHED, proc, arg);
+    return create(thread.m_thread, PTHREAD_CREATE_DETACHED, proc, arg, Context::if_there_is);
 }
 
 int Thread::create_joinable(Thread& thread, Proc proc, void* arg)
 {
     thread.reset();
-    return create(thread.m_thread, PTHREAD_CREATE_JOINABLE, proc, arg);
+    return create(thread.m_thread, PTHREAD_CREATE_JOINABLE, proc, arg, Context::if_there_is);
+}
+
+int Thread::create_attached(Thread& thread, Proc proc, void* arg)
+{
+    thread.reset();
+    return create(thread.m_thread, PTHREAD_CREATE_JOINABLE, proc, arg, Context::needed);
 }
 
 int Thread::join(Thread& thread, void*& result)

@@ -24,6 +24,8 @@ public:
     /// Result 0 or the error of pthread_create (`thread` is empty and nothing is left behind then).
     static int create_detached(Thread& thread, Proc proc, void* arg);
     static int create_joinable(Thread& thread, Proc proc, void* arg);
+    /// As create_joinable, for a thread that has work at the CIM server: ENOTSUP if it would get no thread context.
+    static int create_attached(Thread& thread, Proc proc, void* arg);
 
     /// Waits for a joinable thread to end and empties the handle; `result` takes what its procedure returned, null on
     /// failure. Result that of pthread_join, ESRCH for an empty handle.

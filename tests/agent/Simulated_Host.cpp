@@ -58,6 +58,8 @@ std::string scalar(const void* place, uint16 type)
         return std::to_string(*static_cast<const sint32*>(place));
     case UINT64:
         return std::to_string(*static_cast<const uint64*>(place));
+    case SINT64:
+        return std::to_string(*static_cast<const sint64*>(place));
     case REAL32: {
         char text[32];
         std::snprintf(text, sizeof text, "%.6g", static_cast<double>(*static_cast<const real32*>(place)));

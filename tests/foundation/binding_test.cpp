@@ -240,6 +240,23 @@ TEST_F(Binding, TellsTheCommonLibraryWhenItIsLoadedAndFreed)
     EXPECT_THAT(fake::calls(), ElementsAre("HBAAPI:HBA_LoadLibrary", "HBAAPI:HBA_FreeLibrary"));
 }
 
+TEST_F(Binding, LeavesLibrariesInTheProcessThatMayStillCallBack)
+{
+    fake::install({"HBAAPI"});
+    loadLibraries();
+    cimple::keepLibrariesMapped(true);
+    fake::calls().clear();
+    EXPECT_EQ(unloadLibraries(), 0);
+    cimple::keepLibrariesMapped(false);
+    EXPECT_THAT(fake::calls(), IsEmpty()) << "nor are its vendors' libraries freed";
+    const std::string file = nvrtest::library_folder() + "/libHBAAPI.so";
+    void* left = ::dlopen(file.c_str(), RTLD_NOW | RTLD_NOLOAD);
+    EXPECT_NE(left, nullptr);
+    EXPECT_EQ(cimple::HBA_GetNumberOfAdapters(), 0u) << "not bound any more";
+    ::dlclose(left);
+    ::dlclose(left);
+}
+
 TEST_F(Binding, TakesACommonLibraryWithoutThoseCalls)
 {
     fake::install({"lrmapi", "tssdm=HBAAPI", "tssdm"}); // under the name, a library with none of the operations

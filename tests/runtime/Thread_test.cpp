@@ -152,6 +152,22 @@ TEST_F(ThreadsUnderAContext, MayGetNone)
     EXPECT_EQ(Fake_Context::started, 0);
 }
 
+TEST_F(ThreadsUnderAContext, AreNotMadeWithoutOneThatTheyNeed)
+{
+    Thread thread;
+    for (const auto hook : {Fake_Context::Hook::none, Fake_Context::Hook::no_memory}) {
+        context.hook = hook;
+        EXPECT_NE(Thread::create_attached(thread, return_top, nullptr), 0);
+        EXPECT_TRUE(thread.empty());
+    }
+    context.hook = Fake_Context::Hook::child;
+    ASSERT_EQ(Thread::create_attached(thread, return_top, nullptr), 0);
+    void* top = nullptr;
+    EXPECT_EQ(Thread::join(thread, top), 0);
+    EXPECT_NE(top, nullptr);
+    EXPECT_NE(top, &context);
+}
+
 TEST_F(ThreadsUnderAContext, PassItOnToTheirOwnThreads)
 {
     EXPECT_NE(run_joined([](void*) { return run_joined(return_top, nullptr); }, nullptr), nullptr);

@@ -3,7 +3,9 @@
 
 #include "runtime/Registration.h"
 
+#include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace cimple::fake {
@@ -16,7 +18,7 @@ struct Script {
     int names_status = ENUM_ASSOCIATOR_NAMES_UNSUPPORTED;
     int references_status = ENUM_REFERENCES_UNSUPPORTED;
     int associators_status = ENUM_ASSOCIATORS_UNSUPPORTED;
-    Indication_Handler* indications = nullptr;
+    std::unique_ptr<Indication_Handler> indications;
     int living = 0; ///< provider objects
 
     static Script& current()
@@ -69,17 +71,16 @@ public:
         note("enum_associators");
         return script().associators_status;
     }
-    Enable_Indications_Status enable_indications(Indication_Handler* handler)
+    Enable_Indications_Status enable_indications(std::unique_ptr<Indication_Handler> handler)
     {
         note("enable_indications");
-        script().indications = handler;
+        script().indications = std::move(handler);
         return ENABLE_INDICATIONS_OK;
     }
     Disable_Indications_Status disable_indications()
     {
         note("disable_indications");
-        delete script().indications;
-        script().indications = nullptr;
+        script().indications.reset();
         return DISABLE_INDICATIONS_OK;
     }
 
