@@ -43,6 +43,11 @@ Call::Call(Call_Id id, const Subject& subject) : m_simulator(Simulator::instance
         resolve(subject); // the host may be another one now
     }
     if (m_port) m_wwpn = m_port->current.wwpn;
+    if (m_fault.vanish && m_adapter) {
+        m_adapter->present = false;
+        m_simulator.host.reindex();
+        resolve(subject);
+    }
 }
 
 Call::~Call()

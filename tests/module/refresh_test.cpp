@@ -328,6 +328,62 @@ TEST_P(Refreshes, EachOfEightClientsSeesAllOldOrAllNew)
     EXPECT_THAT(rig.server().report().violations, IsEmpty());
 }
 
+// The same for what stands behind the ports: volumes, endpoints, and the associations that hold both.
+TEST_P(Refreshes, EachOfEightClientsSeesAllOfOneSan)
+{
+    const auto san = [](unsigned first, unsigned units) {
+        return host_of(2, first) + "[[target]]\nluns = " + std::to_string(units) + "\n[[target]]\nluns = 3\n";
+    };
+    const std::string hosts[] = {san(0x100, 5), san(0x200, 9)};
+    const std::vector<std::string> classes = {"NVRHBA_StorageVolume", "NVRHBA_SCSIProtocolEndpoint",
+                                              "NVRHBA_StorageVolumeSystemDevice",
+                                              "NVRHBA_SCSIInitiatorTargetStorageVolumePath"};
+    Rig rig({*GetParam(), hosts[0], refreshing_settings});
+    const auto names = [&](const std::string& class_name) {
+        std::vector<std::string> all;
+        for (const host::Path& path : rig.names(class_name).paths)
+            all.push_back(path.to_text());
+        return all;
+    };
+    const auto every_name = [&] {
+        std::vector<std::vector<std::string>> all;
+        for (const std::string& class_name : classes)
+            all.push_back(names(class_name));
+        return all;
+    };
+    const auto first = every_name();
+    load_scenario(hosts[1]);
+    rig.refresh();
+    const auto second = every_name();
+    for (std::size_t i = 0; i < classes.size(); i++) {
+        ASSERT_EQ(first[i].size(), 16u) << classes[i];
+        ASSERT_EQ(second[i].size(), 24u) << classes[i];
+    }
+
+    std::atomic<bool> over{false};
+    std::atomic<unsigned> answers{0}, wrong{0};
+    std::vector<std::thread> clients;
+    for (std::size_t i = 0; i < 8; i++)
+        clients.emplace_back([&, which = i % classes.size()] {
+            while (!over) {
+                const std::vector<std::string> seen = names(classes[which]);
+                wrong += seen != first[which] && seen != second[which];
+                answers++;
+            }
+        });
+    for (int round = 0; round < 8; round++) {
+        load_scenario(hosts[round % 2]);
+        rig.refresh();
+    }
+    over = true;
+    for (std::thread& client : clients)
+        client.join();
+    EXPECT_EQ(wrong, 0u);
+    EXPECT_GT(answers, 16u);
+    EXPECT_EQ(left_beside_strings(rig.server().report()), 0u) << rig.server().report().to_text();
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
+}
+
 TEST_P(Refreshes, ASecondOneLeavesTheSameInstances)
 {
     Rig rig({*GetParam(), "typical", refreshing_settings});

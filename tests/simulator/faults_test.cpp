@@ -207,6 +207,20 @@ TEST_F(Faults, AbsentFunctionAnswersAsIfItsSymbolWereMissing)
     EXPECT_EQ(1u, nvrsim_RM_GetVPD(wire(port0), name, &size));
 }
 
+TEST_F(Faults, AnAdapterCanVanishBetweenTwoCalls)
+{
+    load("[[adapter]]\n[[adapter]]\n");
+    fault("call = '*', port = 0, from = 2, vanish = true");
+    EXPECT_EQ(0u, driver_type(port0));
+    EXPECT_EQ(RM_STATUS_ILLEGAL_WWN, driver_type(port0)) << "it leaves before this call does anything";
+    EXPECT_EQ("0", sim_value("0", "present"));
+    EXPECT_EQ(1u, nvrsim_HBA_GetNumberOfAdapters());
+    EXPECT_EQ(0u, driver_type(port0 + 1));
+    nvrsim_clear_faults();
+    EXPECT_EQ(0, nvrsim_set("0", "present", 1));
+    EXPECT_EQ(0u, driver_type(port0));
+}
+
 TEST_F(Faults, WrongFaultsAreRefusedWithTheirReason)
 {
     EXPECT_EQ(-1, nvrsim_fault("status = 7"));
