@@ -1,6 +1,7 @@
 #include <cerrno>
 #include <cstdio>
 
+#include "agent/Adapter_Update.h"
 #include "agent/Agent_Wait.h"
 #include "inventory/NVR_Data.h"
 #include "simulator/nvrsim.h"
@@ -337,6 +338,24 @@ TEST_F(AdapterUpdate, ProfilesAreTiedToTheHostAndToProfileRegistration)
     for (const auto& association : tied)
         EXPECT_STREQ(association->__name_space.c_str(), "root/pg_interop");
     EXPECT_TRUE(plain(agent().m_NVRHBA_BaseServerReferencedProfile_map).empty());
+}
+
+TEST_F(AdapterUpdate, AProfileThatIsThereIsTakenAgain)
+{
+    refresh();
+    const std::size_t profiles = agent().m_NVRHBA_RegisteredProfile_map.size();
+    words();
+    ProviderAgent& held = agent();
+    {
+        Agent_Wait wait(held);
+        Adapter_Update(held).buildProfiles();
+    }
+    EXPECT_EQ(agent().m_NVRHBA_RegisteredProfile_map.size(), profiles);
+    EXPECT_THAT(words(), contains_in_order({"Generating NVRHBA_RegisteredProfile (Profile Registration)",
+                                            "Got NVRHBA_RegisteredProfile in the map (Profile Registration)",
+                                            "inside createComputerSystemConformsToProfile",
+                                            "Insert Failed : m_NVRHBA_ComputerSystemConformsToProfile_map",
+                                            "Got NVRHBA_RegisteredProfile in the map (FCHBA Diagnostics)"}));
 }
 
 TEST_F(AdapterUpdate, ADualPortCardHasItsAdapterClassesOnceAndThePortsTwice)

@@ -479,6 +479,31 @@ TEST_F(SANUpdate, TheLargestCapacityFits)
                 {{"NumberOfBlocks", "4294967295"}, {"Capacity", "18446744065119617025"}});
 }
 
+TEST_F(SANUpdate, AUnitOnTwoLUNsIsTwoInstances)
+{
+    const std::string naa = "identifier_type = 3\nidentifier = \"60060E8005A1FF07\"\n";
+    scenario(units("[[target.lun]]\nnumber = 0\n" + naa + "[[target.lun]]\nnumber = 1\n" + naa));
+    const std::string route = std::string(first_wwpn) + "_" + target_wwpn + "_60060E8005A1FF07_";
+    EXPECT_THAT(all(agent().m_NVRHBA_StorageVolume_map, "DeviceID"),
+                ElementsAre(route + "0000000000000000", route + "0001000000000000"));
+}
+
+TEST_F(SANUpdate, AnAdapterRefreshKeepsTheOldInstancesUntilSomebodyAsks)
+{
+    scenario("[[adapter]]\n[[target]]\nluns = 2\n");
+    refresh();
+    const std::size_t before = instances();
+    EXPECT_GT(before, 5u);
+    agent().m_bRefreshSANData = false;
+    scenario("[[adapter]]\n[[target]]\nluns = 3\n");
+    SimulatedHost::refresh();
+    settle();
+    EXPECT_FALSE(agent().m_bIsSANMapsReady);
+    EXPECT_EQ(instances(), before);
+    EXPECT_THAT(all(agent().m_NVRHBA_StorageVolume_map, "Name"), SizeIs(3));
+    EXPECT_TRUE(agent().m_bIsSANMapsReady);
+}
+
 TEST_F(SANUpdate, TwinsEndTheUpdateButNotTheAgent)
 {
     scenario(units("[[target.lun]]\nnumber = 0\n"
