@@ -1,6 +1,7 @@
 #include "host/command/Options.h"
 
 #include "host/Manner.h"
+#include "host/command/Actions.h"
 
 #include <CLI/CLI.hpp>
 
@@ -28,9 +29,13 @@ constexpr const char* footer =
     "  nvrcim associators 'NVRHBA_PhysicalPackage.Tag=\"...\",CreationClassName=\"NVRHBA_PhysicalPackage\"' --names\n"
     "  nvrcim --scenario typical.toml tree\n"
     "  nvrcim --manner pegasus --server-log - names NVRHBA_Product\n"
+    "  nvrcim port beacon on --port 10:00:00:00:c9:a0:00:01\n"
+    "  nvrcim wwn change 10000000C9A0F001 20000000C9A0F001 --type volatile --yes\n"
     "\n"
     "Exit status: 0 done; a CIM status code (1 failed, 2 access denied, 3 no such namespace, 4 bad parameter,\n"
-    "5 no such class, 6 not found, 7 not supported, ...); 64 for a command that cannot be understood.\n"
+    "5 no such class, 6 not found, 7 not supported, ...); 64 for a command that cannot be understood; of the actions "
+    "on\n"
+    "ports also 65, the question was answered with no, and 66, the method returned another value than 0.\n"
     "Environment: NVRCIM_MODULE, NVRCIM_MOF, NVRCIM_SIMULATOR name the places that are otherwise found beside nvrcim.";
 
 std::string manners()
@@ -39,6 +44,43 @@ std::string manners()
     for (const Manner* manner : Manner::all())
         names += (names.empty() ? "" : ", ") + std::string(manner->name);
     return names;
+}
+
+/// Adds an input of an action to its verb; what is given goes into the options.
+void add_input(CLI::App& verb, const Input& input, Options& options)
+{
+    if (input.kind == Input::flag) {
+        verb.add_flag_callback(
+            input.label, [&options, label = input.label] { options.given[label] = ""; }, input.help);
+        return;
+    }
+    std::string help = input.help;
+    std::vector<std::string> words;
+    for (const Choice& choice : input.choices)
+        words.push_back(choice.word);
+    CLI::Option* option = verb.add_option_function<std::string>(
+        input.label, [&options, label = input.label](const std::string& text) { options.given[label] = text; }, help);
+    if (!words.empty()) option->check(CLI::IsMember(words));
+    if (input.label[0] != '-') option->required();
+    if (!input.fallback.empty()) option->default_str(input.fallback);
+}
+
+void add_actions(CLI::App& app, Options& options)
+{
+    for (const auto& [group_name, group_help] : action_groups()) {
+        CLI::App* group = app.add_subcommand(group_name, group_help);
+        group->require_subcommand(1);
+        for (const Action& action : actions()) {
+            if (action.group != group_name) continue;
+            CLI::App* verb = group->add_subcommand(action.verb, action.help);
+            for (const Input& input : action.inputs)
+                add_input(*verb, input, options);
+            verb->add_option("--port", options.port,
+                             "The port, by its World Wide Name; not needed if there is one only");
+            if (!action.question.empty()) verb->add_flag("-y,--yes", options.yes, "Do not ask before it is done");
+            verb->callback([&options, &action] { options.action = &action; });
+        }
+    }
 }
 
 } // namespace
@@ -115,6 +157,8 @@ int read_options(int count, char** arguments, Options& options)
     CLI::App* check =
         app.add_subcommand("check", "Verify that both ends of each association exist and find each other");
     check->add_flag("--all", options.all, "Tell of each association class, not only of faults");
+
+    add_actions(app, options);
 
     try {
         app.parse(count, arguments);

@@ -1,10 +1,13 @@
 /// What the user asked of nvrcim, read from its command line.
 #pragma once
 
+#include <map>
 #include <string>
 #include <vector>
 
 namespace host {
+
+struct Action;
 
 struct Options {
     std::string verb;                    ///< classes, enum, names, get, set, call, associators, ...
@@ -17,6 +20,11 @@ struct Options {
     std::string file;                                               ///< where `graph` draws to
     bool all = false;
     bool json = false;
+
+    const Action* action = nullptr;           ///< one of Actions.h instead of a verb
+    std::map<std::string, std::string> given; ///< its inputs by their labels, as far as they were given
+    std::string port;                         ///< the port that it is meant for; empty: the only one
+    bool yes = false;                         ///< the user is not asked
 
     std::string manner = "strict";
     std::string name_space = "root/norvane";

@@ -1,6 +1,7 @@
 #include "host/command/Verbs.h"
 
 #include "host/PathText.h"
+#include "host/command/Actions.h"
 #include "host/command/Arguments.h"
 #include "host/command/Check.h"
 #include "host/command/Graph.h"
@@ -28,6 +29,7 @@ public:
 
     int verb()
     {
+        if (m_options.action) return run_action(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "classes") return classes();
         if (m_options.verb == "tree") return show_tree(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "graph") return draw_graph(m_server, m_options, m_out, m_complaints);

@@ -1,11 +1,9 @@
 // The command from end to end: its own process loads the module over a scenario, asks it, and shows what comes back.
-#include <cstdio>
-#include <stdexcept>
 #include <string>
-#include <sys/wait.h>
 
 #include <gmock/gmock.h>
 
+#include "tests/module/support/Command_Line.h"
 #include "tests/module/support/Rig.h"
 #include "tests/support/private_host.h"
 
@@ -13,27 +11,6 @@ using namespace nvrtest;
 using testing::HasSubstr;
 
 namespace {
-
-struct Ended_Command {
-    std::string output; // both streams
-    int status = -1;    // of the exit; -1 after a signal
-};
-
-Ended_Command nvrcim(const std::string& arguments, const std::string& scenario = "small",
-                     const std::string& environment = "")
-{
-    const std::string command = environment + " '" + NVR_NVRCIM + "' --module '" + NVR_MODULE + "' --scenario '" +
-                                NVR_SCENARIO_DIR + "/" + scenario + ".toml' " + arguments + " 2>&1";
-    FILE* child = popen(command.c_str(), "r");
-    if (!child) throw std::runtime_error("cannot start a shell");
-    Ended_Command run;
-    char buffer[4096];
-    while (const std::size_t size = std::fread(buffer, 1, sizeof buffer, child))
-        run.output.append(buffer, size);
-    const int status = pclose(child);
-    if (WIFEXITED(status)) run.status = WEXITSTATUS(status);
-    return run;
-}
 
 constexpr char minutes[] =
     "'root/norvane:NVRHBA_ProviderConfigSetting.InstanceID=\"Norvane HBA Provider:cachetimeout\"'";
