@@ -42,8 +42,6 @@ Broker::~Broker()
 {
     for (Object* object : m_retired)
         delete object;
-    for (Scope* scope : m_attached)
-        delete scope;
 }
 
 void Broker::connect(Request_Runner* requests, Indication_Taker* indications)
@@ -117,7 +115,7 @@ CMPIContext* Broker::prepare_context(const Context_Object& source)
     auto* context = new Context_Object(*this, Origin::made, source.entries);
     context->prepared = true;
     m_ledger.created(Object_Kind::context, Origin::made);
-    m_ledger.context_prepared(1);
+    m_ledger.context_out(1);
     m_explicit.add(*context);
     return &context->face;
 }
@@ -126,13 +124,16 @@ int Broker::attach(const CMPIContext* context)
 {
     auto* object = unwrap<Context_Object>(context);
     if (!object) return CMPI_RC_ERR_INVALID_HANDLE;
-    if (!object->prepared) violation("attachThread with a context that prepareAttachThread did not make");
+    if (!object->prepared) {
+        violation("attachThread with a context that prepareAttachThread did not make");
+        m_ledger.context_out(1);
+    }
     if (Scope::current(*this)) violation("attachThread on a thread that has a request or is attached");
-    auto* scope = new Scope(*this, Scope::Sort::attached, "attached thread");
+    auto scope = std::make_unique<Scope>(*this, Scope::Sort::attached, "attached thread");
     scope->context = context;
     scope->enter();
     std::lock_guard lock(m_mutex);
-    m_attached.push_back(scope);
+    m_attached.push_back(std::move(scope));
     return CMPI_RC_OK;
 }
 
@@ -145,16 +146,18 @@ int Broker::detach(const CMPIContext* context)
         violation("detachThread on a thread that is not attached with this context");
         return CMPI_RC_ERR_INVALID_PARAMETER;
     }
+    scope->leave();
+    std::unique_ptr<Scope> ended;
     {
         std::lock_guard lock(m_mutex);
-        m_attached.erase(std::find(m_attached.begin(), m_attached.end(), scope));
+        auto found =
+            std::find_if(m_attached.begin(), m_attached.end(), [&](auto& each) { return each.get() == scope; });
+        ended = std::move(*found);
+        m_attached.erase(found);
     }
-    scope->leave();
-    delete scope;
-    if (object->prepared) {
-        m_ledger.context_prepared(-1);
-        release_object(context->hdl, Object_Kind::context);
-    }
+    ended.reset();
+    if (object->prepared) release_object(context->hdl, Object_Kind::context);
+    m_ledger.context_out(-1); // the last touch: with the last context back, the broker may go
     return CMPI_RC_OK;
 }
 

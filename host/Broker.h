@@ -49,7 +49,7 @@ public:
 class Broker {
 public:
     Broker(const Schema& schema, const Manner& manner, Server_Log& log);
-    /// Frees clones and contexts that modules still hold: they must be gone.
+    /// Frees what modules did not release. No thread may be attached, nor prepared for it: see `is_lent`.
     ~Broker();
     Broker(const Broker&) = delete;
     Broker& operator=(const Broker&) = delete;
@@ -88,6 +88,10 @@ public:
     int attach(const CMPIContext* context);
     int detach(const CMPIContext* context);
 
+    /// True while a context for a thread is out: that thread may call the broker at any time. False for good when no
+    /// request runs any more.
+    bool is_lent() const { return m_ledger.contexts_out() > 0; }
+
     /// Frees an object that the module released.
     void retire(Object& object);
     /// Notes a broken rule, in the ledger and the log.
@@ -115,7 +119,7 @@ private:
 
     std::mutex m_mutex;
     std::deque<Object*> m_retired; ///< released a moment ago: kept so that a second use is seen
-    std::vector<Scope*> m_attached;
+    std::vector<std::unique_ptr<Scope>> m_attached;
     Scope m_orphans, m_explicit;
 };
 

@@ -61,7 +61,8 @@ Answer Dispatcher::run(const Request& request)
 {
     if (request.up_call)
         m_broker.log().line("up-call %s %s", operation_name(request.operation), request.path.to_text().c_str());
-    if (m_modules.stopped() && !request.up_call) return failed(CMPI_RC_ERR_FAILED, "the server has stopped", Fault::server);
+    if (request.up_call ? m_modules.ended() : m_modules.stopped())
+        return failed(CMPI_RC_ERR_FAILED, "the server has stopped", Fault::server);
     if (!knows(request.path.name_space))
         return failed(CMPI_RC_ERR_INVALID_NAMESPACE, "the server has no namespace " + request.path.name_space);
     if (!m_broker.schema().find(request.path.class_name))

@@ -7,6 +7,8 @@
 #include "host/ProviderCall.h"
 #include "host/Workers.h"
 
+#include <mutex>
+
 namespace host {
 
 using Operation = Request::Operation;
@@ -27,6 +29,15 @@ struct Host::Parts {
         request.path = path;
         request.principal = options.principal;
         return dispatcher.run(request);
+    }
+
+    /// For the rest of the process: a thread that the server never saw detach may call its broker still.
+    static void keep(std::unique_ptr<Parts> parts)
+    {
+        static auto& mutex = *new std::mutex;
+        static auto& kept = *new std::vector<std::unique_ptr<Parts>>;
+        std::lock_guard lock(mutex);
+        kept.push_back(std::move(parts));
     }
 
     std::shared_ptr<const Schema> schema;
@@ -78,6 +89,10 @@ Host::~Host()
 {
     m_parts->indications.settle();
     stop();
+    m_parts->modules.end();
+    if (!m_parts->broker.is_lent()) return;
+    m_parts->workers.end();
+    Parts::keep(std::move(m_parts));
 }
 
 void Host::add(const Registration& registration)

@@ -35,10 +35,10 @@ namespace host {
 /// Whose fault a failure is.
 enum class Fault {
     nobody,
-    request,  ///< asked for what is not there
-    server,   ///< the host itself: no thread, already stopped
-    module,   ///< cannot be loaded, a factory failed, an exception came out of it
-    provider  ///< answered with this status
+    request, ///< asked for what is not there
+    server,  ///< the host itself: no thread, already stopped
+    module,  ///< cannot be loaded, a factory failed, an exception came out of it
+    provider ///< answered with this status
 };
 
 /// A CMPI return code and its text; 0 is success.
@@ -113,7 +113,9 @@ struct Unload_Result {
 class Host {
 public:
     explicit Host(std::shared_ptr<const Schema> schema, Host_Options options = {});
-    /// Stops the server, if that was not done.
+    /// Stops the server, if that was not done. A server whose manner leaves MIs without a clean-up ends the module's
+    /// process then; the host's own lives on, so these get theirs here, and the next host finds a module that is new.
+    /// What threads of a module were lent stays for the rest of the process while one of them has not detached.
     ~Host();
     Host(const Host&) = delete;
     Host& operator=(const Host&) = delete;

@@ -78,9 +78,9 @@ void Ledger::settled(Object_Kind kind, Origin origin)
     --m_alive;
 }
 
-void Ledger::context_prepared(int by)
+void Ledger::context_out(int by)
 {
-    m_prepared += by;
+    m_contexts_out += by;
 }
 
 void Ledger::violation(const std::string& text)
@@ -98,7 +98,7 @@ Report Ledger::report() const
         report.tallies[i] = {from.made, from.got, from.cloned, from.released, from.left, from.clones_alive};
     }
     report.peak_objects = static_cast<std::uint64_t>(m_peak.load());
-    report.contexts_not_detached = static_cast<std::uint64_t>(m_prepared.load());
+    report.contexts_not_detached = static_cast<std::uint64_t>(m_contexts_out.load());
     std::lock_guard lock(m_mutex);
     report.violations = m_violations;
     report.violation_count = m_violation_count;

@@ -69,7 +69,8 @@ public:
     void created(Object_Kind kind, Origin origin);
     void released(Object_Kind kind, Origin origin);
     void settled(Object_Kind kind, Origin origin); ///< freed by the broker at the end of a call
-    void context_prepared(int by);                 ///< +1 prepared, -1 detached or released
+    void context_out(int by);                      ///< +1 prepared for a thread, -1 detached or released
+    std::int64_t contexts_out() const { return m_contexts_out; }
     void violation(const std::string& text);
 
     Report report() const;
@@ -83,7 +84,7 @@ private:
     void one_more();
 
     std::array<Counters, object_kinds> m_counters;
-    std::atomic<std::int64_t> m_alive{0}, m_peak{0}, m_prepared{0};
+    std::atomic<std::int64_t> m_alive{0}, m_peak{0}, m_contexts_out{0};
     mutable std::mutex m_mutex;
     std::vector<std::string> m_violations;
     std::uint64_t m_violation_count = 0;

@@ -258,4 +258,17 @@ Unload_Result Modules::stop(const std::function<void()>& before)
     return result;
 }
 
+void Modules::end()
+{
+    for (const std::string& module : modules())
+        for (Provider* provider : providers_of(module)) {
+            if (!provider->has_left_over()) continue;
+            m_workers.run([&] {
+                Call_Scope scope(m_broker, "cleanup");
+                provider->clean_left_over(m_broker.make_request_context("", ""));
+            });
+        }
+    m_ended = true;
+}
+
 } // namespace host

@@ -9,6 +9,7 @@
 #include "host/Provider.h"
 #include "host/Workers.h"
 
+#include <atomic>
 #include <condition_variable>
 #include <map>
 #include <memory>
@@ -42,7 +43,11 @@ public:
     Unload_Result unload_idle();
     /// `before` runs first, where the manner wants indications disabled.
     Unload_Result stop(const std::function<void()>& before);
+    /// After `stop`, in place of the end of the process that such a server gives a module: cleans up what the server
+    /// left over, so that nothing of the module holds on to the broker. Up-calls fail from then on, too.
+    void end();
     bool stopped() const;
+    bool ended() const { return m_ended; }
     bool is_loaded(const std::string& module) const;
 
     /// Permission to use the MIs of a module.
@@ -79,6 +84,7 @@ private:
     std::map<std::string, int> m_visits; ///< requests in flight, by module
     std::set<std::string> m_unloading;
     bool m_stopped = false;
+    std::atomic<bool> m_ended{false};
 };
 
 } // namespace host

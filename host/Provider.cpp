@@ -73,10 +73,12 @@ Status Provider::make(Mi kind)
     m_broker.log().line("factory %s: %s%s", factory.c_str(), mi ? "OK" : "null",
                         told.ok() ? "" : (", " + status_name(told.code)).c_str());
     if (!told.ok() || !mi)
-        return {CMPI_RC_ERR_FAILED, "the factory " + factory + " of the module failed" +
-                                        (told.ok() ? " (no MI)" : ": " + status_name(told.code) + " " + told.message),
+        return {CMPI_RC_ERR_FAILED,
+                "the factory " + factory + " of the module failed" +
+                    (told.ok() ? " (no MI)" : ": " + status_name(told.code) + " " + told.message),
                 Fault::module};
     slot = mi;
+    m_cleaned[static_cast<std::size_t>(kind)] = false;
     m_age = ++factories_called;
     return {};
 }
@@ -104,28 +106,39 @@ void* Provider::made(Mi kind) const
 
 Status Provider::cleanup(Mi kind, const CMPIContext* context, bool terminating)
 {
-    void* mi = made(kind);
+    Status told = call_cleanup({kind, made(kind)}, context, terminating);
+    m_broker.log().line("cleanup (terminating %s) of %s %s: %s", terminating ? "true" : "false", name().c_str(),
+                        mi_name(kind), status_name(told.code).c_str());
+    std::lock_guard lock(m_mutex);
+    if (terminating || told.ok()) m_cleaned[static_cast<std::size_t>(kind)] = true;
+    return told;
+}
+
+Status Provider::call_cleanup(const Made& made, const CMPIContext* context, bool terminating)
+{
+    const auto [kind, mi] = made;
     CMPIStatus status = status_of(CMPI_RC_ERR_NOT_SUPPORTED);
     CMPIBoolean flag = terminating ? CMPI_true : CMPI_false;
     auto call = [&](auto* face) {
         if (face->ft && face->ft->cleanup) status = face->ft->cleanup(face, context, flag);
     };
-    Status guarded = guard(m_broker, name() + " cleanup", [&] {
+    Status guarded = guard(m_broker, name() + " cleanup", [&, kind = kind, mi = mi] {
         if (kind == Mi::instance) call(static_cast<CMPIInstanceMI*>(mi));
         if (kind == Mi::association) call(static_cast<CMPIAssociationMI*>(mi));
         if (kind == Mi::method) call(static_cast<CMPIMethodMI*>(mi));
         if (kind == Mi::property) call(static_cast<CMPIPropertyMI*>(mi));
         if (kind == Mi::indication) call(static_cast<CMPIIndicationMI*>(mi));
     });
-    Status told = guarded.ok() ? read_status(status) : guarded;
-    m_broker.log().line("cleanup (terminating %s) of %s %s: %s", terminating ? "true" : "false", name().c_str(),
-                        mi_name(kind), status_name(told.code).c_str());
-    return told;
+    return guarded.ok() ? read_status(status) : guarded;
 }
 
 void Provider::forget()
 {
     std::lock_guard lock(m_mutex);
+    for (Mi kind : all_mi_kinds) {
+        const auto at = static_cast<std::size_t>(kind);
+        if (m_made[at] && !m_cleaned[at]) m_left_over.push_back({kind, m_made[at]});
+    }
     m_made.fill(nullptr);
     m_age = 0;
     enabled = false;
@@ -138,9 +151,36 @@ bool Provider::close()
         if (mi) return false;
     if (!m_library) return false;
     m_broker.log().line("dlclose %s for %s", module().c_str(), name().c_str());
-    dlclose(m_library);
+    if (m_left_over.empty())
+        dlclose(m_library);
+    else
+        m_left_open.push_back(m_library);
     m_library = nullptr;
     return true;
+}
+
+bool Provider::has_left_over() const
+{
+    std::lock_guard lock(m_mutex);
+    return !m_left_over.empty();
+}
+
+void Provider::clean_left_over(const CMPIContext* context)
+{
+    std::vector<Made> left_over;
+    std::vector<void*> left_open;
+    {
+        std::lock_guard lock(m_mutex);
+        left_over.swap(m_left_over);
+        left_open.swap(m_left_open);
+    }
+    for (const Made& made : left_over) {
+        Status told = call_cleanup(made, context, true);
+        m_broker.log().line("left over at the end: cleanup of %s %s: %s", name().c_str(), mi_name(made.kind),
+                            status_name(told.code).c_str());
+    }
+    for (void* library : left_open)
+        dlclose(library);
 }
 
 bool Provider::is_open() const

@@ -10,6 +10,7 @@
 #include <atomic>
 #include <mutex>
 #include <string>
+#include <vector>
 
 namespace host {
 
@@ -40,10 +41,13 @@ public:
 
     /// Calls clean-up of one MI; on a request thread.
     Status cleanup(Mi kind, const CMPIContext* context, bool terminating);
-    /// Forgets the MIs: the next request calls the factories again.
+    /// Forgets the MIs: the next request calls the factories again. Those that were never cleaned are left over.
     void forget();
-    /// Closes the library if no MI is there. True if it was open.
+    /// Closes the library if no MI is there. True if it was open. It stays mapped as long as MIs are left over.
     bool close();
+    /// True if MIs are left over; and their clean-up, on a request thread, in place of the end of the server's process.
+    bool has_left_over() const;
+    void clean_left_over(const CMPIContext* context);
 
     bool is_open() const;
     const std::string& module() const { return m_registration.module; }
@@ -56,14 +60,24 @@ public:
     std::atomic<bool> enabled{false}; ///< enableIndications was called last
 
 private:
+    /// A factory's result.
+    struct Made {
+        Mi kind;
+        void* mi;
+    };
+
     Status open();
     Status make(Mi kind);
+    Status call_cleanup(const Made& made, const CMPIContext* context, bool terminating);
 
     Broker& m_broker;
     Registration m_registration;
     mutable std::mutex m_mutex;
     void* m_library = nullptr;
     std::array<void*, mi_kinds> m_made{};
+    std::array<bool, mi_kinds> m_cleaned{};
+    std::vector<Made> m_left_over;
+    std::vector<void*> m_left_open; ///< handles of the library that left-over MIs need
     std::atomic<unsigned> m_age{0};
 };
 

@@ -5,15 +5,18 @@
 
 namespace host {
 
-Workers::~Workers()
+void Workers::end()
 {
+    std::list<Worker> ending;
     {
         std::lock_guard lock(m_mutex);
         m_stopping = true;
-        for (Worker& worker : m_workers)
+        m_idle.clear();
+        ending.swap(m_workers);
+        for (Worker& worker : ending)
             worker.wake.notify_all();
     }
-    for (Worker& worker : m_workers)
+    for (Worker& worker : ending)
         worker.thread.join();
 }
 
@@ -89,7 +92,7 @@ void Workers::serve(Worker& worker)
         lock.lock();
         worker.work = nullptr;
         *worker.done = true;
-        m_idle.push_back(&worker);
+        if (!m_stopping) m_idle.push_back(&worker);
         worker.finished->notify_all();
     }
 }

@@ -15,8 +15,7 @@ namespace host {
 class Workers {
 public:
     explicit Workers(bool pooled) : m_pooled(pooled) {}
-    /// Waits for the threads; nothing may be running.
-    ~Workers();
+    ~Workers() { end(); }
     Workers(const Workers&) = delete;
     Workers& operator=(const Workers&) = delete;
 
@@ -24,6 +23,8 @@ public:
     bool run(const std::function<void()>& work);
     /// Runs them at once or in turn, and waits for all. False if one of them did not get a thread.
     bool run_all(const std::vector<std::function<void()>>& works, bool at_once);
+    /// Ends the shared threads and waits for them. What is handed in afterwards runs on threads that nobody waits for.
+    void end();
 
 private:
     struct Worker {

@@ -12,7 +12,7 @@ CMPIStatus release(CMPIContext* self)
     bool prepared = object && object->prepared;
     Ledger* ledger = prepared ? &object->broker.ledger() : nullptr;
     CMPIStatus status = release_face<Context_Object>(self);
-    if (ledger && status.rc == CMPI_RC_OK) ledger->context_prepared(-1);
+    if (ledger && status.rc == CMPI_RC_OK) ledger->context_out(-1);
     return status;
 }
 

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <fstream>
+#include <future>
 #include <thread>
 
 using namespace host;
@@ -11,6 +12,7 @@ using testing::Contains;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Not;
+using testing::UnorderedElementsAre;
 
 namespace {
 
@@ -148,6 +150,60 @@ TEST_P(Life, StoppingAsksWithTerminatingAndTakesNoRefusal)
     EXPECT_EQ(1, late.status.code);
     EXPECT_EQ("the server has stopped", late.status.message);
     EXPECT_EQ(0, server->stop().cleanups);
+}
+
+TEST_P(Life, TheEndCleansWhatTheServerLeftOver)
+{
+    use("TEST_Link");
+    use("TEST_Other");
+    server->unload_idle();
+    use("TEST_Link");
+    server->stop();
+    things::events();
+    server.reset();
+    if (newest_only())
+        EXPECT_THAT(told("cleanup"), UnorderedElementsAre("TEST_Link Instance cleanup 1"));
+    else
+        EXPECT_THAT(told("cleanup"), ElementsAre());
+}
+
+TEST_P(Life, AThreadThatOutlivesTheServerKeepsWhatItWasLent)
+{
+    use("TEST_Thing");
+    const CMPIBroker* broker = nullptr;
+    CMPIContext* prepared = nullptr;
+    server->on_request_thread([&](const CMPIBroker* mb, const CMPIContext* context) {
+        broker = mb;
+        prepared = mb->bft->prepareAttachThread(mb, context);
+    });
+    std::promise<void> attached, ended;
+    std::thread thread([&] {
+        EXPECT_EQ(CMPI_RC_OK, broker->bft->attachThread(broker, prepared).rc);
+        CMPIObjectPath* path = broker->eft->newObjectPath(broker, things::space, "TEST_Thing", nullptr);
+        attached.set_value();
+        ended.get_future().wait();
+        CMPIStatus status{};
+        EXPECT_EQ(nullptr, broker->bft->enumerateInstances(broker, prepared, path, nullptr, &status));
+        EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
+        ASSERT_NE(nullptr, status.msg);
+        EXPECT_STREQ("the server has stopped", status.msg->ft->getCharPtr(status.msg, nullptr));
+        path->ft->release(path);
+        EXPECT_EQ(CMPI_RC_OK, broker->bft->detachThread(broker, prepared).rc);
+    });
+    attached.get_future().wait();
+    server.reset();
+    ended.set_value();
+    thread.join();
+}
+
+TEST_P(Life, AContextThatComesBackUnusedLetsTheBrokerGo)
+{
+    server->on_request_thread([&](const CMPIBroker* mb, const CMPIContext* context) {
+        CMPIContext* prepared = mb->bft->prepareAttachThread(mb, context);
+        EXPECT_EQ(1u, server->report().contexts_not_detached);
+        prepared->ft->release(prepared);
+    });
+    EXPECT_EQ("", server->report().to_text());
 }
 
 TEST_P(Life, NeverUnloadIsHeeded)
