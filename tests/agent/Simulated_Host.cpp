@@ -8,8 +8,8 @@
 
 #include "agent/Clock.h"
 #include "runtime/Instance.h"
-#include "simulator/nvrsim.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 namespace nvrtest {
 
@@ -110,29 +110,17 @@ SimulatedHost::~SimulatedHost()
 
 void SimulatedHost::install(const std::vector<std::string>& only)
 {
-    for (const char* name : {"HBAAPI", "lrmapi", "rmapi", "tssdm"}) {
-        const std::string file = std::string("/lib") + name + ".so";
-        remove(library_folder() + file);
-        // A file that is no library keeps the loader from one that the machine may have.
-        if (std::find(only.begin(), only.end(), name) == only.end())
-            write_file(library_folder() + file, "no library");
-        else
-            link(NVRSIM_LIB_DIR + file, library_folder() + file);
-    }
+    compose_libraries(only);
 }
 
 void SimulatedHost::scenario(const std::string& toml)
 {
-    char reason[512] = {};
-    if (nvrsim_load_text(toml.c_str(), "test") != 0) nvrsim_error(reason, sizeof reason);
-    ASSERT_STREQ(reason, "");
+    load_scenario(toml + '\n'); // a text, also an empty one
 }
 
 void SimulatedHost::fault(const std::string& table)
 {
-    char reason[512] = {};
-    if (nvrsim_fault(table.c_str()) <= 0) nvrsim_error(reason, sizeof reason);
-    ASSERT_STREQ(reason, "");
+    add_fault(table);
 }
 
 int SimulatedHost::load()

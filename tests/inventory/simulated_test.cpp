@@ -11,6 +11,7 @@
 #include "inventory/PortAttributes.h"
 #include "inventory/PortStatistics.h"
 #include "inventory/Target.h"
+#include "simulator/nvrsim.h"
 #include "tests/support/private_host.h"
 #include "tests/support/simulator.h"
 
@@ -31,17 +32,27 @@ std::string scan(NVR_Data& data)
            std::to_string(targets);
 }
 
+constexpr char one_port[] = "[[adapter]]\n[[target]]\nluns = 3\n";
+
+/// The libraries over one adapter with one port and a target of three units.
 struct Loaded {
-    Loaded() : result(loadLibraries()) {}
+    explicit Loaded(const std::string& variant = "", const std::string& scenario = one_port)
+    {
+        if (variant.empty())
+            compose_libraries();
+        else
+            compose_variant(variant);
+        load_scenario(scenario);
+        result = loadLibraries();
+    }
     ~Loaded() { unloadLibraries(); }
-    int result;
+    int result = -1;
 };
 
 } // namespace
 
 TEST(SimulatedHost, IsFoundWhole)
 {
-    Simulator sim;
     Loaded libraries;
     EXPECT_EQ(libraries.result, 0);
     Management_Session session;
@@ -51,20 +62,18 @@ TEST(SimulatedHost, IsFoundWhole)
     EXPECT_NE(attributes._KERNEL_VERSION, "");
     EXPECT_NE(attributes._DeviceID, 0u);
     auto* port = dynamic_cast<FCPort*>(data.getPorts()[0]);
-    EXPECT_EQ(port->portName(), sim.get("0", "wwpn"));
-    EXPECT_EQ(port->nodeName(), sim.get("0", "wwnn"));
+    EXPECT_EQ(port->portName(), port_value(0, "wwpn"));
+    EXPECT_EQ(port->nodeName(), port_value(0, "wwnn"));
     EXPECT_NE(port->getTarget(2)->SerialNumber, "Unknown");
     EXPECT_GT(port->getTarget(2)->LastBlock, 0u);
-    sim.set("0", "statistic:1040", 77);
+    set_port(0, "statistic:1040", 77);
     EXPECT_EQ(dynamic_cast<FCPortStatistics&>(*port->getStatistics()).LinkFailures, 77u);
-    EXPECT_EQ(sim.open_handles(), 0u);
+    EXPECT_EQ(nvrsim_open_handles(), 0u);
 }
 
 TEST(SimulatedHost, OfADataCentreIsFoundWhole)
 {
-    Simulator sim;
-    sim.load_shipped("typical");
-    Loaded libraries;
+    Loaded libraries("", "typical");
     Management_Session session;
     NVR_Data data;
     EXPECT_EQ(scan(data), "4/4/64");
@@ -72,30 +81,28 @@ TEST(SimulatedHost, OfADataCentreIsFoundWhole)
 
 TEST(SimulatedHost, ShowsWhatChanged)
 {
-    Simulator sim;
     Loaded libraries;
     Management_Session session;
     NVR_Data data;
     EXPECT_EQ(scan(data), "1/1/3");
-    sim.set("0", "present", 0);
+    set_port(0, "present", 0);
     EXPECT_EQ(scan(data), "0/0/0");
-    sim.set("0", "present", 1);
+    set_port(0, "present", 1);
     EXPECT_EQ(scan(data), "1/1/3");
 }
 
 // The system's own libHBAAPI, which finds an adapter only after it was told to load its vendors' libraries.
 TEST(SimulatedHost, IsFoundThroughTheSystemsLibrary)
 {
-    Simulator sim(Simulator::one_port, "real-hba");
     write_file("/etc/hba.conf", read_file(std::string(NVRSIM_BUILD) + "/hba.conf"));
     for (int round = 0; round < 2; round++) {
-        Loaded libraries;
+        Loaded libraries("real-hba");
         EXPECT_EQ(libraries.result, 0);
         Management_Session session;
         NVR_Data data;
         EXPECT_EQ(scan(data), "1/1/3");
-        EXPECT_EQ(data.getPorts()[0]->portName(), sim.get("0", "wwpn"));
-        EXPECT_EQ(sim.open_handles(), 0u);
+        EXPECT_EQ(data.getPorts()[0]->portName(), port_value(0, "wwpn"));
+        EXPECT_EQ(nvrsim_open_handles(), 0u);
     }
 }
 
@@ -115,8 +122,7 @@ struct SimulatedLibraries : testing::TestWithParam<Variant> {};
 TEST_P(SimulatedLibraries, ThatAreMissingCostWhatTheyMust)
 {
     const Variant& variant = GetParam();
-    Simulator sim(Simulator::one_port, variant.libraries);
-    Loaded libraries;
+    Loaded libraries(variant.libraries);
     EXPECT_EQ(libraries.result, variant.result);
     if (variant.session)
         EXPECT_NO_THROW(Management_Session());
@@ -151,11 +157,10 @@ struct SimulatedDamage : testing::TestWithParam<std::tuple<std::string, std::str
 TEST_P(SimulatedDamage, EndsWithTheScan)
 {
     const auto [operation, damage] = GetParam();
-    Simulator sim;
     Loaded libraries;
     Management_Session session;
     NVR_Data data;
-    sim.fail(operation).damaged(damage);
+    add_fault("call = \"" + operation + "\", damage = \"" + damage + '"');
     scan(data);
     for (Port* port : data.getPorts()) {
         try {
@@ -163,13 +168,13 @@ TEST_P(SimulatedDamage, EndsWithTheScan)
         } catch (const std::exception&) {
         }
     }
-    EXPECT_GT(sim.calls(operation), 0u);
-    sim.clear_faults();
-    sim.fail(operation).counting(0xFFFFFFFF);
+    EXPECT_GT(calls(operation), 0u);
+    clear_faults();
+    add_fault("call = \"" + operation + "\", value = 4294967295");
     scan(data);
-    sim.clear_faults();
+    clear_faults();
     EXPECT_EQ(scan(data), "1/1/3");
-    EXPECT_EQ(sim.open_handles(), 0u);
+    EXPECT_EQ(nvrsim_open_handles(), 0u);
 }
 
 INSTANTIATE_TEST_SUITE_P(

@@ -2,7 +2,7 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Service.h"
-#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using host::Value;

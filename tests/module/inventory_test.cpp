@@ -12,8 +12,8 @@
 #include "tests/module/support/Expected.h"
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using testing::ElementsAre;

@@ -13,7 +13,7 @@
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
-#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/simulator.h"
 #include "tests/module/support/Test_Clock.h"
 #include "tests/support/trace.h"
 

@@ -18,7 +18,7 @@
 
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Rig.h"
-#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/simulator.h"
 
 namespace {
 

@@ -6,7 +6,7 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Rig.h"
-#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/simulator.h"
 #include "tests/support/private_host.h"
 
 using namespace nvrtest;

@@ -7,8 +7,8 @@
 #include "tests/module/support/Expected.h"
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 
@@ -18,7 +18,7 @@ void install_system_library()
 {
     link(NVR_SYSTEM_HBAAPI, library_folder() + "/libHBAAPI.so");
     write_file("/etc/hba.conf",
-               std::string("com.norvane.simulator ") + NVR_SIMULATOR_LIB_DIR + "/libnvrsim_hba_vendor.so\n");
+               std::string("com.norvane.simulator ") + NVRSIM_BUILD + "/lib/libnvrsim_hba_vendor.so\n");
 }
 
 } // namespace

@@ -4,8 +4,8 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Service.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/module/support/Test_Clock.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using host::Value;

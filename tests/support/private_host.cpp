@@ -67,7 +67,10 @@ bool exists(const std::string& path)
 
 void remove(const std::string& path)
 {
-    if (std::remove(path.c_str()) != 0 && errno != ENOENT) fail("remove " + path);
+    int failed = std::remove(path.c_str());
+    while (failed && errno == EBUSY && ::umount2(path.c_str(), MNT_DETACH | UMOUNT_NOFOLLOW) == 0)
+        failed = std::remove(path.c_str());
+    if (failed && errno != ENOENT) fail("remove " + path);
 }
 
 void make_folder(const std::string& path)

@@ -18,7 +18,7 @@ void write_file(const std::string& path, const std::string& content);
 /// The content, or "(none)" for what cannot be read.
 std::string read_file(const std::string& path);
 bool exists(const std::string& path);
-/// Removes a file or an empty folder, if it is there.
+/// Removes a file or an empty folder, if it is there, and what covers it.
 void remove(const std::string& path);
 void make_folder(const std::string& path);
 /// `path` becomes a link to `target`.

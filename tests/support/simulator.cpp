@@ -1,6 +1,8 @@
 #include "tests/support/simulator.h"
 
-#include <dirent.h>
+#include <algorithm>
+#include <cstdlib>
+#include <sstream>
 #include <stdexcept>
 
 #include "simulator/nvrsim.h"
@@ -10,85 +12,98 @@ namespace nvrtest {
 
 namespace {
 
-const std::string build = NVRSIM_BUILD;
-
-void check(bool done)
+template <class Read>
+std::string text_of(Read read)
 {
-    if (done) return;
-    std::string text(nvrsim_error(nullptr, 0) + 1, '\0');
-    text.resize(nvrsim_error(text.data(), text.size()));
-    throw std::runtime_error(text);
+    std::string text(read(nullptr, 0) + 1, '\0');
+    text.resize(std::min(text.size() - 1, read(text.data(), text.size())));
+    return text;
 }
 
-void show_libraries(const std::string& folder)
+[[noreturn]] void fail()
 {
-    DIR* entries = ::opendir(folder.c_str());
-    if (!entries) throw std::runtime_error("no libraries in " + folder);
-    while (const dirent* entry = ::readdir(entries)) {
-        const std::string name = entry->d_name;
-        if (name.rfind("lib", 0) == 0) link(folder + "/" + name, library_folder() + "/" + name);
-    }
-    ::closedir(entries);
+    throw std::runtime_error(text_of(nvrsim_error));
+}
+
+const char* const library_names[] = {"HBAAPI", "lrmapi", "rmapi", "tssdm"};
+
+std::string file_of(const std::string& library)
+{
+    return "/lib" + library + ".so";
 }
 
 } // namespace
 
-const char* const Simulator::one_port = "[[adapter]]\n[[target]]\nluns = 3\n";
-
-Simulator::Simulator(const std::string& scenario, const std::string& libraries)
+void load_scenario(const std::string& scenario)
 {
-    show_libraries(libraries.empty() ? build + "/lib" : build + "/variants/" + libraries);
-    load(scenario);
+    const bool is_text = scenario.find('\n') != std::string::npos;
+    const int loaded = is_text ? nvrsim_load_text(scenario.c_str(), "scenario of the test")
+                               : nvrsim_load((std::string(NVRSIM_BUILD) + "/scenarios/" + scenario + ".toml").c_str());
+    if (loaded != 0) fail();
 }
 
-void Simulator::load(const std::string& scenario)
+void add_fault(const std::string& fault)
 {
-    check(nvrsim_load_text(scenario.c_str(), "test") == 0);
+    if (nvrsim_fault(fault.c_str()) < 0) fail();
 }
 
-void Simulator::load_shipped(const std::string& name)
-{
-    check(nvrsim_load((build + "/scenarios/" + name + ".toml").c_str()) == 0);
-}
-
-Simulator::Fault::Fault(std::string operation) : m_table("call = \"" + operation + "\"") {}
-
-Simulator::Fault::~Fault() noexcept(false)
-{
-    check(nvrsim_fault(m_table.c_str()) > 0);
-}
-
-Simulator::Fault& Simulator::Fault::add(const std::string& key, const std::string& value)
-{
-    m_table += ", " + key + " = " + value;
-    return *this;
-}
-
-void Simulator::clear_faults()
+void clear_faults()
 {
     nvrsim_clear_faults();
 }
 
-std::uint64_t Simulator::calls(const std::string& operation) const
+std::uint64_t fault_hits()
+{
+    // One line a fault, "... seen=N hits=N".
+    std::istringstream lines(text_of(nvrsim_faults));
+    std::uint64_t hits = 0;
+    for (std::string line; std::getline(lines, line);) {
+        const std::string word = " hits=";
+        const std::size_t at = line.rfind(word);
+        if (at == std::string::npos) throw std::runtime_error("no count of hits in: " + line);
+        hits += std::strtoull(line.c_str() + at + word.size(), nullptr, 10);
+    }
+    return hits;
+}
+
+std::uint64_t calls(const std::string& operation)
 {
     return nvrsim_calls(operation.c_str());
 }
 
-std::string Simulator::get(const std::string& port, const std::string& name) const
+std::string port_value(unsigned number, const std::string& name)
 {
-    std::string text(nvrsim_get(port.c_str(), name.c_str(), nullptr, 0) + 1, '\0');
-    text.resize(nvrsim_get(port.c_str(), name.c_str(), text.data(), text.size()));
-    return text;
+    return text_of([&](char* buffer, std::size_t size) {
+        return nvrsim_get(std::to_string(number).c_str(), name.c_str(), buffer, size);
+    });
 }
 
-void Simulator::set(const std::string& port, const std::string& name, std::uint64_t value)
+void set_port(unsigned number, const std::string& name, std::uint64_t value)
 {
-    check(nvrsim_set(port.c_str(), name.c_str(), value) == 0);
+    if (nvrsim_set(std::to_string(number).c_str(), name.c_str(), value) != 0) fail();
 }
 
-std::size_t Simulator::open_handles() const
+void compose_libraries(const std::vector<std::string>& present)
 {
-    return nvrsim_open_handles();
+    for (const char* name : library_names) {
+        const std::string path = library_folder() + file_of(name);
+        if (std::find(present.begin(), present.end(), name) != present.end())
+            link(NVRSIM_BUILD "/lib" + file_of(name), path);
+        else
+            write_file(path, "No library of this name is installed.\n");
+    }
+}
+
+void compose_variant(const std::string& variant)
+{
+    for (const char* name : library_names) {
+        const std::string file = NVRSIM_BUILD "/variants/" + variant + file_of(name);
+        const std::string path = library_folder() + file_of(name);
+        if (exists(file))
+            link(file, path);
+        else
+            remove(path);
+    }
 }
 
 } // namespace nvrtest

@@ -9,7 +9,7 @@ namespace nvrtest {
 Ended_Command nvrcim(const std::string& arguments, const std::string& scenario, const std::string& environment)
 {
     const std::string command = environment + " '" + NVR_NVRCIM + "' --module '" + NVR_MODULE + "' --scenario '" +
-                                NVR_SCENARIO_DIR + "/" + scenario + ".toml' " + arguments + " 2>&1";
+                                NVRSIM_BUILD + "/scenarios/" + scenario + ".toml' " + arguments + " 2>&1";
     FILE* child = popen(command.c_str(), "r");
     if (!child) throw std::runtime_error("cannot start a shell");
     Ended_Command run;

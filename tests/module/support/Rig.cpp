@@ -7,7 +7,7 @@
 #include <thread>
 #include <unistd.h>
 
-#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/simulator.h"
 #include "tests/module/support/Test_Clock.h"
 #include "tests/support/private_host.h"
 
@@ -17,6 +17,12 @@ namespace {
 
 constexpr char name_space[] = "root/norvane";
 constexpr char refresh_start[] = "PERF: Creating DataFetch_Handler Thread.";
+// Less than what ctest gives a test, so that it can tell why it failed.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr std::chrono::seconds patience{500};
+#else
+constexpr std::chrono::seconds patience{100};
+#endif
 constexpr char refresh_end[] = "PERF: DataFetch_Handler Thread END";
 
 bool ends_with(const std::string& line, const std::string& end)
@@ -93,7 +99,7 @@ void Rig::stop()
 
 void Rig::restart()
 {
-    stop();
+    m_server.reset();
     start();
 }
 
@@ -134,7 +140,7 @@ std::size_t Rig::refreshes() const
 
 void Rig::wait_for_refreshes(std::size_t count)
 {
-    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(50);
+    const auto deadline = std::chrono::steady_clock::now() + patience;
     while (refreshes() < count) {
         if (std::chrono::steady_clock::now() > deadline) throw std::runtime_error("the refresh does not end");
         std::this_thread::sleep_for(std::chrono::milliseconds(1));
