@@ -8,11 +8,14 @@ function(norvane_room name)
 endfunction()
 
 # norvane_test(NAME SOURCES... [LINK libs...] [TIMEOUT s]): a GoogleTest program; each test runs in a process of its own,
-# since much of what is tested lives once a process.
+# since much of what is tested lives once a process. Under a sanitizer it may take five times as long.
 function(norvane_test name)
   cmake_parse_arguments(TEST "" "TIMEOUT" "SOURCES;LINK;ENVIRONMENT" ${ARGN})
   if(NOT TEST_TIMEOUT)
     set(TEST_TIMEOUT 60)
+  endif()
+  if(NORVANE_SANITIZE)
+    math(EXPR TEST_TIMEOUT "${TEST_TIMEOUT} * 5")
   endif()
   add_executable(${name} ${TEST_SOURCES})
   target_link_libraries(${name} PRIVATE ${TEST_LINK} GTest::gmock)
