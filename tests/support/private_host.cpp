@@ -104,4 +104,21 @@ void make_unopenable(const std::string& path)
     bind_over(cover, path);
 }
 
+Small_Disk::Small_Disk(std::string folder) : m_folder(std::move(folder))
+{
+    if (::mount("tmpfs", m_folder.c_str(), "tmpfs", 0, "size=64k,mode=0755") != 0) fail("a disk on " + m_folder);
+}
+
+Small_Disk::~Small_Disk()
+{
+    ::umount2(m_folder.c_str(), MNT_DETACH);
+}
+
+void Small_Disk::fill() const
+{
+    std::ofstream file(m_folder + "/filler", std::ios::binary);
+    file << std::string(1024 * 1024, 'x') << std::flush;
+    if (file) throw std::runtime_error("the disk on " + m_folder + " has no end");
+}
+
 } // namespace nvrtest

@@ -29,4 +29,19 @@ void link(const std::string& target, const std::string& path);
 void cover_file(const std::string& path, const std::string& content);
 void make_unopenable(const std::string& path);
 
+/// A disk of 64 KiB over an existing folder; gone, with all that is on it, at the object's end.
+class Small_Disk {
+public:
+    explicit Small_Disk(std::string folder);
+    ~Small_Disk();
+    Small_Disk(const Small_Disk&) = delete;
+    Small_Disk& operator=(const Small_Disk&) = delete;
+
+    /// Puts a file "filler" there, as large as it can be: others can then be made, but not written.
+    void fill() const;
+
+private:
+    const std::string m_folder;
+};
+
 } // namespace nvrtest
