@@ -6,8 +6,8 @@
 # libcurl4 is what the module loads for transfers; python3, python3-pyftpdlib and openssl make the servers that tests transfer
 # from and to: HTTP and HTTPS come with Python, FTP does not, and HTTPS needs a certificate.
 # shellcheck disable=SC2034 # the scripts that source this file use it
-packages="g++ cmake ninja-build ccache binutils libhbaapi-dev libhbaapi2 libtomlplusplus-dev libcli11-dev
-    nlohmann-json3-dev libgtest-dev libgmock-dev libbenchmark-dev cmark-gfm
+packages="g++ cmake ninja-build ccache binutils libhbaapi-dev libhbaapi2 librapidxml-dev
+    libtomlplusplus-dev libcli11-dev nlohmann-json3-dev libgtest-dev libgmock-dev libbenchmark-dev cmark-gfm
     libcurl4 python3 python3-pyftpdlib openssl lintian dpkg-dev"
 
 # install_packages NAMES...: asks apt for those that are not there yet, so that a second run costs nothing.
