@@ -7,7 +7,7 @@
 
 #include "tests/module/support/Entries.h"
 #include "tests/module/support/Service.h"
-#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using host::Value;
