@@ -1,6 +1,7 @@
 // The rebuild of the SAN-side maps: its walk over adapters and ports, and how a failure ends it.
 #include <cxxabi.h>
 #include <exception>
+#include <malloc.h>
 
 #include "agent/SAN_Update.h"
 #include "agent/instance_table.h"
@@ -16,6 +17,10 @@
 namespace cimple {
 
 namespace {
+
+/// From so many on the memory of the old maps is given back to the system before the new ones are made. The allocator
+/// seldom gives this refresh's thread the arena of the last one's, and the server would hold both.
+constexpr std::size_t many_paths = 4096;
 
 std::string smallLetters(const char* text)
 {
@@ -76,7 +81,9 @@ void SAN_Update::buildPort(Port& port)
 uint32 ProviderAgent::updateSANMaps()
 {
     NVR_LOG("PERF: updateSANMaps: Entry");
+    const std::size_t paths = m_NVRHBA_SCSIProtocolEndpoint_map.size();
     clearSANMaps();
+    if (paths >= many_paths) malloc_trim(0);
     try {
         if (m_pData && m_pData->haveAdapters()) SAN_Update(*this).walkAdapters();
     } catch (abi::__forced_unwind&) {
