@@ -4,7 +4,7 @@ namespace cimple {
 
 int Instance_Map::find(const Instance* key) const
 {
-    if (!key || empty()) return -1;
+    if (!key) return -1;
     return m_index.find(key, m_instances);
 }
 
@@ -16,10 +16,12 @@ Instance* Instance_Map::lookup(const Instance* key) const
 
 int Instance_Map::insert(Instance* instance)
 {
-    if (!instance || find(instance) >= 0) return -1;
+    if (!instance) return -1;
+    const Key_Index::Entry entry = m_index.entry_of(instance);
+    if (m_index.find(entry, instance, m_instances) >= 0) return -1;
     m_instances.append(instance);
     try {
-        m_index.append(m_instances);
+        m_index.append(entry, m_instances);
     } catch (...) {
         // Without memory the caller keeps its instance, as after any refusal, and the list stays as it was.
         m_instances.remove(m_instances.size() - 1);

@@ -95,12 +95,16 @@ void Key_Index::learn_shape(const Instance* instance)
         if (is_reference(m_keys[i])) learn_shape(reference_of(instance, as_reference(m_keys[i])));
 }
 
-void Key_Index::append(const Array<Instance*>& list)
+Key_Index::Entry Key_Index::entry_of(const Instance* instance)
 {
-    const std::size_t position = list.size() - 1;
-    if (m_shape.empty()) learn_shape(list[position]);
+    if (m_shape.empty()) learn_shape(instance);
     Entry entry{0, false};
-    entry.strange = !hash(list[position], entry.hash);
+    entry.strange = !hash(instance, entry.hash);
+    return entry;
+}
+
+void Key_Index::append(const Entry& entry, const Array<Instance*>& list)
+{
     std::vector<uint32> wider;
     const bool grow = m_slots.size() < 2 * list.size();
     if (grow) wider.resize(m_slots.empty() ? first_slots : 2 * m_slots.size());
@@ -110,7 +114,7 @@ void Key_Index::append(const Array<Instance*>& list)
         m_slots.swap(wider);
         place_all();
     } else if (!entry.strange)
-        place(position);
+        place(list.size() - 1);
 }
 
 void Key_Index::place(std::size_t position)
@@ -142,16 +146,23 @@ void Key_Index::clear()
 
 int Key_Index::find(const Instance* key, const Array<Instance*>& list) const
 {
-    uint64 value;
-    if (m_strangers != 0 || !hash(key, value)) {
+    Entry entry{0, false};
+    entry.strange = !hash(key, entry.hash);
+    return find(entry, key, list);
+}
+
+int Key_Index::find(const Entry& entry, const Instance* key, const Array<Instance*>& list) const
+{
+    if (list.size() == 0) return -1;
+    if (m_strangers != 0 || entry.strange) {
         for (std::size_t i = 0; i < list.size(); i++)
             if (key_eq(key, list[i])) return static_cast<int>(i);
         return -1;
     }
-    for (std::size_t slot = value & (m_slots.size() - 1); m_slots[slot] != 0;
+    for (std::size_t slot = entry.hash & (m_slots.size() - 1); m_slots[slot] != 0;
          slot = (slot + 1) & (m_slots.size() - 1)) {
         const std::size_t i = m_slots[slot] - 1;
-        if (m_entries[i].hash == value && key_eq(key, list[i])) return static_cast<int>(i);
+        if (m_entries[i].hash == entry.hash && key_eq(key, list[i])) return static_cast<int>(i);
     }
     return -1;
 }

@@ -14,14 +14,23 @@ namespace cimple {
 
 class Key_Index {
 public:
+    /// What the index knows of an instance: made once, for the search and for the place.
+    struct Entry {
+        uint64 hash;
+        bool strange; // of another shape than the list's first element: it has no hash, and no slot
+    };
+    /// The entry of an instance that may be appended; the first one gives the index its shape.
+    Entry entry_of(const Instance* instance);
     /// Notes the element that has just been appended to `list`. An exception leaves the index as it was.
-    void append(const Array<Instance*>& list);
+    void append(const Entry& entry, const Array<Instance*>& list);
     /// Notes that the element at `position` has left the list.
     void remove(std::size_t position);
     void clear();
 
     /// The position of the first element of `list` whose keys agree with `key`'s, or -1.
     int find(const Instance* key, const Array<Instance*>& list) const;
+    /// The same for a key whose entry was made.
+    int find(const Entry& entry, const Instance* key, const Array<Instance*>& list) const;
 
 private:
     /// The hash of an instance of this index's shape; false for another shape.
@@ -31,10 +40,6 @@ private:
     void place(std::size_t position);
     void place_all();
 
-    struct Entry {
-        uint64 hash;
-        bool strange; // of another shape, not in the slots
-    };
     /// One instance of the shape: its class (null: no instance) and its keys, `count` of m_keys from `first` on.
     struct Node {
         const Meta_Class* meta_class;

@@ -10,6 +10,8 @@
 #include <unordered_map>
 
 #include "agent/ProviderAgent.h"
+#include "agent/Text_Pool.h"
+#include "agent/instance_table.h"
 #include "agent/lun_naming.h"
 #include "runtime/String.h"
 
@@ -63,6 +65,8 @@ private:
     Instance* tie(Instance_Map& map, std::initializer_list<End> ends);
 
     ProviderAgent& m_agent;
+    Text_Pool m_texts;
+    const String m_nameSpace = m_texts(norvane_name_space);
     Instance* m_host = nullptr;
     String m_hostClass;
     String m_hostName;

@@ -19,8 +19,8 @@ constexpr const char* interop_name_space = "root/pg_interop";
 
 void logCreationFailed(const char* failure);
 
-template <class T>
-Ref<T> make(const char* name_space = norvane_name_space)
+template <class T, class Text = const char*>
+Ref<T> make(const Text& name_space = norvane_name_space)
 {
     Ref<T> instance(create_as<T>(true));
     instance->__name_space = name_space;

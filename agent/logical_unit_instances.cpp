@@ -20,11 +20,11 @@ bool hasCapacity(const Target& target)
 }
 
 template <class T>
-void setCapacity(T& unit, const Target& target)
+void setCapacity(T& unit, const Target& target, Text_Pool& texts)
 {
     if (!hasCapacity(target)) return;
     set(unit.Capacity, target.BlockSize * target.LastBlock);
-    set(unit.CapacityUnit, "Byte");
+    set(unit.CapacityUnit, texts("Byte"));
 }
 
 template <class T>
@@ -47,16 +47,16 @@ template <class T>
 Ref<T> SAN_Update::makeUnit(const char* class_name, const Target_Scope& scope, const Unit_Class_Row& row)
 {
     const Target& target = scope.target;
-    auto unit = make<T>();
+    auto unit = make<T>(m_nameSpace);
     set(unit->SystemCreationClassName, m_hostClass);
     set(unit->SystemName, m_hostName);
-    set(unit->CreationClassName, class_name);
+    set(unit->CreationClassName, m_texts(class_name));
     set(unit->Description, scope.inquiry);
     set(unit->DeviceID,
         text("%s_%s_%s_%s", scope.wwpn, target.PortName.c_str(), scope.identifier.c_str(), scope.lun.c_str()));
     set(unit->ElementName, text(row.elementName, static_cast<int>(target.OSLun)));
     set(unit->OtherIdentifyingInfo, {text_of(target.OSDeviceName), scope.shortInquiry});
-    set(unit->IdentifyingDescriptions, {"OS Device Name", "Standard SCSI inquiry data"});
+    set(unit->IdentifyingDescriptions, {m_texts("OS Device Name"), m_texts("Standard SCSI inquiry data")});
     set(unit->OperationalStatus, {0});
     set(unit->DeviceType, target.DeviceType);
     return unit;
@@ -69,7 +69,7 @@ Ref<Instance> SAN_Update::makeStorageVolume(const Target_Scope& scope, const Uni
     auto volume = makeUnit<NVRHBA_StorageVolume>("NVRHBA_StorageVolume", scope, row);
     NVR_LOG("StorageVolumeInstance->DeviceID = %s", volume->DeviceID.value.c_str());
     setBlocks(*volume, target);
-    setCapacity(*volume, target);
+    setCapacity(*volume, target, m_texts);
     set(volume->Name, unit_name(target.Identifier, scope.identifier));
     if (const Name_Format_Row* format = name_format(target.Identifier.identifierType)) {
         set(volume->NameFormat, format->nameFormat);
@@ -84,7 +84,7 @@ Ref<Instance> SAN_Update::makeTapeDrive(const Target_Scope& scope, const Unit_Cl
 {
     const Target& target = scope.target;
     auto drive = makeUnit<NVRHBA_TapeDrive>("NVRHBA_TapeDrive", scope, row);
-    setCapacity(*drive, target);
+    setCapacity(*drive, target, m_texts);
     set(drive->Name, target.OSDeviceName);
     set(drive->OtherIdentifyingInfo,
         {text_of(target.OSDeviceName),
@@ -97,7 +97,7 @@ Ref<Instance> SAN_Update::makeLogicalDisk(const Target_Scope& scope, const Unit_
 {
     const Target& target = scope.target;
     auto disk = makeUnit<NVRHBA_LogicalDisk>("NVRHBA_LogicalDisk", scope, row);
-    setCapacity(*disk, target);
+    setCapacity(*disk, target, m_texts);
     setBlocks(*disk, target);
     set(disk->Name, unit_name(target.Identifier, scope.identifier));
     set(disk->DataOrganization, 1);
@@ -120,7 +120,7 @@ Ref<Instance> SAN_Update::makeStorageExtent(const Target_Scope& scope, const Uni
     const Target& target = scope.target;
     auto extent = makeUnit<NVRHBA_StorageExtent>("NVRHBA_StorageExtent", scope, row);
     setBlocks(*extent, target);
-    setCapacity(*extent, target);
+    setCapacity(*extent, target, m_texts);
     set(extent->Name, unit_name(target.Identifier, scope.identifier));
     // In this order, though the values stand the other way round.
     set(extent->IdentifyingDescriptions, {"Standard SCSI inquiry data", "OS Device Name"});

@@ -62,7 +62,7 @@ String lunText(uint64 lun)
 Instance* SAN_Update::tie(Instance_Map& map, std::initializer_list<End> ends)
 {
     Ref<Instance> association(create(map.meta_class(), true));
-    association->__name_space = norvane_name_space;
+    association->__name_space = m_nameSpace;
     for (const End& end : ends) {
         const Meta_Feature* feature = find_feature(map.meta_class(), end.reference, META_FLAG_REFERENCE);
         ref(end.instance);
@@ -74,14 +74,14 @@ Instance* SAN_Update::tie(Instance_Map& map, std::initializer_list<End> ends)
 Instance* SAN_Update::buildEndpoint(const Target_Scope& scope)
 {
     const Target& target = scope.target;
-    auto endpoint = make<NVRHBA_SCSIProtocolEndpoint>();
-    set(endpoint->TargetWWPN, target.PortName);
-    set(endpoint->TargetWWNN, target.NodeName);
+    auto endpoint = make<NVRHBA_SCSIProtocolEndpoint>(m_nameSpace);
+    set(endpoint->TargetWWPN, m_texts(target.PortName));
+    set(endpoint->TargetWWNN, m_texts(target.NodeName));
     set(endpoint->Description, scope.inquiry);
     set(endpoint->SystemCreationClassName, m_hostClass);
     set(endpoint->SystemName, m_hostName);
-    set(endpoint->CreationClassName, "NVRHBA_SCSIProtocolEndpoint");
-    set(endpoint->ElementName, target.Product);
+    set(endpoint->CreationClassName, m_texts("NVRHBA_SCSIProtocolEndpoint"));
+    set(endpoint->ElementName, m_texts(target.Product));
     set(endpoint->Name, text("%s:%s:%s", scope.wwpn, target.PortName.c_str(), scope.lun.c_str()));
     set(endpoint->ProtocolType, 18);
     set(endpoint->ProtocolIFType, 56);
@@ -95,7 +95,7 @@ Instance* SAN_Update::buildEndpoint(const Target_Scope& scope)
     set(endpoint->SCSIBusNumber, target.BusNumber);
     set(endpoint->SCSITargetNumber, target.TargetNumber);
     set(endpoint->OtherIdentifyingInfo, {text_of(target.OSDeviceName)});
-    set(endpoint->IdentifyingDescriptions, {"OS Device Name"});
+    set(endpoint->IdentifyingDescriptions, {m_texts("OS Device Name")});
     return insert(m_agent.m_NVRHBA_SCSIProtocolEndpoint_map, endpoint);
 }
 
@@ -125,8 +125,9 @@ void SAN_Update::buildTarget(Target_Scope& scope, int index)
     scope.lun = lunText(target.FcpLun);
     scope.inquiry = text("%.8s %.16s Revision %.4s Serial Number %.40s", target.Vendor.c_str(), target.Product.c_str(),
                          target.Revision.c_str(), target.SerialNumber.c_str());
-    scope.shortInquiry =
+    const String shortInquiry =
         text("%.8s %.16s Revision %.4s", target.Vendor.c_str(), target.Product.c_str(), target.Revision.c_str());
+    scope.shortInquiry = m_texts({shortInquiry.c_str(), shortInquiry.size()});
 
     Instance* endpoint = buildEndpoint(scope);
     NVR_LOG("Generating NVRHBA_LocalHostedAccessPoint (Local Hosted Access Point %s:%s:%s)", scope.wwpn,
