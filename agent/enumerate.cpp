@@ -27,22 +27,59 @@ bool copyOne(const Instance_Map& source, std::size_t index, const Selection* sel
     return true;
 }
 
-/// Clones what the handler's owner wants of `source` into `copies`; false if a clone was refused.
-bool copyMap(const Instance_Map& source, Instance_Map& copies, const Enum_Handler& handler)
+/// Takes, by their index, the elements of `source` that a selection wants, all without one; false where `take` gave up.
+template <class Take>
+bool takeWanted(const Instance_Map& source, Selection* selection, Take take)
 {
-    Selection* selection = Selection::of(handler);
     if (const Instance* key = selection ? selection->key() : nullptr) {
         const int found = source.find(key);
-        if (found >= 0) copyOne(source, static_cast<std::size_t>(found), selection, copies);
+        if (found >= 0 && !take(static_cast<std::size_t>(found))) return false;
     } else {
-        for (std::size_t i = 0; i < source.size(); i++) {
-            if (selection && !selection->wants(source[i])) continue;
-            if (!copyOne(source, i, selection, copies)) return false;
-        }
+        for (std::size_t i = 0; i < source.size(); i++)
+            if ((!selection || selection->wants(source[i])) && !take(i)) return false;
     }
     if (selection) selection->asked_all();
     return true;
 }
+
+/// Clones what the handler's owner wants of `source` into `copies`; false if a clone was refused.
+bool copyMap(const Instance_Map& source, Instance_Map& copies, const Enum_Handler& handler)
+{
+    Selection* selection = Selection::of(handler);
+    return takeWanted(source, selection, [&](std::size_t i) { return copyOne(source, i, selection, copies); });
+}
+
+/// Elements of a map that nobody writes to, each held by a count.
+class Shared_Elements {
+public:
+    Shared_Elements() = default;
+    Shared_Elements(const Shared_Elements&) = delete;
+    Shared_Elements& operator=(const Shared_Elements&) = delete;
+    ~Shared_Elements()
+    {
+        while (m_next < m_elements.size())
+            unref(m_elements[m_next++]);
+    }
+
+    void take(const Instance_Map& source, Selection& selection)
+    {
+        takeWanted(source, &selection, [&](std::size_t i) {
+            m_elements.append(source[i]);
+            ref(source[i]);
+            return true;
+        });
+    }
+    /// Each count becomes the handler's.
+    void hand_over(const Enum_Handler& handler)
+    {
+        while (m_next < m_elements.size())
+            handler.handle(m_elements[m_next++]);
+    }
+
+private:
+    Array<Instance*> m_elements;
+    std::size_t m_next = 0;
+};
 
 } // namespace
 
@@ -71,12 +108,18 @@ void enumerateSAN(ProviderAgent& agent, const Instance_Map& source, const Enum_H
         }
         agent.BuildCimpleInfo();
         Instance_Map copies(source.meta_class());
+        Shared_Elements shared; // an instance of this side is never written to once it is in its map
         {
             Auto_Mutex maps(agent.m_SANMapsReadyMutex);
             if (!agent.m_bIsSANMapsReady) agent.waitForSANMaps();
             Auto_Mutex data(agent.m_DataMutex);
-            if (!copyMap(source, copies, handler)) return;
+            Selection* selection = Selection::of(handler);
+            if (selection && selection->only_reads())
+                shared.take(source, *selection);
+            else if (!copyMap(source, copies, handler))
+                return;
         }
+        shared.hand_over(handler);
         copies.hand_over(handler);
     });
     if (!done) NVR_LOG("Exception in SAN CIM Provider Enumeration - do nothing");

@@ -114,7 +114,7 @@ struct Reference_Filter : Selection {
 struct Associator_Filter : Selection {
     Associator_Filter(const Instance* source, const String& result_class, const String& role, const String& result_role,
                       Enum_Handler_Proc proc, void* data)
-        : Selection(this, Values::all), source(source), result_class(result_class), role(role),
+        : Selection(this, Values::all, Handler::only_reads), source(source), result_class(result_class), role(role),
           result_role(result_role), proc(proc), data(data)
     {
     }

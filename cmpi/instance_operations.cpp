@@ -52,7 +52,7 @@ bool deliver_instance(Instance* instance, int, void* data)
 
 // Keeps the first instance with the keys of a model.
 struct Search : Selection {
-    explicit Search(const Instance* model) : Selection(this, Values::keys_of_ends), model(model) {}
+    explicit Search(const Instance* model) : Selection(this, Values::keys_of_ends, Handler::only_reads), model(model) {}
     const Instance* key() const override { return model; }
 
     const Instance* model;
@@ -114,7 +114,7 @@ CMPIStatus enumerateInstanceNames(CMPIInstanceMI* mi, const CMPIContext* ctx, co
         nullify_properties(read, false, true, 1);
 
         Delivery delivery{adapter.broker, rslt, name_space_of(op), nullptr, 0};
-        const Selection names(&delivery, Selection::Values::keys);
+        const Selection names(&delivery, Selection::Values::keys, Selection::Handler::only_reads);
         int status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, read, &deliver_name, &delivery);
         if (status == ENUM_INSTANCES_OK) return return_done(rslt);
         return enum_instances_codes.code(status);
@@ -133,7 +133,8 @@ CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* ctx, const 
         filter_properties(read, properties, true);
 
         Delivery delivery{adapter.broker, rslt, name_space_of(op), properties, 0};
-        const Selection instances(&delivery, Selection::Values::keys_of_ends); // references become paths
+        const Selection instances(&delivery, Selection::Values::keys_of_ends, // references become paths
+                                  Selection::Handler::only_reads);
         int status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, read, &deliver_instance, &delivery);
         if (const Status_Row* failure = enum_instances_codes.find(status)) return failure->code;
         return return_done(rslt);

@@ -8,8 +8,8 @@ thread_local Selection* innermost = nullptr;
 
 } // namespace
 
-Selection::Selection(const void* handler_data, Values values)
-    : m_handler_data(handler_data), m_values(values), m_outer(innermost)
+Selection::Selection(const void* handler_data, Values values, Handler handler)
+    : m_handler_data(handler_data), m_values(values), m_handler(handler), m_outer(innermost)
 {
     innermost = this;
 }

@@ -14,7 +14,11 @@ public:
     /// The values of an instance that will be looked at: all; all, but of the ends of references the keys alone; keys.
     enum class Values { all, keys_of_ends, keys };
 
-    Selection(const void* handler_data, Values values);
+    /// What the handler does with an instance that it was handed: it may change it, or it never does, so that it may
+    /// get a count of one that others read too.
+    enum class Handler { may_write, only_reads };
+
+    Selection(const void* handler_data, Values values, Handler handler = Handler::may_write);
     virtual ~Selection();
     Selection(const Selection&) = delete;
     Selection& operator=(const Selection&) = delete;
@@ -23,6 +27,7 @@ public:
     static Selection* of(const Enum_Handler& handler);
 
     Values values() const { return m_values; }
+    bool only_reads() const { return m_handler == Handler::only_reads; }
 
     /// If not null: only the first instance that key_eq finds equal to this one is wanted.
     virtual const Instance* key() const { return nullptr; }
@@ -35,6 +40,7 @@ public:
 private:
     const void* m_handler_data;
     Values m_values;
+    Handler m_handler;
     Selection* m_outer;
 };
 

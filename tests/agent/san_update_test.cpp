@@ -1,6 +1,7 @@
 // The SAN side: what the targets behind the simulated ports become.
 
 #include <set>
+#include <stdexcept>
 
 #include "classes/NVRHBA_StorageVolume.h"
 #include "inventory/NVR_Data.h"
@@ -712,6 +713,55 @@ TEST_F(SANUpdate, ASelectionIsAskedForEachInOrderAndGetsItsOwnInTheirOrder)
         EXPECT_TRUE(key_eq(found[i].get(), all[i + 1].get()));
         EXPECT_EQ(end(found[i].get(), "PartComponent", "Description"), "null") << "the keys are all that is looked at";
     }
+}
+
+TEST_F(SANUpdate, AReaderSharesWhatNobodyWritesAndItOutlivesTheMaps)
+{
+    refresh();
+    Instance_Map& volumes = agent().m_NVRHBA_StorageVolume_map;
+    const Instances all = san(volumes);
+    ASSERT_GT(all.size(), 1u);
+    EXPECT_NE(all[0].get(), volumes[0]);
+    Instances read;
+    const Selection reader(&read, Selection::Values::all, Selection::Handler::only_reads);
+    enumerateSAN(agent(), volumes, {collect, &read});
+    ASSERT_EQ(read.size(), all.size());
+    EXPECT_EQ(read[0].get(), volumes[0]);
+    {
+        ProviderAgent& a = agent();
+        Auto_Mutex data(a.m_DataMutex);
+        a.clearSANMaps();
+    }
+    for (std::size_t i = 0; i < read.size(); i++)
+        EXPECT_TRUE(identical(read[i].get(), all[i].get()));
+
+    Instances ports;
+    const Selection port_reader(&ports, Selection::Values::all, Selection::Handler::only_reads);
+    enumeratePlain(agent(), agent().m_NVRHBA_FCPort_map, {collect, &ports});
+    ASSERT_THAT(ports, SizeIs(1));
+    EXPECT_NE(ports[0].get(), first(agent().m_NVRHBA_FCPort_map)) << "a port's status is written to where it lies";
+}
+
+TEST_F(SANUpdate, AReadersHandlerThatThrowsLosesNoCount)
+{
+    refresh();
+    const Instance_Map& volumes = agent().m_NVRHBA_StorageVolume_map;
+    int data = 0;
+    const Selection reader(&data, Selection::Values::all, Selection::Handler::only_reads);
+    const Enum_Handler handler{[](Instance* instance, int, void*) -> bool {
+                                   unref(instance);
+                                   throw std::runtime_error("handler");
+                               },
+                               &data};
+    enumerateSAN(agent(), volumes, handler);
+    EXPECT_THAT(words(), Contains("Exception in SAN CIM Provider Enumeration - do nothing"));
+    const Instance* second = volumes[1];
+    std::size_t holders = 1; // the map, and the associations that hold it
+    for (const Instance_Map* map :
+         {static_cast<Instance_Map*>(&agent().m_NVRHBA_StorageVolumeSystemDevice_map),
+          static_cast<Instance_Map*>(&agent().m_NVRHBA_SCSIInitiatorTargetStorageVolumePath_map)})
+        holders += map->size() / volumes.size();
+    EXPECT_EQ(second->refs, holders);
 }
 
 TEST_F(SANUpdate, AnAssociationOutlivesTheMapsOfItsEnds)
