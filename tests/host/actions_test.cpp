@@ -1,6 +1,9 @@
 // The table of the command's actions, the words of their numbers, and the question before them.
+#include <cstdlib>
+#include <fcntl.h>
 #include <set>
 #include <sstream>
+#include <unistd.h>
 
 #include <gmock/gmock.h>
 
@@ -114,4 +117,65 @@ TEST(Question, TakesYesAloneForYes)
         std::ostringstream out;
         EXPECT_FALSE(confirm("Really?", in, out)) << text;
     }
+}
+
+namespace {
+
+/// Standard error led elsewhere while it lives.
+class Led_Error {
+public:
+    explicit Led_Error(int to) : m_own(::dup(STDERR_FILENO)) { ::dup2(to, STDERR_FILENO); }
+    ~Led_Error()
+    {
+        ::dup2(m_own, STDERR_FILENO);
+        ::close(m_own);
+    }
+    Led_Error(const Led_Error&) = delete;
+    Led_Error& operator=(const Led_Error&) = delete;
+
+private:
+    const int m_own;
+};
+
+/// Reads on until the text has come.
+std::string read_to(int from, const std::string& text)
+{
+    std::string all;
+    char c;
+    while (all.find(text) == std::string::npos && ::read(from, &c, 1) == 1)
+        all += c;
+    return all;
+}
+
+} // namespace
+
+TEST(SignOfLife, IsALineOnATerminalThatGoesAwayAgain)
+{
+    const int master = ::posix_openpt(O_RDWR | O_NOCTTY);
+    ASSERT_GE(master, 0);
+    ASSERT_EQ(::grantpt(master), 0);
+    ASSERT_EQ(::unlockpt(master), 0);
+    const int terminal = ::open(::ptsname(master), O_RDWR | O_NOCTTY);
+    ASSERT_GE(terminal, 0);
+    {
+        const Led_Error led(terminal);
+        const Progress progress("resetting the adapter");
+        EXPECT_THAT(read_to(master, " s"), testing::ContainsRegex("[|] resetting the adapter, [0-9]+ s"));
+    }
+    EXPECT_THAT(read_to(master, "\033[K"), testing::EndsWith("\r\033[K"));
+    ::close(terminal);
+    ::close(master);
+}
+
+TEST(SignOfLife, IsNotWrittenIntoAFile)
+{
+    int ends[2];
+    ASSERT_EQ(::pipe2(ends, O_NONBLOCK), 0);
+    {
+        const Led_Error led(ends[1]);
+        const Progress progress("resetting the adapter");
+    }
+    ::close(ends[1]);
+    EXPECT_EQ(read_to(ends[0], "anything"), "");
+    ::close(ends[0]);
 }

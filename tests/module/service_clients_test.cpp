@@ -113,6 +113,34 @@ TEST_P(ServiceClients, ThatAskForRefreshesDoNotKeepOthersFromAsking)
     EXPECT_THAT(rig.server().report().violations, IsEmpty());
 }
 
+// A change of names from end to end: asked for, activated by a reset, and published by the refresh that the reset asks
+// for.
+TEST_P(ServiceClients, SeeANewNameAfterTheResetThatActivatesIt)
+{
+    Rig rig({*GetParam()});
+    Service names(rig, wwn_class);
+    Service firmware(rig, "NVRHBA_SoftwareInstallationService", "NVRHBA_FCSoftwareInstallationService");
+    const Value target = port(rig, 1);
+    const Called changed = names.call("ChangeWWN", {{"Target", target},
+                                                    {"NewWWPN", Value::string("10000000C9A0F001")},
+                                                    {"NewWWNN", Value::string("20000000C9A0F001")},
+                                                    {"Type", Value::uint16(1)}});
+    EXPECT_THAT(changed, returned(0));
+    EXPECT_EQ(changed.out("WWNOperationStatus"), Value::uint16(8));
+    rig.settle();
+    const auto second = [&rig] { return rig.enumerate("NVRHBA_FCPort").instances.at(1).get("DeviceID").as_text(); };
+    EXPECT_EQ(second(), second_port);
+
+    EXPECT_THAT(firmware.call("ResetHBA", {{"Target", target}}), returned(0));
+    rig.settle();
+    EXPECT_EQ(second(), "10000000C9A0F001");
+    // The old name is none any more, the new one is.
+    EXPECT_THAT(names.call("ReadWWN", {{"Target", target}, {"Type", Value::uint16(3)}}), returned(32968));
+    const Called read = names.call("ReadWWN", {{"Target", port(rig, 1)}, {"Type", Value::uint16(3)}});
+    EXPECT_EQ(read.out("WWNN").as_text(), "20:00:00:00:c9:a0:f0:01");
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
+}
+
 // A server routes by class. A module that is handed a path of another class looks the method up there.
 TEST(ServiceClientsOfAnotherClass, FindNoMethod)
 {
