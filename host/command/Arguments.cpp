@@ -1,10 +1,8 @@
 #include "host/command/Arguments.h"
 
 #include "host/PathText.h"
-#include "host/objects/DateTimeObject.h"
+#include "host/ScalarText.h"
 
-#include <cerrno>
-#include <cstdlib>
 #include <optional>
 #include <vector>
 
@@ -96,25 +94,23 @@ private:
             value = Value::string(word.text);
             return true;
         }
-        if (m_type == CMPI_boolean) return read_boolean(word.text, value);
-        if (m_type == CMPI_dateTime) return read_date_time(word.text, value);
         if (m_type == CMPI_ref) return read_reference(word.text, value);
-        if (m_type == CMPI_real32 || m_type == CMPI_real64) return read_real(word.text, value);
-        return read_integer(word.text, value);
+        return read_other(word.text, value);
     }
 
-    bool read_boolean(const std::string& text, Value& value)
+    /// A number may be given by its word, which counts as the number.
+    bool read_other(const std::string& text, Value& value)
     {
-        if (!same_name(text, "true") && !same_name(text, "false")) return fail("is boolean: give true or false");
-        value = Value::boolean(same_name(text, "true"));
-        return true;
-    }
-
-    bool read_date_time(const std::string& text, Value& value)
-    {
-        if (!is_date_time(text)) return fail("is a date-time of 25 characters, as 20240131235959.000000+000");
-        value = Value::datetime(text);
-        return true;
+        std::string number = text;
+        for (const auto& [entry, word] : m_element.words)
+            if (is_integer(m_type) && same_name(word, text) && entry.find("..") == std::string::npos) number = entry;
+        const std::string wrong = read_scalar(number, m_type, value);
+        if (wrong.empty()) return true;
+        if (m_type == CMPI_boolean) return fail("is boolean: give true or false");
+        if (m_type == CMPI_dateTime) return fail("is a date-time of 25 characters, as 20240131235959.000000+000");
+        const bool has_words =
+            is_integer(m_type) && !m_element.words.empty() && wrong.find("no number") != std::string::npos;
+        return fail("is " + type_name(m_type) + ": " + wrong + (has_words ? " and no word of its" : ""));
     }
 
     bool read_reference(const std::string& text, Value& value)
@@ -124,38 +120,6 @@ private:
         if (!m_schema.is_a(path.path.class_name, m_element.reference_class))
             return fail("refers to " + m_element.reference_class + ", which " + path.path.class_name + " is not");
         value = Value::reference(std::move(path.path));
-        return true;
-    }
-
-    bool read_real(const std::string& text, Value& value)
-    {
-        char* end = nullptr;
-        double number = std::strtod(text.c_str(), &end);
-        if (text.empty() || *end) return fail("is " + type_name(m_type) + ": '" + text + "' is no number");
-        value = Value::real(m_type, number);
-        return true;
-    }
-
-    bool read_integer(const std::string& text, Value& value)
-    {
-        std::string digits = text;
-        for (const auto& [entry, word] : m_element.words)
-            if (same_name(word, text) && entry.find("..") == std::string::npos) digits = entry;
-        const bool negative = !digits.empty() && digits[0] == '-';
-        const std::size_t start = negative || (!digits.empty() && digits[0] == '+') ? 1 : 0;
-        const bool hexadecimal = digits.compare(start, 2, "0x") == 0 || digits.compare(start, 2, "0X") == 0;
-        const std::size_t first = start + (hexadecimal ? 2 : 0);
-        const char* allowed = hexadecimal ? "0123456789abcdefABCDEF" : "0123456789";
-        if (digits.size() <= first || digits.find_first_not_of(allowed, first) != std::string::npos)
-            return fail("is " + type_name(m_type) + ": '" + text + "' is no number" +
-                        (m_element.words.empty() ? "" : " and no word of its"));
-        errno = 0;
-        std::uint64_t magnitude = std::strtoull(digits.c_str() + first, nullptr, hexadecimal ? 16 : 10);
-        const int bits = integer_bits(m_type);
-        std::uint64_t most =
-            is_signed(m_type) ? (1ull << (bits - 1)) - (negative ? 0 : 1) : (negative ? 0 : ~0ull >> (64 - bits));
-        if (errno != 0 || magnitude > most) return fail("is " + type_name(m_type) + ": " + text + " does not fit");
-        value = Value::integer(m_type, negative ? 0 - magnitude : magnitude);
         return true;
     }
 

@@ -160,6 +160,11 @@ int read_options(int count, char** arguments, Options& options)
 
     add_actions(app, options);
 
+    CLI::App* serve = app.add_subcommand("serve", "Answer CIM-XML over HTTP, for trying and testing");
+    serve->add_option("--port", options.tcp_port, "TCP port; 0 for any that is free")->capture_default_str();
+    serve->add_option("--bind", options.bind, "Address to listen on; others than this host's own reach it then")
+        ->capture_default_str();
+
     try {
         app.parse(count, arguments);
     } catch (const CLI::ParseError& error) {

@@ -1,6 +1,7 @@
 /// What the user asked of nvrcim, read from its command line.
 #pragma once
 
+#include <cstdint>
 #include <map>
 #include <string>
 #include <vector>
@@ -18,6 +19,8 @@ struct Options {
     std::string association_class, result_class, role, result_role; ///< of a traversal; empty: any
     bool names_only = false;                                        ///< of a traversal: object paths only
     std::string file;                                               ///< where `graph` draws to
+    std::string bind = "127.0.0.1"; ///< of `serve`: the address to listen on
+    std::uint16_t tcp_port = 5988;  ///< of `serve`; 0 for any free one
     bool all = false;
     bool json = false;
 

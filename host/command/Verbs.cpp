@@ -5,6 +5,7 @@
 #include "host/command/Arguments.h"
 #include "host/command/Check.h"
 #include "host/command/Graph.h"
+#include "host/command/Serve.h"
 #include "host/command/Table.h"
 #include "host/command/Traversal.h"
 #include "host/command/Tree.h"
@@ -33,6 +34,7 @@ public:
         if (m_options.verb == "classes") return classes();
         if (m_options.verb == "tree") return show_tree(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "graph") return draw_graph(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "serve") return serve(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "check") return check_associations(m_server, m_options, m_out, m_complaints);
         Path_Parse object = parse_path(m_options.object, &m_server.schema(), m_options.name_space);
         if (!object.ok) return wrong(quote(m_options.object) + ": " + object.error);

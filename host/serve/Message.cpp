@@ -1,0 +1,183 @@
+#include "host/serve/Message.h"
+
+#include "host/serve/Xml_Values.h"
+
+namespace host {
+namespace {
+
+constexpr int invalid_parameter = 4;
+
+[[noreturn]] void refuse(const char* cim_error, const std::string& text)
+{
+    throw Http_Fault{400, cim_error, text};
+}
+
+pugi::xml_node child_or_refuse(const pugi::xml_node& node, const char* name)
+{
+    const pugi::xml_node child = node.child(name);
+    if (!child) refuse("request-not-valid", std::string(node.name()) + " without " + name);
+    return child;
+}
+
+void check_version(const char* what, const char* version, const char* cim_error)
+{
+    if (version[0] != what[0] || version[1] != '.') refuse(cim_error, std::string("version ") + version);
+}
+
+} // namespace
+
+Message::Message(std::string_view body, const Schema& schema)
+    : m_schema(schema), m_document(std::make_unique<pugi::xml_document>())
+{
+    if (!is_xml_text(body))
+        refuse("request-not-well-formed", "the request is not UTF-8, or has characters that XML has not");
+    const pugi::xml_parse_result result =
+        m_document->load_buffer(body.data(), body.size(), pugi::parse_default, pugi::encoding_utf8);
+    if (!result)
+        refuse("request-not-well-formed",
+               std::string(result.description()) + " at byte " + std::to_string(result.offset));
+    const pugi::xml_node cim = m_document->child("CIM");
+    if (!cim) refuse("request-not-valid", "no CIM element");
+    check_version("2", cim.attribute("CIMVERSION").as_string(), "unsupported-cim-version");
+    check_version("2", cim.attribute("DTDVERSION").as_string(), "unsupported-dtd-version");
+    const pugi::xml_node message = child_or_refuse(cim, "MESSAGE");
+    check_version("1", message.attribute("PROTOCOLVERSION").as_string(), "unsupported-protocol-version");
+    m_id = message.attribute("ID").as_string();
+    if (message.child("MULTIREQ"))
+        throw Http_Fault{501, "multiple-requests-unsupported", "one request a message, please"};
+    const pugi::xml_node request = child_or_refuse(message, "SIMPLEREQ");
+    m_call = request.child("IMETHODCALL");
+    m_intrinsic = bool(m_call);
+    if (!m_intrinsic) m_call = child_or_refuse(request, "METHODCALL");
+    m_method = m_call.attribute("NAME").as_string();
+    if (m_intrinsic) m_name_space = read_name_space(child_or_refuse(m_call, "LOCALNAMESPACEPATH"));
+    for (const char* path : {"LOCALINSTANCEPATH", "LOCALCLASSPATH"})
+        if (const pugi::xml_node object = m_call.child(path))
+            m_name_space = read_name_space(child_or_refuse(object, "LOCALNAMESPACEPATH"));
+    if (m_method.empty() || m_name_space.empty()) refuse("request-not-valid", "a call without a name or a namespace");
+}
+
+pugi::xml_node Message::parameter(const char* name) const
+{
+    for (const pugi::xml_node& each : m_call.children("IPARAMVALUE"))
+        if (same_name(each.attribute("NAME").as_string(), name)) return each;
+    return {};
+}
+
+bool Message::has(const char* name) const
+{
+    const pugi::xml_node found = parameter(name);
+    return found && found.first_child();
+}
+
+std::string Message::text(const char* name) const
+{
+    return parameter(name).child_value("VALUE");
+}
+
+bool Message::flag(const char* name, bool otherwise) const
+{
+    if (!has(name)) return otherwise;
+    const std::string value = text(name);
+    if (same_name(value, "true")) return true;
+    if (same_name(value, "false")) return false;
+    throw Cim_Fault{invalid_parameter, std::string(name) + " is neither TRUE nor FALSE"};
+}
+
+std::string Message::class_name(const char* name) const
+{
+    return parameter(name).child("CLASSNAME").attribute("NAME").as_string();
+}
+
+Path Message::instance_name(const char* name) const
+{
+    const pugi::xml_node node = parameter(name).child("INSTANCENAME");
+    if (!node) throw Cim_Fault{invalid_parameter, std::string(name) + " is missing"};
+    return Xml_Values(m_schema, m_name_space).instance_name(node);
+}
+
+Path Message::object_name(const char* name) const
+{
+    const std::string class_only = class_name(name);
+    if (class_only.empty()) return instance_name(name);
+    Path path;
+    path.name_space = m_name_space;
+    path.class_name = class_only;
+    return path;
+}
+
+Property_List Message::property_list() const
+{
+    const pugi::xml_node array = parameter("PropertyList").child("VALUE.ARRAY");
+    if (!array) return std::nullopt;
+    std::vector<std::string> names;
+    for (const pugi::xml_node& value : array.children("VALUE"))
+        names.push_back(value.child_value());
+    return names;
+}
+
+Instance Message::instance(const char* name) const
+{
+    const pugi::xml_node node = parameter(name);
+    const Xml_Values values(m_schema, m_name_space);
+    if (const pugi::xml_node named = node.child("VALUE.NAMEDINSTANCE")) return values.named_instance(named);
+    if (const pugi::xml_node bare = node.child("INSTANCE")) return values.instance(bare);
+    throw Cim_Fault{invalid_parameter, std::string(name) + " is missing"};
+}
+
+Value Message::value(const char* name, const Element_Record& element) const
+{
+    return Xml_Values(m_schema, m_name_space).value(parameter(name), element);
+}
+
+Path Message::target() const
+{
+    if (const pugi::xml_node path = m_call.child("LOCALINSTANCEPATH")) {
+        const pugi::xml_node name = path.child("INSTANCENAME");
+        if (!name) throw Cim_Fault{invalid_parameter, "LOCALINSTANCEPATH without INSTANCENAME"};
+        return Xml_Values(m_schema, m_name_space).instance_name(name);
+    }
+    Path target;
+    target.name_space = m_name_space;
+    target.class_name = m_call.child("LOCALCLASSPATH").child("CLASSNAME").attribute("NAME").as_string();
+    return target;
+}
+
+std::vector<Named_Value> Message::arguments(const Method_Record& method) const
+{
+    const Xml_Values values(m_schema, m_name_space);
+    std::vector<Named_Value> arguments;
+    for (const pugi::xml_node& node : m_call.children("PARAMVALUE")) {
+        const std::string name = node.attribute("NAME").as_string();
+        const Element_Record* parameter = method.find_parameter(name);
+        if (!parameter) throw Cim_Fault{invalid_parameter, method.name + " has no parameter " + name};
+        arguments.push_back({parameter->name, values.value(node, *parameter)});
+    }
+    return arguments;
+}
+
+bool is_xml_text(std::string_view text)
+{
+    for (std::size_t i = 0; i < text.size();) {
+        const unsigned char lead = static_cast<unsigned char>(text[i]);
+        if (lead < 0x80) {
+            if (lead < 0x20 && lead != '\t' && lead != '\n' && lead != '\r') return false;
+            ++i;
+            continue;
+        }
+        const std::size_t length = lead >= 0xF0 ? 4 : lead >= 0xE0 ? 3 : 2;
+        if (lead < 0xC2 || lead > 0xF4 || text.size() - i < length) return false;
+        unsigned long code = lead & (0x7Fu >> length);
+        for (std::size_t k = 1; k < length; ++k) {
+            const unsigned char next = static_cast<unsigned char>(text[i + k]);
+            if ((next & 0xC0) != 0x80) return false;
+            code = code << 6 | (next & 0x3F);
+        }
+        const unsigned long least[] = {0, 0, 0x80, 0x800, 0x10000};
+        if (code < least[length] || code > 0x10FFFF || (code >= 0xD800 && code < 0xE000)) return false;
+        i += length;
+    }
+    return true;
+}
+
+} // namespace host
