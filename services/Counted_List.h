@@ -17,15 +17,15 @@ class Counted_List {
 public:
     Counted_List(std::size_t head, std::size_t record) : m_head(head), m_record(record) {}
 
-    /// Asks with room for one record, and once more, with as much as the library then says, after status 7; `most`
-    /// bounds that. False without memory.
+    /// Asks with room for one record, and once more, with as much as the library then says, after status 7. False
+    /// without memory, which is also that for a need of more than 16 MiB.
     template <class Ask>
-    bool fill(uint32 most, Ask ask)
+    bool fill(Ask ask)
     {
         if (!give(1)) return false;
         status = ask(m_bytes.data());
         if (status != RM_STATUS_MORE_DATA) return true;
-        if (!give(std::min(count(), most))) return false;
+        if (!give(count())) return false;
         status = ask(m_bytes.data());
         return true;
     }
@@ -51,8 +51,11 @@ public:
 private:
     bool give(uint32 room)
     {
+        constexpr uint64 most_bytes = 16 * 1024 * 1024;
+        const uint64 size = m_head + uint64(m_record) * room;
+        if (size > most_bytes) return false;
         try {
-            m_bytes.assign(m_head + m_record * room, 0);
+            m_bytes.assign(size, 0);
         } catch (const std::bad_alloc&) {
             return false;
         }

@@ -17,10 +17,6 @@ namespace {
 constexpr int status_failed = 1;
 constexpr int status_null = 4;
 
-// No more are asked for, whatever the library reports.
-constexpr uint32 most_targets = 65536;
-constexpr uint32 most_machines = 4096;
-
 void logVPortFailure(uint32 status)
 {
     if (status == RM_STATUS_HOST_NOT_SUPPORTED) {
@@ -54,7 +50,7 @@ int NVR_MethodWrapper::ListVPorts(const HBA_WWN& port, VPort_List* list)
         return status_null;
     }
     Counted_List found(offsetof(RM_VPORTLIST, entry), sizeof(RM_VPORTENTRY));
-    if (!found.fill(RM_VPORT_MAX_ENTRIES, [&](void* room) { return RM_VPList(port, room); })) {
+    if (!found.fill([&](void* room) { return RM_VPList(port, room); })) {
         NVR_LOG("FMCMD_ListVPorts: Unable to allocate buffer");
         return status_failed;
     }
@@ -93,7 +89,7 @@ int NVR_MethodWrapper::ListVPortTargets(const HBA_WWN& port, const HBA_WWN& vpor
 {
     if (!isLocal(port) || !isLocal(vport)) return status_failed;
     Counted_List found(offsetof(RM_TARGETLIST, entry), sizeof(HBA_FCPSCSIENTRY));
-    if (!found.fill(most_targets, [&](void* room) { return RM_VPListTargets(port, vport, room); })) {
+    if (!found.fill([&](void* room) { return RM_VPListTargets(port, vport, room); })) {
         NVR_LOG("FMCMD_VportTargets: Unable to allocate buffer");
         return status_failed;
     }
@@ -129,7 +125,7 @@ int NVR_MethodWrapper::ListVMfromVPort(const HBA_WWN& port, const RM_VPORTENTRY&
     }
     Counted_List found(offsetof(RM_VMLIST, entry), sizeof(RM_VMNAME));
     bool again = false;
-    const bool asked = found.fill(most_machines, [&](void* room) {
+    const bool asked = found.fill([&](void* room) {
         const uint32 answer = RM_GetVMFromVPort(vport.wwpn, room);
         again = answer == RM_STATUS_MORE_DATA;
         return answer;

@@ -25,7 +25,6 @@ namespace {
 constexpr uint32 answer_duplicate = 91;
 constexpr int busy_retries = 300;
 constexpr uint64 busy_interval = 1000 * 1000; // microseconds
-constexpr uint32 largest_list = 16 * 1024 * 1024;
 
 /// Why a new name is refused: the numbers are the service's, of which the search finds the first alone.
 enum Duplicate : uint16 {
@@ -62,8 +61,7 @@ bool same(const HBA_WWN& a, const HBA_WWN& b)
 bool hasVPortNamed(const HBA_WWN& port, const HBA_WWN& newWWPN, const HBA_WWN& newWWNN)
 {
     Counted_List list(offsetof(RM_VPORTLIST, entry), sizeof(RM_VPORTENTRY));
-    if (!list.fill(largest_list / sizeof(RM_VPORTENTRY), [&](void* room) { return RM_VPList(port, room); }))
-        return false;
+    if (!list.fill([&](void* room) { return RM_VPList(port, room); })) return false;
     if (list.status != RM_STATUS_OK || list.count() == 0 || list.count() > RM_VPORT_MAX_ENTRIES) return false;
     for (const RM_VPORTENTRY& vport : list.records<RM_VPORTENTRY>())
         if (same(vport.wwpn, newWWPN) || same(vport.wwpn, newWWNN)) return true;

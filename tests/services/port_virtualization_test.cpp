@@ -241,7 +241,7 @@ TEST_F(PortVirtualization, ANeedOfFourBillionIsNotAllocated)
     fault("call = \"RM_VPList\", status = 7, value = 4294967295");
     refresh();
     EXPECT_THAT(vports(), IsEmpty());
-    EXPECT_THAT(words(), Contains("Unable to list virtual ports!!"));
+    EXPECT_THAT(words(), Contains("FMCMD_ListVPorts: Unable to allocate buffer"));
 }
 
 TEST_F(PortVirtualization, ANeedOfNothingIsAskedForOnceMoreAndNoOftener)

@@ -91,11 +91,22 @@ TEST_F(VirtualPortOperations, PassAFailureOfTheMachinesOn)
 
 TEST_F(VirtualPortOperations, ReadNoMoreMachinesThanFit)
 {
-    fault("call = \"RM_GetVMFromVPort\", status = 7, value = 4294967295, times = 1");
+    fault("call = \"RM_GetVMFromVPort\", status = 7, value = 4, times = 1");
     fault("call = \"RM_GetVMFromVPort\", value = 4294967295, from = 2");
     EXPECT_EQ(NVR_MethodWrapper::ListVMfromVPort(port, vport, &machines), 0);
-    EXPECT_LE(machines.size(), 4096u);
+    EXPECT_EQ(machines.size(), 4u);
     EXPECT_EQ(fieldText(machines[0].identity), "vm-one");
+}
+
+TEST_F(VirtualPortOperations, AllocateNoMoreThan16MiB)
+{
+    // The most that fits is asked for, one more is not.
+    fault("call = \"RM_GetVMFromVPort\", status = 7, value = 32767, times = 1");
+    EXPECT_EQ(NVR_MethodWrapper::ListVMfromVPort(port, vport, &machines), 0);
+    EXPECT_EQ(machines.size(), 2u);
+    fault("call = \"RM_GetVMFromVPort\", status = 7, value = 32768");
+    EXPECT_EQ(NVR_MethodWrapper::ListVMfromVPort(port, vport, &machines), 1);
+    EXPECT_THAT(words(), Contains("FMCMD_ListVMS: Unable to allocate buffer\n"));
 }
 
 // The library calls a virtual port local only where it knows it as one.
