@@ -1,6 +1,7 @@
 // The beacon of a port, switched by a change of its LocationIndicator.
 #include <gmock/gmock.h>
 
+#include "tests/module/support/Entries.h"
 #include "tests/module/support/Service.h"
 #include "tests/module/support/Test_Clock.h"
 #include "tests/support/simulator.h"
@@ -154,6 +155,41 @@ TEST_P(FcPortBeacon, OfAnUnknownPortIsRefused)
         EXPECT_THAT(changed.answer, failed_with(CMPI_RC_ERR_INVALID_PARAMETER)) << key;
         EXPECT_EQ(changed.words, joined({start, {"Invalid instance of NVRHBA_FCPort Data"}})) << key;
     }
+    EXPECT_EQ(calls("RM_DiagBeacon"), 0u);
+}
+
+// A server routes by class; an instance of another known class that reaches the module all the same is not read as a
+// port.
+TEST(FcPortBeaconOfAnotherClass, IsRefused)
+{
+    Rig rig;
+    const host::Path port = rig.names(port_class).paths.at(0);
+    Entries entries;
+    rig.settle();
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        CMPIInstanceMI* mi = entries.instances(port_class, broker, context);
+        ASSERT_TRUE(mi);
+        // One with the same key, and one of a class that is far smaller.
+        for (const char* other : {"NVRHBA_PortController", "NVRHBA_ControlledBy", "CIM_FCPort"}) {
+            CMPIStatus status = {CMPI_RC_OK, nullptr};
+            CMPIObjectPath* path = broker->eft->newObjectPath(broker, "root/norvane", other, &status);
+            ASSERT_TRUE(path) << other;
+            const std::string device_id = port.find("DeviceID")->as_text();
+            path->ft->addKey(path, "DeviceID", reinterpret_cast<const CMPIValue*>(device_id.c_str()), CMPI_chars);
+            CMPIInstance* instance = broker->eft->newInstance(broker, path, &status);
+            ASSERT_TRUE(instance) << other;
+            CMPIValue on;
+            on.uint16 = 2;
+            instance->ft->setProperty(instance, property, &on, CMPI_uint16);
+            EXPECT_EQ(mi->ft->modifyInstance(mi, context, nullptr, path, instance, nullptr).rc,
+                      CMPI_RC_ERR_INVALID_PARAMETER)
+                << other;
+            instance->ft->release(instance);
+            path->ft->release(path);
+        }
+        mi->ft->cleanup(mi, context, 1);
+    });
+    EXPECT_EQ(rig.count_words("Invalid instance of NVRHBA_FCPort Data"), 3u);
     EXPECT_EQ(calls("RM_DiagBeacon"), 0u);
 }
 
