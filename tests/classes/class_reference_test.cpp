@@ -157,6 +157,7 @@ TEST(ClassReference, IsTheSameInHtml)
               expect_links_resolve(markdown(), std::regex("\\]\\(([^)]+)\\)")));
     const std::string& port = html.at("NVRHBA_FCPort.html");
     EXPECT_THAT(port, HasSubstr("<title>NVRHBA_FCPort</title>"));
+    EXPECT_THAT(html.at("index.html"), HasSubstr("<title>Class reference</title>"));
     EXPECT_THAT(port, HasSubstr("<td><strong>LocationIndicator</strong></td>"));
     for (const auto& [name, text] : html)
         EXPECT_EQ(text.find("| "), std::string::npos) << name << " has a table that was not understood";
