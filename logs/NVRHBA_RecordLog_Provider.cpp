@@ -3,6 +3,7 @@
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
 #include "agent/instance_table.h"
+#include "agent/method_answer.h"
 #include "foundation/CLogger.h"
 #include "logs/driver_log.h"
 #include "logs/record_logs.h"
@@ -10,10 +11,6 @@
 namespace cimple {
 
 namespace {
-
-constexpr uint32 done = 0;
-constexpr uint32 bad_argument = 32968;
-constexpr uint32 foreign_instance = 33068;
 
 constexpr uint16 state_enabled = 2;
 constexpr uint16 state_disabled = 3;
@@ -25,7 +22,7 @@ constexpr uint16 last_mode = 4;
 struct Target {
     Target(const ProviderAgent& agent, const NVRHBA_RecordLog* self)
     {
-        if (!self || !is_subclass(&NVRHBA_RecordLog::meta, self->meta_class)) return;
+        if (!isOfClass(self, NVRHBA_RecordLog::meta)) return;
         is_log = true;
         is_driver = self->InstanceID.value == recordLogID(agent, Record_Log::driver);
         instance = findRecordLog(agent, self->InstanceID.value);
@@ -35,7 +32,7 @@ struct Target {
     uint32 refuse() const
     {
         NVR_LOG("Invalid instance of Record Log");
-        return foreign_instance;
+        return ANSWER_FOREIGN_INSTANCE;
     }
 
     bool is_log = false;
@@ -60,15 +57,15 @@ uint32 setLogParams(ProviderAgent& agent, const Target& target, uint16 level, ui
     if (!target.is_log) return target.refuse();
     if (level != only_level) {
         NVR_LOG("Log level provided is out of range");
-        return bad_argument;
+        return ANSWER_BAD_ARGUMENT;
     }
     if (mode < 1 || mode > last_mode) {
         NVR_LOG("Log mode provided is out of range");
-        return bad_argument;
+        return ANSWER_BAD_ARGUMENT;
     }
     if (usesTraceFile(mode) && (path.empty() || agent.m_fileLogger.setPath(path.c_str()) == -1)) {
         NVR_LOG("Setting the trace path failed");
-        return bad_argument;
+        return ANSWER_BAD_ARGUMENT;
     }
     NVR_LOG("Changing the record log parameters %d-%d-%s", level, mode, path.c_str());
     CLogger::instance()->setLevel(level);
@@ -83,7 +80,7 @@ uint32 setLogParams(ProviderAgent& agent, const Target& target, uint16 level, ui
         set(target.instance->LogMode, mode);
     }
     storeSettings();
-    return done;
+    return ANSWER_DONE;
 }
 
 uint32 clearLog(ProviderAgent& agent, const Target& target)
@@ -96,7 +93,7 @@ uint32 clearLog(ProviderAgent& agent, const Target& target)
         CLogger::instance()->clearAll();
         NVR_LOG("Cleared all the logs");
     }
-    return done;
+    return ANSWER_DONE;
 }
 
 void showState(const Target& target, uint16 state)
@@ -136,13 +133,13 @@ uint32 requestStateChange(ProviderAgent& agent, const Target& target, uint16 sta
     switch (state) {
     case state_enabled:
         enableLog(agent, target);
-        return done;
+        return ANSWER_DONE;
     case state_disabled:
         disableLog(agent, target);
-        return done;
+        return ANSWER_DONE;
     default:
         NVR_LOG("Invalid input");
-        return bad_argument;
+        return ANSWER_BAD_ARGUMENT;
     }
 }
 
@@ -169,18 +166,14 @@ Invoke_Method_Status NVRHBA_RecordLog_Provider::SetLogParams(const NVRHBA_Record
         NVR_LOG("SetLogParams is not supported for Driver Record Log Instance");
         return INVOKE_METHOD_UNSUPPORTED;
     }
-    // A number that is not given is out of range, and a path that is not given is empty.
-    return_value.set(setLogParams(agent, target, LogLevel.null ? 0 : LogLevel.value, LogMode.null ? 0 : LogMode.value,
-                                  TracePath.null ? String() : TracePath.value));
-    return INVOKE_METHOD_OK;
+    return answer(return_value, setLogParams(agent, target, given(LogLevel), given(LogMode), given(TracePath)));
 }
 
 Invoke_Method_Status NVRHBA_RecordLog_Provider::ClearLog(const NVRHBA_RecordLog* self, Property<uint32>& return_value)
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     const Agent_Wait wait(agent);
-    return_value.set(clearLog(agent, Target(agent, self)));
-    return INVOKE_METHOD_OK;
+    return answer(return_value, clearLog(agent, Target(agent, self)));
 }
 
 Invoke_Method_Status NVRHBA_RecordLog_Provider::RequestStateChange(const NVRHBA_RecordLog* self,
@@ -190,8 +183,7 @@ Invoke_Method_Status NVRHBA_RecordLog_Provider::RequestStateChange(const NVRHBA_
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     const Agent_Wait wait(agent);
-    return_value.set(requestStateChange(agent, Target(agent, self), RequestedState.null ? 0 : RequestedState.value));
-    return INVOKE_METHOD_OK;
+    return answer(return_value, requestStateChange(agent, Target(agent, self), given(RequestedState)));
 }
 
 } // namespace cimple

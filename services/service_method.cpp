@@ -8,11 +8,6 @@
 
 namespace cimple {
 
-bool isOfClass(const Instance* instance, const Meta_Class& ancestor)
-{
-    return instance && is_subclass(&ancestor, instance->meta_class);
-}
-
 bool isFirstService(const Instance_Map& services, const Instance* self)
 {
     return isOfClass(self, *services.meta_class()) && (services.empty() || key_eq(self, services[0]));

@@ -1,4 +1,5 @@
-/// What the methods of the services have in common: their return values, and the checks that they open with.
+/// What the methods of the services have in common besides their return values (agent/method_answer.h): the checks that
+/// they open with.
 ///
 /// A service's method logs its entry, takes the agent wait (agent/Agent_Wait.h) and holds it to its end, and then asks
 /// the functions below, in this order: is it invoked on the service, is its Target a port that the agent knows, what is
@@ -9,45 +10,18 @@
 #pragma once
 
 #include "agent/Instance_Map.h"
+#include "agent/method_answer.h"
 #include "foundation/management_api.h"
-#include "runtime/Property.h"
-#include "runtime/Registration.h"
 
 namespace cimple {
 
 class ProviderAgent;
-
-/// Return values that several services share.
-enum Service_Answer : uint32 {
-    ANSWER_DONE = 0,
-    ANSWER_NULL_ARGUMENT = 4097,
-    ANSWER_FILE_NOT_FOUND = 4107,
-    ANSWER_BAD_ARGUMENT = 32968,
-    ANSWER_FOREIGN_INSTANCE = 33068
-};
 
 /// The return value for a status of the management library other than 0.
 constexpr uint32 libraryAnswer(uint32 status)
 {
     return 40000 + status;
 }
-
-/// Ends a method with that return value.
-inline Invoke_Method_Status answer(Property<uint32>& return_value, uint32 value)
-{
-    return_value.set(value);
-    return INVOKE_METHOD_OK;
-}
-
-/// A value that counts as 0 or false where the client gave none.
-template <class T>
-T given(const Property<T>& property)
-{
-    return property.null ? T() : property.value;
-}
-
-/// True for an instance (not null) of that class or of a class derived from it.
-bool isOfClass(const Instance* instance, const Meta_Class& ancestor);
 
 /// True if a method that is invoked on `self` is meant for the service in `services`: `self` is of the service's class,
 /// and has the keys of the first one, or of any, unless there is none yet.

@@ -70,12 +70,16 @@ Port* find_port(Simulator& simulator, const std::string& port, Adapter** owner)
     return nullptr;
 }
 
-int send_event(const std::string& port, uint32_t type, uint32_t fabricPortId)
+int send_event(const std::string& port, uint32_t type, uint32_t fabricPortId, uint32_t times)
 {
     Simulator& simulator = Simulator::instance();
     std::lock_guard<std::mutex> lock(simulator.mutex);
     const Port* found = find_port(simulator, port);
-    return found ? static_cast<int>(Events::instance().post(found->current.wwpn, type, fabricPortId)) : -1;
+    if (!found) return -1;
+    size_t called = 0;
+    for (uint32_t i = 0; i < times; ++i)
+        called += Events::instance().post(found->current.wwpn, type, fabricPortId);
+    return static_cast<int>(called);
 }
 
 bool set_link(const std::string& port, bool up, std::string& error)
@@ -191,7 +195,7 @@ std::string generate_scenario(uint32_t ports, uint32_t targets, uint32_t luns)
 std::string run_command(const std::string& line)
 {
     std::istringstream words(line);
-    std::string command, first, second, third;
+    std::string command, first, second, third, fourth;
     words >> command;
     const auto rest = [&words] {
         std::string text;
@@ -232,7 +236,11 @@ std::string run_command(const std::string& line)
     if (command == "event" && words >> first >> second && parse_number(second, number) && number <= UINT32_MAX) {
         if (words >> third && (!parse_number(third, fabric) || fabric > UINT32_MAX))
             return "error \"" + third + "\" is no fabric port identifier\n";
-        const int called = send_event(first, static_cast<uint32_t>(number), static_cast<uint32_t>(fabric));
+        uint64_t times = 1;
+        if (words >> fourth && (!parse_number(fourth, times) || times < 1 || times > longest_burst))
+            return "error a burst has 1 to " + std::to_string(longest_burst) + " events\n";
+        const int called = send_event(first, static_cast<uint32_t>(number), static_cast<uint32_t>(fabric),
+                                      static_cast<uint32_t>(times));
         return called < 0 ? "error there is no port " + first + "\n" : "ok\n" + std::to_string(called) + "\n";
     }
     if (command == "set" && words >> first >> second >> third && parse_number(third, number))

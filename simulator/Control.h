@@ -14,8 +14,9 @@ std::string control_error();
 Port* find_port(Simulator& simulator, const std::string& port, Adapter** owner = nullptr);
 
 bool set_link(const std::string& port, bool up, std::string& error);
-/// Callbacks that will be called; -1 for an unknown port.
-int send_event(const std::string& port, uint32_t type, uint32_t fabricPortId);
+/// Sends so many events, at most longest_burst. Calls of callbacks that will be made; -1 for an unknown port.
+int send_event(const std::string& port, uint32_t type, uint32_t fabricPortId, uint32_t times = 1);
+constexpr uint32_t longest_burst = 1000000;
 bool set_value(const std::string& port, const std::string& name, uint64_t value, std::string& error);
 bool get_value(const std::string& port, const std::string& name, std::string& value);
 

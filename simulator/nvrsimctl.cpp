@@ -192,6 +192,8 @@ int main(int argc, char** argv)
     event->add_option("type", type, "Type of the Common HBA API: 513 offline, 514 online, 515 new targets, ...")
         ->required();
     event->add_option("fabric", fabric, "Fabric port identifier");
+    uint32_t burst = 1;
+    event->add_option("--times", burst, "A burst of so many")->check(CLI::Range(1, 1000000));
 
     auto* get = app.add_subcommand("get", "Print one value of a port");
     std::string name, text;
@@ -270,7 +272,8 @@ int main(int argc, char** argv)
             std::cout << ask(socketPath, "link " + direction + " " + port);
         } else if (*event) {
             std::cout << "callbacks called: "
-                      << ask(socketPath, "event " + port + " " + std::to_string(type) + " " + std::to_string(fabric));
+                      << ask(socketPath, "event " + port + " " + std::to_string(type) + " " + std::to_string(fabric) +
+                                             " " + std::to_string(burst));
         } else if (*get) {
             std::cout << ask(socketPath, "get " + port + " " + name);
         } else if (*set) {

@@ -2,6 +2,7 @@
 
 #include "host/Manner.h"
 #include "host/command/Actions.h"
+#include "host/command/Logs.h"
 
 #include <CLI/CLI.hpp>
 
@@ -31,11 +32,13 @@ constexpr const char* footer =
     "  nvrcim --manner pegasus --server-log - names NVRHBA_Product\n"
     "  nvrcim port beacon on --port 10:00:00:00:c9:a0:00:01\n"
     "  nvrcim wwn change 10000000C9A0F001 20000000C9A0F001 --type volatile --yes\n"
+    "  nvrcim log trace /var/log/norvane.trace\n"
+    "  nvrcim listen --json\n"
     "\n"
     "Exit status: 0 done; a CIM status code (1 failed, 2 access denied, 3 no such namespace, 4 bad parameter,\n"
     "5 no such class, 6 not found, 7 not supported, ...); 64 for a command that cannot be understood; of the actions "
     "on\n"
-    "ports also 65, the question was answered with no, and 66, the method returned another value than 0.\n"
+    "ports and logs also 65, the question was answered with no, and 66, the method returned another value than 0.\n"
     "Environment: NVRCIM_MODULE, NVRCIM_MOF, NVRCIM_SIMULATOR name the places that are otherwise found beside nvrcim.";
 
 std::string manners()
@@ -159,6 +162,7 @@ int read_options(int count, char** arguments, Options& options)
     check->add_flag("--all", options.all, "Tell of each association class, not only of faults");
 
     add_actions(app, options);
+    add_log_verbs(app, options);
 
     CLI::App* serve = app.add_subcommand("serve", "Answer CIM-XML over HTTP, for trying and testing");
     serve->add_option("--port", options.tcp_port, "TCP port; 0 for any that is free")->capture_default_str();

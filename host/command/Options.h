@@ -18,9 +18,14 @@ struct Options {
     std::vector<std::string> properties; ///< of `enum` and `get`: only these
     std::string association_class, result_class, role, result_role; ///< of a traversal; empty: any
     bool names_only = false;                                        ///< of a traversal: object paths only
-    std::string file;                                               ///< where `graph` draws to
-    std::string bind = "127.0.0.1"; ///< of `serve`: the address to listen on
-    std::uint16_t tcp_port = 5988;  ///< of `serve`; 0 for any free one
+    std::string file;                                               ///< where `graph` draws to; of `log` the trace file
+    std::string log_action, log_word;                               ///< of `log`: what to do, and the mode
+    unsigned log_number = 0;                                        ///< of `log level`
+    std::vector<std::string> also;                                  ///< of `listen`: more namespaces
+    unsigned count = 0;                                             ///< of `listen`: how many alerts; 0: any number
+    bool quiet = false;                                             ///< of `listen`: count them only
+    std::string bind = "127.0.0.1";                                 ///< of `serve`: the address to listen on
+    std::uint16_t tcp_port = 5988;                                  ///< of `serve`; 0 for any free one
     bool all = false;
     bool json = false;
 

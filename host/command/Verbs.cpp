@@ -5,6 +5,7 @@
 #include "host/command/Arguments.h"
 #include "host/command/Check.h"
 #include "host/command/Graph.h"
+#include "host/command/Logs.h"
 #include "host/command/Serve.h"
 #include "host/command/Table.h"
 #include "host/command/Traversal.h"
@@ -36,6 +37,9 @@ public:
         if (m_options.verb == "graph") return draw_graph(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "serve") return serve(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "check") return check_associations(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "log") return run_log(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "driverlog") return show_driver_log(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "listen") return listen(m_server, m_options, m_out, m_complaints);
         Path_Parse object = parse_path(m_options.object, &m_server.schema(), m_options.name_space);
         if (!object.ok) return wrong(quote(m_options.object) + ": " + object.error);
         m_path = object.path;

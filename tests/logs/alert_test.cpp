@@ -261,19 +261,20 @@ TEST_F(Alerts, WithoutAHostThereIsNoPortEither)
 
 TEST_F(Alerts, AnEventWaitsForTheMapsOnce)
 {
+    ProviderAgent& the_agent = agent(); // not to be asked for under a lock
     ASSERT_EQ(enable(), 0);
     settle();
     {
-        Auto_Mutex lock(agent().m_AdapterMapsReadyMutex);
-        agent().m_bIsAdapterMapsReady = false;
+        Auto_Mutex lock(the_agent.m_AdapterMapsReadyMutex);
+        the_agent.m_bIsAdapterMapsReady = false;
     }
     call_back(first_wwpn, link_up);
     wait_for_word("PERF: Waiting for m_bIsAdapterMapsReady");
     EXPECT_EQ(client.count(), 0u);
     {
-        Auto_Mutex lock(agent().m_AdapterMapsReadyMutex);
-        agent().m_bIsAdapterMapsReady = true;
-        agent().m_AdapterMapsReadyCond.broadcast();
+        Auto_Mutex lock(the_agent.m_AdapterMapsReadyMutex);
+        the_agent.m_bIsAdapterMapsReady = true;
+        the_agent.m_AdapterMapsReadyCond.broadcast();
     }
     client.wait_for(1);
     EXPECT_EQ(count_word("PERF: Woken up from wait for m_bIsAdapterMapsReady"), 1u);
@@ -281,10 +282,11 @@ TEST_F(Alerts, AnEventWaitsForTheMapsOnce)
 
 TEST_F(Alerts, EnablingWaitsForTheInventoryOnce)
 {
+    ProviderAgent& the_agent = agent(); // not to be asked for under a lock
     settle();
     {
-        Auto_Mutex lock(agent().m_AdapterDataReadyMutex);
-        agent().m_bIsAdapterDataReady = false;
+        Auto_Mutex lock(the_agent.m_AdapterDataReadyMutex);
+        the_agent.m_bIsAdapterDataReady = false;
     }
     std::thread enables([this] {
         Thread_Context::push(&context);
@@ -293,9 +295,9 @@ TEST_F(Alerts, EnablingWaitsForTheInventoryOnce)
     });
     wait_for_word("PERF: Waiting for m_bIsAdapterDataReady");
     {
-        Auto_Mutex lock(agent().m_AdapterDataReadyMutex);
-        agent().m_bIsAdapterDataReady = true;
-        agent().m_AdapterDataReadyCond.broadcast();
+        Auto_Mutex lock(the_agent.m_AdapterDataReadyMutex);
+        the_agent.m_bIsAdapterDataReady = true;
+        the_agent.m_AdapterDataReadyCond.broadcast();
     }
     enables.join();
     EXPECT_EQ(count_word("PERF: Woken up from wait for m_bIsAdapterDataReady"), 1u);

@@ -37,9 +37,11 @@ Answer run(const std::string& arguments)
 }
 
 std::atomic<int> heard{0};
+std::atomic<uint64_t> heard_count{0};
 void hear(void*, HBA_WWN, HBA_UINT32 type, HBA_UINT32)
 {
     heard = static_cast<int>(type);
+    ++heard_count;
 }
 
 } // namespace
@@ -100,6 +102,10 @@ TEST_F(Control, LinkAndEventsReachCallbacks)
     EXPECT_EQ("callbacks called: 1\n", run("event 0 515 7").output);
     nvrsim_drain_events();
     EXPECT_EQ(515, heard);
+    const uint64_t before = heard_count;
+    EXPECT_EQ("callbacks called: 1000\n", run("event 0 514 --times 1000").output);
+    nvrsim_drain_events();
+    EXPECT_EQ(before + 1000, heard_count);
     EXPECT_EQ(0u, nvrsim_HBA_RemoveCallback(callback));
 }
 
@@ -160,8 +166,9 @@ TEST_F(Control, FirmwareImagesAreMade)
 TEST_F(Control, CommandsAreRefusedWhenTheyMakeNoSense)
 {
     char answer[300];
-    for (const char* line : {"", "link", "link sideways 0", "event 0", "event 0 x", "event 0 1 y", "set 0 beacon",
-                             "set 0 beacon -1", "get 0", "fault", "fault call", "bogus"}) {
+    for (const char* line :
+         {"", "link", "link sideways 0", "event 0", "event 0 x", "event 0 1 y", "event 0 1 0 0", "event 0 1 0 1000001",
+          "event 0 1 0 x", "set 0 beacon", "set 0 beacon -1", "get 0", "fault", "fault call", "bogus"}) {
         nvrsim_command(line, answer, sizeof answer);
         EXPECT_EQ(0, std::strncmp(answer, "error ", 6)) << line << ": " << answer;
     }

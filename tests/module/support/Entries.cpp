@@ -41,4 +41,10 @@ CMPIAssociationMI* Entries::associations(const std::string& class_name, const CM
     return call<CMPIAssociationMI>(class_name + "_Create_AssociationMI", broker, context);
 }
 
+CMPIIndicationMI* Entries::indications(const std::string& class_name, const CMPIBroker* broker,
+                                       const CMPIContext* context)
+{
+    return call<CMPIIndicationMI>(class_name + "_Create_IndicationMI", broker, context);
+}
+
 } // namespace nvrtest

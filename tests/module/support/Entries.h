@@ -24,6 +24,7 @@ public:
     CMPIMethodMI* methods(const std::string& class_name, const CMPIBroker* broker, const CMPIContext* context);
     CMPIAssociationMI* associations(const std::string& class_name, const CMPIBroker* broker,
                                     const CMPIContext* context);
+    CMPIIndicationMI* indications(const std::string& class_name, const CMPIBroker* broker, const CMPIContext* context);
 
 private:
     template <class Record>
