@@ -23,7 +23,7 @@ constexpr char system_log[] = "/var/log/messages";
 /// A listening nvrcim, and nvrsimctl on its hardware.
 class Listening {
 public:
-    explicit Listening(const std::string& arguments, const std::string& scenario = NVR_SCENARIO_DIR "/small.toml")
+    explicit Listening(const std::string& arguments, const std::string& scenario = NVRSIM_BUILD "/scenarios/small.toml")
         : m_socket(library_folder() + "/listen.sock")
     {
         remove(m_socket);
