@@ -51,12 +51,18 @@ File open_file(const char* path, const char* mode)
     return fd < 0 ? nullptr : stream_of(fd, mode);
 }
 
+int fault_of_file(const char* path)
+{
+    struct stat status;
+    return ::stat(path, &status) == 0 && is_regular(status) ? 0 : errno;
+}
+
 File open_regular_file(const char* path, const char* mode)
 {
     // Even to open a device can do something, so what is known to be none of ours is not opened at all.
-    struct stat status;
-    if (::stat(path, &status) == 0 && !is_regular(status)) return nullptr;
+    if (fault_of_file(path) == EINVAL) return nullptr;
 
+    struct stat status;
     const bool writes = mode[0] == 'w';
     const int fd = writes ? open_for_writing(path) : ::open(path, O_RDONLY | always);
     if (fd < 0) return nullptr;

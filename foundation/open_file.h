@@ -20,4 +20,7 @@ File open_file(const char* path, const char* mode);
 /// a link that leads nowhere is refused (EEXIST).
 File open_regular_file(const char* path, const char* mode);
 
+/// 0 if such a path leads to a regular file, else why it does not: the errno of the look, EINVAL for what is no file.
+int fault_of_file(const char* path);
+
 } // namespace cimple

@@ -6,6 +6,7 @@
 #include <cstring>
 #include <string>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
@@ -73,7 +74,7 @@ public:
     Passing_File(const char* path, bool passes) : m_path(passes ? path : nullptr) {}
     ~Passing_File()
     {
-        if (m_path) std::remove(m_path);
+        if (m_path) ::unlink(m_path);
     }
     Passing_File(const Passing_File&) = delete;
     Passing_File& operator=(const Passing_File&) = delete;
@@ -84,7 +85,7 @@ public:
         NVR_LOG("nvrcimDownloadFW: Removing the FW file from CIMOM's repository ");
         if (!m_path) return;
         struct stat status;
-        if (::stat(m_path, &status) == 0 && std::remove(m_path) == 0)
+        if (::stat(m_path, &status) == 0 && ::unlink(m_path) == 0)
             NVR_LOG("nvrcimDownloadFW: FW file %s removed successfully", m_path);
         else
             NVR_LOG("nvrcimDownloadFW: Can't stat file %s", m_path);
@@ -95,17 +96,19 @@ private:
     const char* m_path;
 };
 
-/// 0, or the return value for an image that cannot be looked at.
+/// 0, or the return value for an image that is no file.
 uint32 findImage(const char* path)
 {
-    struct stat status;
-    if (::stat(path, &status) == 0) return ANSWER_DONE;
-    if (errno == ENOENT) {
+    switch (fault_of_file(path)) {
+    case 0:
+        return ANSWER_DONE;
+    case ENOENT:
         NVR_LOG("ERROR: nvrcimDownloadFW: FW file not found");
         return ANSWER_FILE_NOT_FOUND;
+    default:
+        NVR_LOG("ERROR: nvrcimDownloadFW: Can't stat FW file ");
+        return ANSWER_INVALID_PARAMETER;
     }
-    NVR_LOG("ERROR: nvrcimDownloadFW: Can't stat FW file ");
-    return ANSWER_INVALID_PARAMETER;
 }
 
 /// What both ways of installing ask last before they write: the port's name, and whether this is the service for it.
@@ -228,7 +231,7 @@ bool writeImage(const char* path, const Property<Array<uint8>>& image)
     const bool written = size == 0 || std::fwrite(image.value.data(), 1, size, file.get()) == size;
     const bool closed = std::fclose(file.release()) == 0;
     if (written && closed) return true;
-    std::remove(path);
+    ::unlink(path);
     return false;
 }
 

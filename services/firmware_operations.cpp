@@ -1,10 +1,10 @@
 // What the firmware service does to an adapter: a new image, a port switched on and off.
 #include <cerrno>
-#include <sys/stat.h>
 
 #include "agent/library_name.h"
 #include "foundation/CLogger.h"
 #include "foundation/management_binding.h"
+#include "foundation/open_file.h"
 #include "foundation/shared_operations.h"
 #include "services/NVR_MethodWrapper.h"
 
@@ -14,15 +14,13 @@ namespace {
 
 constexpr uint32 status_failed = 1;
 
+// The library opens the file by itself, and would wait for the other end of a FIFO.
 bool fileIsThere(const char* path)
 {
-    struct stat status;
-    if (::stat(path, &status) == 0) return true;
-    if (errno == ENOENT)
-        NVR_LOG("\nERROR: nvrcimDownloadFW: FW file not found");
-    else
-        NVR_LOG("\nERROR: nvrcimDownloadFW: Can't stat FW file");
-    return false;
+    const int fault = fault_of_file(path);
+    if (fault == ENOENT) NVR_LOG("\nERROR: nvrcimDownloadFW: FW file not found");
+    if (fault && fault != ENOENT) NVR_LOG("\nERROR: nvrcimDownloadFW: Can't stat FW file");
+    return fault == 0;
 }
 
 uint32 importImage(const char* path)

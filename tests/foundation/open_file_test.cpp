@@ -31,6 +31,9 @@ void expect_refused(const char* mode, int error)
 {
     EXPECT_FALSE(open_regular_file(path.c_str(), mode)) << mode;
     EXPECT_EQ(errno, error) << mode;
+    if (*mode == 'r') {
+        EXPECT_EQ(fault_of_file(path.c_str()), error);
+    }
 }
 
 } // namespace
@@ -43,6 +46,7 @@ TEST(OpenRegularFile, ReadsWritesAndMakesFiles)
     char text[8] = {};
     EXPECT_EQ(std::fread(text, 1, sizeof text, open_regular_file(path.c_str(), "rb").get()), 3u);
     EXPECT_STREQ(text, "new");
+    EXPECT_EQ(fault_of_file(path.c_str()), 0);
     write_file(path, "something longer");
     ASSERT_TRUE(rewrite());
     EXPECT_EQ(read_file(path), "new");
