@@ -1,6 +1,7 @@
 #include "simulator/Firmware.h"
 
 #include <algorithm>
+#include <array>
 #include <cstring>
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -24,14 +25,24 @@ static_assert(sizeof(Header) == 64, "firmware header");
 constexpr char magic[8] = {'N', 'V', 'R', 'F', 'W', 'I', 'M', 'G'};
 constexpr off_t largestFile = 64 << 20;
 
-uint32_t crc32(const char* data, size_t size)
+constexpr std::array<uint32_t, 256> make_crc_table()
 {
-    uint32_t crc = ~0u;
-    for (size_t i = 0; i < size; ++i) {
-        crc ^= static_cast<uint8_t>(data[i]);
+    std::array<uint32_t, 256> table{};
+    for (uint32_t byte = 0; byte < table.size(); ++byte) {
+        uint32_t crc = byte;
         for (int bit = 0; bit < 8; ++bit)
             crc = crc >> 1 ^ (crc & 1 ? 0xEDB88320u : 0);
+        table[byte] = crc;
     }
+    return table;
+}
+
+uint32_t crc32(const char* data, size_t size)
+{
+    static constexpr std::array<uint32_t, 256> table = make_crc_table();
+    uint32_t crc = ~0u;
+    for (size_t i = 0; i < size; ++i)
+        crc = crc >> 8 ^ table[(crc ^ static_cast<uint8_t>(data[i])) & 0xFF];
     return ~crc;
 }
 

@@ -5,8 +5,8 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Firmware.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using testing::IsEmpty;
@@ -49,7 +49,7 @@ TEST_P(InstallFromBytes, WritesTheImageByWayOfAFile)
                                        converted(first_port),
                                        downloaded(copy),
                                        {removing, removed, complete, gate_refreshing}}));
-    EXPECT_EQ(host.value("firmware"), new_version);
+    EXPECT_EQ(port_value(0, "firmware"), new_version);
     EXPECT_THAT(names_in(firmware_folder), IsEmpty());
     EXPECT_THAT(host.rig.server().report().violations, IsEmpty());
 }
@@ -140,7 +140,7 @@ TEST_P(InstallFromBytes, ResetsAfterAGoodDownload)
                                     {removing, removed, complete},
                                     reset_by_option(),
                                     reset_by_option()}));
-    EXPECT_EQ(host.value("resets"), "2");
+    EXPECT_EQ(port_value(0, "resets"), "2");
 }
 
 TEST_P(InstallFromBytes, AFailedDownloadRemovesTheFileAndDoesNotReset)
@@ -159,7 +159,7 @@ TEST_P(InstallFromBytes, AFailedDownloadRemovesTheFileAndDoesNotReset)
                                         {status_line(status), removing, removed, failed}}));
         EXPECT_THAT(names_in(firmware_folder), IsEmpty());
     }
-    EXPECT_EQ(host.value("resets"), "0");
+    EXPECT_EQ(port_value(0, "resets"), "0");
 }
 
 TEST_P(InstallFromBytes, AFailedResetIsTheAnswer)
@@ -174,7 +174,7 @@ TEST_P(InstallFromBytes, AFailedResetIsTheAnswer)
                 {status_line(190), "NVRHBA_SoftwareInstallationService_Provider::nvrcimResetHBA failed"}});
     ASSERT_GE(called.words.size(), end.size());
     EXPECT_EQ(Words(called.words.end() - static_cast<long>(end.size()), called.words.end()), end);
-    EXPECT_EQ(host.value("firmware"), new_version);
+    EXPECT_EQ(port_value(0, "firmware"), new_version);
     EXPECT_THAT(names_in(firmware_folder), IsEmpty());
 }
 
@@ -249,8 +249,22 @@ TEST_P(InstallFromBytes, AFileThatIsThereIsReplacedAndGoes)
     Firmware_Host host(*GetParam());
     write_file(copy, std::string(100000, 'o'));
     EXPECT_THAT(host.install_bytes(image(), {32768}, {copy}), returned(0));
-    EXPECT_EQ(host.value("firmware"), new_version);
+    EXPECT_EQ(port_value(0, "firmware"), new_version);
     EXPECT_THAT(names_in(firmware_folder), IsEmpty());
+}
+
+TEST_P(InstallFromBytes, AFileThatCannotBeRemovedIsTold)
+{
+    Firmware_Host host(*GetParam());
+    write_file(copy, "");
+    cover_file(copy, ""); // what something is mounted on stays
+    const Called called = host.install_bytes(image(), {32768}, {copy});
+    EXPECT_THAT(called, returned(0));
+    EXPECT_EQ(called.words,
+              joined({with_file(1, 32768),
+                      converted(first_port),
+                      downloaded(copy),
+                      {removing, "nvrcimDownloadFW: Can't stat file " + copy, complete, gate_refreshing}}));
 }
 
 TEST_P(InstallFromBytes, AFullDiskLeavesNoFile)

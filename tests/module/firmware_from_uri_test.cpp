@@ -5,10 +5,10 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Firmware.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/curl_libraries.h"
 #include "tests/support/file_server.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using testing::Contains;
@@ -49,15 +49,15 @@ TEST_P(InstallFromUri, WritesALocalImageWhereItLiesAndKeepsIt)
 {
     Firmware_Host host(*GetParam());
     write_image(local_image);
-    ASSERT_NE(host.value("firmware"), new_version);
+    ASSERT_NE(port_value(0, "firmware"), new_version);
     const Called installed = host.install(local_image);
     EXPECT_THAT(installed, returned(0));
     EXPECT_TRUE(installed.out("Job").is_null());
     EXPECT_EQ(installed.words,
               joined({opening_with_local_image(), downloaded(local_image), {complete, removing, gate_refreshing}}));
-    EXPECT_EQ(host.value("firmware"), new_version);
+    EXPECT_EQ(port_value(0, "firmware"), new_version);
     EXPECT_TRUE(exists(local_image));
-    EXPECT_EQ(host.value("resets"), "0");
+    EXPECT_EQ(port_value(0, "resets"), "0");
     EXPECT_THAT(host.rig.server().report().violations, IsEmpty());
 }
 
@@ -142,7 +142,7 @@ TEST_P(InstallFromUri, TakesTheOptionsThatItKnows)
         EXPECT_THAT(host.install(local_image, {unknown}), returned(5)) << unknown;
         EXPECT_THAT(host.install(local_image, {2, 4, unknown}), returned(5)) << unknown;
     }
-    EXPECT_EQ(host.value("resets"), "0");
+    EXPECT_EQ(port_value(0, "resets"), "0");
 }
 
 TEST_P(InstallFromUri, FetchesAnImageAndRemovesIt)
@@ -163,7 +163,7 @@ TEST_P(InstallFromUri, FetchesAnImageAndRemovesIt)
                 downloaded("an.image"),
                 {complete, removing, "nvrcimDownloadFW: FW file an.image removed successfully", gate_refreshing}});
     EXPECT_EQ(ending(called, end), end);
-    EXPECT_EQ(host.value("firmware"), new_version);
+    EXPECT_EQ(port_value(0, "firmware"), new_version);
     EXPECT_THAT(names_in(firmware_folder), IsEmpty());
 }
 
@@ -271,7 +271,7 @@ TEST_P(InstallFromUri, ResetsOnceForEachTimeItIsAsked)
                                     reset_by_option(),
                                     reset_by_option()}))
         << "and no refresh is asked for";
-    EXPECT_EQ(host.value("resets"), "2");
+    EXPECT_EQ(port_value(0, "resets"), "2");
 }
 
 TEST_P(InstallFromUri, AFailedResetIsTheAnswer)
@@ -289,7 +289,7 @@ TEST_P(InstallFromUri, AFailedResetIsTheAnswer)
                       {"HBA RESET OPTION SELECTED", "NVR_MethodWrapper::nvrcimReset"},
                       local(),
                       {status_line(64), "NVRHBA_SoftwareInstallationService_Provider::nvrcimResetHBA failed"}}));
-    EXPECT_EQ(host.value("firmware"), new_version) << "the image stays written";
+    EXPECT_EQ(port_value(0, "firmware"), new_version) << "the image stays written";
 }
 
 TEST_P(InstallFromUri, WhatIsNoImageIsRefusedAndAFetchedFileStays)

@@ -4,8 +4,8 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Firmware.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using testing::IsEmpty;
@@ -79,8 +79,8 @@ TEST_P(Firmware_Service, ResetsAnAdapterAndReadsItAnew)
                                              std::string(first_port) + " is Successful.. Updating the Provider Data",
                                          gate_refreshing}}));
     }
-    EXPECT_EQ(host.value("resets"), "3");
-    EXPECT_EQ(host.value("resets", "1"), "0");
+    EXPECT_EQ(port_value(0, "resets"), "3");
+    EXPECT_EQ(port_value(1, "resets"), "0");
     EXPECT_THAT(host.rig.server().report().violations, IsEmpty());
 }
 
@@ -134,7 +134,7 @@ TEST_P(Firmware_Service, SwitchesAPortOffAndOn)
         EXPECT_EQ(called.words, joined({switching(enable),
                                         {"Please reset the HBA to activate the new setting\n",
                                          "Exiting SetPortEnabled in SetPortEnabled \n", switched}}));
-        EXPECT_EQ(host.value("enabled"), enable ? "1" : "0");
+        EXPECT_EQ(port_value(0, "enabled"), enable ? "1" : "0");
     }
     EXPECT_THAT(
         host.service.call("setportenabled", {{"Target", host.target()}, {"PortEnabled", host::Value::boolean(true)}}),
@@ -158,7 +158,7 @@ TEST_P(Firmware_Service, BootCodeKeepsAPortAsItIs)
                                     {"\nERROR: FMCMD_SetPortEnabled ",
                                      "One or more Port Functions have Boot Code enabled. Enable through EnableBootCode",
                                      "Please disable Boot Code and try again.\n", not_switched}}));
-    EXPECT_EQ(host.value("enabled"), "1");
+    EXPECT_EQ(port_value(0, "enabled"), "1");
 }
 
 TEST_P(Firmware_Service, RefusesToSwitchWhatItDoesNotKnow)
@@ -176,9 +176,9 @@ TEST_P(Firmware_Service, RefusesToSwitchWhatItDoesNotKnow)
     }
     called = host.service.call("SetPortEnabled", {{"Target", unknown_port(host.rig)}, {"PortEnabled", on}});
     EXPECT_THAT(called, returned(32968));
-    EXPECT_EQ(called.words, (Words{gate, "Checking the FCPort",
-                                   "Could not find the passed LogicalPort in the provider resource map",
-                                   "NVRHBA_SoftwareInstallationService_Provider invalid port passed"}));
+    EXPECT_EQ(called.words,
+              (Words{gate, "Checking the FCPort", "Could not find the passed LogicalPort in the provider resource map",
+                     "NVRHBA_SoftwareInstallationService_Provider invalid port passed"}));
     for (const Arguments& arguments :
          {Arguments{{"Target", host.target()}},
           Arguments{{"Target", host.target()}, {"PortEnabled", host::Value::null_of(CMPI_boolean)}}}) {
@@ -235,7 +235,7 @@ TEST_P(Firmware_Service, ClientsThatCallAtOnceWaitForEachOther)
         EXPECT_EQ(answer.value.as_uint(), 0u);
     }
     host.rig.settle();
-    EXPECT_EQ(host.value("resets", "1"), "3");
-    EXPECT_EQ(host.value("firmware"), new_version);
+    EXPECT_EQ(port_value(1, "resets"), "3");
+    EXPECT_EQ(port_value(0, "firmware"), new_version);
     EXPECT_THAT(server.report().violations, IsEmpty());
 }

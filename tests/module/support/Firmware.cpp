@@ -57,13 +57,6 @@ Called Firmware_Host::install_bytes(const std::string& image, const std::vector<
                                                   {"InstallOptionsValues", texts_value(values)}});
 }
 
-std::string Firmware_Host::value(const std::string& name, const std::string& port)
-{
-    char text[256] = {};
-    if (nvrsim_get(port.c_str(), name.c_str(), text, sizeof text) == 0) throw std::runtime_error("no such value");
-    return text;
-}
-
 std::string image(const std::string& version, std::uint32_t payload)
 {
     const std::string path = "/var/log/made.image";

@@ -30,9 +30,6 @@ public:
     Called install(const std::string& uri, const std::vector<std::uint16_t>& options = {});
     Called install_bytes(const std::string& image, const std::vector<std::uint16_t>& options,
                          const std::vector<std::string>& values);
-
-    /// "firmware", "resets", ... of a simulated port.
-    static std::string value(const std::string& name, const std::string& port = "0");
 };
 
 /// The bytes of an image that the simulated adapters take; and the same in a file.
