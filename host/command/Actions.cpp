@@ -101,6 +101,25 @@ std::vector<Action> make_actions()
                          {0x2000, "a reset of the adapter activates them"}}}};
     add(action);
 
+    action = {"firmware",
+              "install",
+              "Write a firmware image to the adapter of a port",
+              firmware_service,
+              firmware_service_name,
+              "InstallFromURI"};
+    action.inputs = {{Input::text, "image", "URI", "The image: the path of a file, or an address to fetch it from"},
+                     {Input::flag,
+                      "--reset",
+                      "InstallOptions",
+                      "Reset the adapter when the image is written, which makes it active",
+                      {{"reset", "[2]"}, {"none", "NULL"}}}};
+    action.question = "An adapter that loses power while it is written to may not start again. Write firmware to the "
+                      "adapter of port";
+    action.doing = "writing the firmware";
+    action.meanings = {{5, "the image is no file that can be read"},
+                       {4107, "the image is not there, or could not be fetched"}};
+    add(action);
+
     action = {"bootbios", "status", "Show whether the boot code is enabled", boot_service, "", "GetBootBIOSStatus"};
     action.out_meanings = {{"nBootBIOSStatus", {{0, "disabled"}, {1, "enabled"}}}};
     add(action);
@@ -128,6 +147,7 @@ const std::vector<std::pair<std::string, std::string>>& action_groups()
     static const std::vector<std::pair<std::string, std::string>> groups = {
         {"port", "Find a port by its beacon, reset its adapter, enable or disable it"},
         {"wwn", "Show and change the World Wide Names of a port"},
+        {"firmware", "Write firmware to the adapter of a port"},
         {"bootbios", "Show and switch the boot code of an adapter"},
     };
     return groups;
