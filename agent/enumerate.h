@@ -1,7 +1,10 @@
 /// The three ways to enumerate a map: copy it under the agent's locks, let go of them, hand the copies out.
 ///
-/// The handler owns each instance it gets, and runs with no lock held. A copy that is refused ends the enumeration with
-/// a line in the log and nothing handed out. Nothing is thrown: an exception ends the enumeration with a line.
+/// Where the handler's owner has told what it will look at (runtime/Selection.h), no more than that is copied; and of
+/// the SAN side, whose instances are never written to once they are in their map, nothing for one that only reads: it
+/// gets a count of each. The handler owns each instance it gets, and runs with no lock held. A copy that is refused
+/// ends the enumeration with a line in the log and nothing handed out. Nothing is thrown: an exception ends the
+/// enumeration with a line.
 #pragma once
 
 #include "agent/ProviderAgent.h"
