@@ -4,8 +4,8 @@
 
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Rig.h"
-#include "tests/support/simulator.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 namespace nvrbench {
 

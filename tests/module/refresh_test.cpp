@@ -12,8 +12,8 @@
 
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Rig.h"
-#include "tests/support/simulator.h"
 #include "tests/module/support/Test_Clock.h"
+#include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
 using namespace nvrtest;
