@@ -19,9 +19,9 @@
 #include "host/Host.h"
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/private_host.h"
 #include "tests/support/private_host_setup.h"
+#include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
 namespace {
