@@ -149,6 +149,7 @@ TEST(ServiceClientsOfAnotherClass, FindNoMethod)
     const host::Answer ports = rig.names("NVRHBA_FCPort");
     const std::string device_id = ports.paths.at(0).find("DeviceID")->as_text();
     Entries entries;
+    rig.settle();
     rig.forget_words();
     rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
         for (const char* service : {wwn_class, boot_class}) {
