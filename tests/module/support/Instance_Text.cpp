@@ -1,12 +1,12 @@
 #include "tests/module/support/Instance_Text.h"
 
-#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
 #include <map>
 #include <sstream>
 #include <unistd.h>
+#include <unordered_map>
 
 namespace nvrtest {
 
@@ -84,15 +84,18 @@ std::string difference(const std::string& expected, const std::string& actual)
 {
     const std::vector<std::string> wanted = lines(expected);
     const std::vector<std::string> found = lines(actual);
+    if (wanted == found) return {};
+    std::unordered_map<std::string, long> missing; // less than 0: there are too many
+    for (const std::string& line : wanted)
+        missing[line]++;
+    for (const std::string& line : found)
+        missing[line]--;
     std::ostringstream result;
     for (const std::string& line : wanted)
-        if (std::count(found.begin(), found.end(), line) < std::count(wanted.begin(), wanted.end(), line))
-            result << "- " << line << '\n';
+        if (missing[line] > 0) result << "- " << line << '\n';
     for (const std::string& line : found)
-        if (std::count(wanted.begin(), wanted.end(), line) < std::count(found.begin(), found.end(), line))
-            result << "+ " << line << '\n';
-    if (result.str().empty() && wanted != found) result << "the same lines, in another order\n";
-    return result.str();
+        if (missing[line] < 0) result << "+ " << line << '\n';
+    return result.str().empty() ? "the same lines, in another order\n" : result.str();
 }
 
 } // namespace nvrtest
