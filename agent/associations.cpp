@@ -85,6 +85,21 @@ constexpr Link_Row rows[] = {
     {Link::ProviderUseOfLog, MAP(ProviderUseOfLog), "Antecedent", "Dependent", nullptr, "Insert Failed", nullptr, norvane},
     {Link::RemoteHostedAccessPoint, MAP(RemoteHostedAccessPoint), "Antecedent", "Dependent", nullptr, nullptr, nullptr, norvane},
     {Link::SAPAvailableForElement, MAP(SAPAvailableForElement), "AvailableSAP", "ManagedElement", nullptr, nullptr, nullptr, norvane},
+    {Link::ServiceAvailableToElement, MAP(ServiceAvailableToElement), "ServiceProvided", "UserOfService", nullptr, "Insert Failed : NVRHBA_ServiceAvailableToElement_map", nullptr, norvane},
+    {Link::DiagElementSoftwareIdentity, MAP(DiagElementSoftwareIdentity), "Antecedent", "Dependent", nullptr, "Insert Failed : NVRHBA_DiagElementSoftwareIdentity_map", nullptr, norvane},
+    {Link::DiagElementSettingData, MAP(DiagElementSettingData), "ManagedElement", "SettingData", nullptr, "Insert Failed : NVRHBA_DiagElementSettingData", nullptr, norvane},
+    {Link::DiagElementCapabilities, MAP(DiagElementCapabilities), "ManagedElement", "Capabilities", "NVRHBA_DiagElementCapabilities instance (NIC) is created", "Insert Failed : NVRHBA_FCHBAElementCapabilities_map", nullptr, norvane},
+    {Link::JobElementSettingData, MAP(JobElementSettingData), "ManagedElement", "SettingData", nullptr, "Insert Failed : NVRHBA_JobElementSettingData", nullptr, norvane},
+    {Link::UseOfLog, MAP(UseOfLog), "Antecedent", "Dependent", nullptr, "Insert Failed : UseOfLog_map", nullptr, norvane},
+    {Link::AvailableDiagnosticService, MAP(AvailableDiagnosticService), "ServiceProvided", "UserOfService", nullptr, "Insert Failed : NVRHBA_AvailableDiagnosticService_map", nullptr, norvane},
+    {Link::ServiceAffectsElement, MAP(ServiceAffectsElement), "AffectedElement", "AffectingElement", nullptr, "Insert Failed : NVRHBA_ServiceAffectsElement_map", nullptr, norvane},
+    {Link::DiagServiceConformsToProfile, MAP(DiagServiceConformsToProfile), "ConformantStandard", "ManagedElement", nullptr, "Insert failed : NVRHBA_ServiceConformsToProfile_map", nullptr, norvane},
+    {Link::DiagHostedService, MAP(DiagHostedService), "Antecedent", "Dependent", nullptr, "Insert failed : NVRHBA_DiagHostedService_map", nullptr, norvane},
+    {Link::OwningJobElement, MAP(OwningJobElement), "OwningElement", "OwnedElement", nullptr, "Insert Failed: NVRHBA_OwningJobElement", "Unable to create NVRHBA_OwningJobElement", norvane},
+    {Link::AffectedJobElement, MAP(AffectedJobElement), "AffectedElement", "AffectingElement", nullptr, "Insert Failed: NVRHBA_AffectedJobElement", "Unable to create NVRHBA_AffectedJobElement", norvane},
+    {Link::LogManagesRecord, MAP(LogManagesRecord), "Log", "Record", nullptr, "Insert Failed : NVRHBA_LogManagesRecord", "Failed to create NVRHBA_LogManagesRecord", norvane},
+    {Link::CorrespondingSettingDataRecord, MAP(CorrespondingSettingDataRecord), "DataRecord", "SettingsRecord", nullptr, "Insert Failed : NVRHBA_CorrespondingSettingDataRecord", "Failed to create NVRHBA_CorrespondingSettingDataRecord", norvane},
+    {Link::RecordAppliesToElement, MAP(RecordAppliesToElement), "Antecedent", "Dependent", nullptr, "Insert Failed : RecordAppliesToElement", "Failed to create NVRHBA_RecordAppliesToElement", norvane},
 };
 // clang-format on
 #undef MAP
@@ -118,24 +133,27 @@ const Link_Row& link_row(Link link)
     return rows[static_cast<std::size_t>(link)];
 }
 
-Instance* associate(ProviderAgent& agent, Link link, const Instance* first, const Instance* second, const char* text)
+Ref<Instance> makeAssociation(ProviderAgent& agent, Link link, const Instance* first, const Instance* second,
+                              const char* text)
 {
     const Link_Row& row = link_row(link);
     if (row.trace) NVR_LOG(row.trace, text);
     if (!first || !second) {
         NVR_LOG("%s", row.missing ? row.missing : "Could not create the instance of the Association class");
-        return nullptr;
+        return Ref<Instance>();
     }
-    Instance_Map& map = row.map(agent);
-    Ref<Instance> association(create(map.meta_class(), true));
+    Ref<Instance> association(create(row.map(agent).meta_class(), true));
     if (row.name_space) association->__name_space = row.name_space;
     set_end(association.get(), row.first, first);
     set_end(association.get(), row.second, second);
-    if (map.insert(association.get()) < 0) {
-        logInsertFailed(map, row.failure);
-        return nullptr;
-    }
-    return association.release();
+    return association;
+}
+
+Instance* associate(ProviderAgent& agent, Link link, const Instance* first, const Instance* second, const char* text)
+{
+    const Link_Row& row = link_row(link);
+    Ref<Instance> association = makeAssociation(agent, link, first, second, text);
+    return association ? insertOrLog(row.map(agent), std::move(association), row.failure) : nullptr;
 }
 
 Instance* createComputerSystemConformsToProfile(ProviderAgent& agent, const Instance* profile)

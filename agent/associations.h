@@ -76,6 +76,22 @@ enum class Link {
     ProviderUseOfLog,
     RemoteHostedAccessPoint,
     SAPAvailableForElement,
+    // Diagnostics: what is fixed, and what each run adds.
+    ServiceAvailableToElement,
+    DiagElementSoftwareIdentity,
+    DiagElementSettingData,
+    DiagElementCapabilities,
+    JobElementSettingData,
+    UseOfLog,
+    AvailableDiagnosticService,
+    ServiceAffectsElement,
+    DiagServiceConformsToProfile,
+    DiagHostedService,
+    OwningJobElement,
+    AffectedJobElement,
+    LogManagesRecord,
+    CorrespondingSettingDataRecord,
+    RecordAppliesToElement,
     count
 };
 
@@ -96,6 +112,9 @@ const Link_Row& link_row(Link link);
 /// map's own; or null, logged, for a null end or known keys.
 Instance* associate(ProviderAgent& agent, Link link, const Instance* first, const Instance* second,
                     const char* text = "");
+/// The same without the insert: the caller's own.
+Ref<Instance> makeAssociation(ProviderAgent& agent, Link link, const Instance* first, const Instance* second,
+                              const char* text = "");
 
 /// Does nothing but say so if the host is not of our own making.
 Instance* createComputerSystemConformsToProfile(ProviderAgent& agent, const Instance* profile);

@@ -54,6 +54,13 @@ bool AttributeBlock::bytes(uint16 number, void* value, std::size_t size, uint32&
     return true;
 }
 
+bool AttributeBlock::wholeBytes(uint16 number, void* value, std::size_t size, uint32& status)
+{
+    std::size_t room = 0;
+    uint16 length = 0;
+    return find(number, room, length, status) && length >= size && bytes(number, value, size, status);
+}
+
 bool AttributeBlock::text(uint16 number, std::string& value, uint32& status)
 {
     value.clear();

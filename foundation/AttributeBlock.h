@@ -28,6 +28,8 @@ public:
     bool number(uint16 number, uint32& value, uint32& status);
     bool text(uint16 number, std::string& value, uint32& status); ///< at most 255 bytes, up to the first zero byte
     bool bytes(uint16 number, void* value, std::size_t size, uint32& status);
+    /// The same, but an attribute that the library says is shorter is missing.
+    bool wholeBytes(uint16 number, void* value, std::size_t size, uint32& status);
     /// A 64-bit number; here a value counts whatever the status says.
     bool wide(uint16 number, uint64& value);
 

@@ -1,5 +1,6 @@
 // What the module composes into the agent's refresh.
 #include "agent/Agent_Builders.h"
+#include "diagnostics/NVR_Diagnostics.h"
 #include "logs/NVRHBA_DriverLogProfile.h"
 #include "services/NVR_Dump.h"
 #include "services/NVR_PortVirtualization.h"
@@ -9,11 +10,11 @@ namespace cimple {
 const Agent_Builders agent_builders = {
     &NVRHBA_DriverLogProfile::ClearFCDriverLogClasses,
     &NVR_PortVirtualization::ClearPortVirtualizationMaps,
-    nullptr,
+    &NVR_Diagnostics::ClearDiagnosticClassMaps,
     &NVRHBA_DriverLogProfile::CreateFCDriverLogClasses,
     &NVR_Dump::FC_CreateDumpClasses,
     &NVR_PortVirtualization::CreatePortVirtualizationClasses,
-    nullptr,
+    &NVR_Diagnostics::CreateFCHBADiagnosticClassFeature,
 };
 
 } // namespace cimple

@@ -174,7 +174,12 @@ void expect_order_of_the_walk(Rig& rig)
             });
             order.push_back(port == ports.end() ? 0 : static_cast<std::size_t>(port - ports.begin()) + 1);
         }
-        EXPECT_TRUE(std::is_sorted(order.begin(), order.end())) << name << ' ' << testing::PrintToString(order);
+        // These walk the ports once for each of the nine tests.
+        const bool per_test = name == "NVRHBA_AvailableDiagnosticService" || name == "NVRHBA_ServiceAffectsElement";
+        const auto step = static_cast<std::ptrdiff_t>(per_test ? ports.size() : std::max<std::size_t>(order.size(), 1));
+        ASSERT_EQ(static_cast<std::ptrdiff_t>(order.size()) % step, 0) << name;
+        for (auto part = order.begin(); part != order.end(); part += step)
+            EXPECT_TRUE(std::is_sorted(part, part + step)) << name << ' ' << testing::PrintToString(order);
         classes += !order.empty() && order.back() > 1;
     }
     EXPECT_GT(classes, 30u);
