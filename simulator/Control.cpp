@@ -126,6 +126,8 @@ bool set_value(const std::string& port, const std::string& name, uint64_t value,
         found->retention = word;
     } else if (name == "local") {
         found->local = value != 0;
+    } else if (name == "loopback_plug") {
+        found->loopbackPlug = value != 0;
     } else if (name == "present") {
         adapter->present = value != 0;
         simulator.host.reindex();
@@ -171,6 +173,8 @@ bool get_value(const std::string& port, const std::string& name, std::string& va
         value = found->pending ? to_text(found->pending->names.wwpn) : "none";
     else if (name == "firmware")
         value = adapter->firmwareVersion;
+    else if (name == "test")
+        value = found->diagnostics.lastStart.empty() ? "none" : found->diagnostics.lastStart;
     else if (name == "present")
         value = adapter->present ? "1" : "0";
     else if (name == "targets")

@@ -6,7 +6,7 @@ namespace nvrsim {
 
 size_t visible_targets(const Port& port)
 {
-    return port.link_is_up() ? port.targets.size() : 0;
+    return port.link_is_up() && !port.loopbackPlug ? port.targets.size() : 0;
 }
 
 void fill_entry(Call& call, const Port& port, const Target& target, uint32_t targetNumber, const Lun& lun,

@@ -8,7 +8,7 @@
 
 namespace nvrsim {
 
-/// Targets of a port whose link is up; 0 for one whose link is down.
+/// Targets of a port whose link is up; 0 for one whose link is down or leads back to itself.
 size_t visible_targets(const Port& port);
 
 void fill_entry(Call& call, const Port& port, const Target& target, uint32_t targetNumber, const Lun& lun,

@@ -116,6 +116,7 @@ struct Diagnostic_Test {
     uint32_t polls = 0; // answers "running" this often
     uint32_t result = 0;
     uint32_t cycles = 0;
+    uint32_t cancelPolls = 0; // after a cancel
     bool cancelled = false;
 };
 
@@ -123,8 +124,15 @@ struct Diagnostic_Test {
 struct Diagnostics {
     bool available = true;
     uint32_t polls = 1;
+    uint32_t runningState = RM_DIAG_RUNNING; // while it is polled
+    uint32_t runningStatus = RM_STATUS_NO_RESULT_YET;
+    uint32_t state = RM_DIAG_COMPLETED; // behind the polls
     uint32_t seconds = 1;
+    std::optional<uint32_t> cycles;      // default: as many as were asked for
+    std::optional<uint32_t> loopsFailed; // default: 1 for a test that fails
     bool canCancel = true;
+    uint32_t cancelPolls = 0;                // that a cancelled test still runs
+    std::string lastStart;                   // the newest test and its arguments
     std::map<std::string, uint32_t> results; // by "post", "loopback", "external_loopback", "pci_loopback", "echo"
     std::map<uint32_t, Diagnostic_Test> tests;
     uint32_t nextId = 1;

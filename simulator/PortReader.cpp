@@ -194,7 +194,13 @@ void read_diagnostics(Fields& port, Port& target)
     fields.boolean("available", diagnostics.available);
     fields.boolean("can_cancel", diagnostics.canCancel);
     fields.number("polls", diagnostics.polls);
+    fields.number("running_state", diagnostics.runningState);
+    fields.number("running_status", diagnostics.runningStatus);
+    fields.number("state", diagnostics.state);
     fields.number("seconds", diagnostics.seconds);
+    fields.number("cycles", diagnostics.cycles);
+    fields.number("loops_failed", diagnostics.loopsFailed);
+    fields.number("cancel_polls", diagnostics.cancelPolls);
     for (const char* kind : {"post", "loopback", "external_loopback", "pci_loopback", "echo"}) {
         std::optional<uint32_t> result;
         fields.number(kind, result);

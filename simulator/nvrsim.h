@@ -54,10 +54,11 @@ int nvrsim_event(const char* port, uint32_t type, uint32_t fabric_port_id);
 void nvrsim_drain_events(void);
 
 /* A value of a port as text: "wwpn", "wwnn", "state", "speed", "fc_id", "beacon", "enabled", "boot_code", "resets",
- * "retention", "pending", "firmware", "present", "targets", "paths". Length, or 0 for an unknown port or name. */
+ * "retention", "pending", "firmware", "present", "targets", "paths", "test" (the newest diagnostic test with its
+ * arguments: echo cycles=5 halt=0 pattern=1a2b3c4d target=50060E8005A10000). Length, or 0 for an unknown port or name. */
 size_t nvrsim_get(const char* port, const char* name, char* buffer, size_t size);
 /* Sets "state", "speed", "fc_id", "beacon", "enabled", "boot_code", "retention", "present" (0 takes the port's whole
- * adapter out of the host), "local", "statistic:N", "attribute:N" (32-bit number). */
+ * adapter out of the host), "local", "loopback_plug", "statistic:N", "attribute:N" (32-bit number). */
 int nvrsim_set(const char* port, const char* name, uint64_t value);
 /* Activates names that wait for a reboot, on all ports. */
 void nvrsim_reboot(void);
