@@ -120,6 +120,57 @@ TEST_F(Services, BeaconCanBeMissingInTwoWays)
     EXPECT_EQ(2u, nvrsim_RM_DiagBeaconState(wire(port1), &state));
 }
 
+TEST_F(Services, TestsRunAndEndAsTheScenarioSays)
+{
+    load("[[adapter]]\n[[adapter.port]]\ndiagnostics = { polls = 2, running_state = 1, running_status = 0, state = 9, "
+         "cycles = 5, loops_failed = 3, seconds = 7, loopback = 2, cancel_polls = 1 }\n");
+    uint32_t id = 0;
+    ASSERT_EQ(0u, nvrsim_RM_DiagLoopBackTestV3(wire(port0), 1, 10, 1, &id, 0, "1a2b"));
+    EXPECT_EQ("loopback cycles=10 halt=1 pattern=1a2b", sim_value("0", "test"));
+    RM_DIAGRESULT result = {};
+    for (int poll = 0; poll < 2; ++poll) {
+        EXPECT_EQ(0u, nvrsim_RM_DiagGetResults(wire(port0), id, &result));
+        EXPECT_EQ(1u, result.state);
+    }
+    EXPECT_EQ(0u, nvrsim_RM_DiagGetResults(wire(port0), id, &result));
+    EXPECT_EQ(9u, result.state);
+    EXPECT_EQ(2u, result.resultCode);
+    EXPECT_EQ(5u, result.cyclesCompleted);
+    EXPECT_EQ(3u, result.loopsFailed);
+    EXPECT_EQ(7u, result.executionTime);
+    // A cancel takes its time.
+    EXPECT_EQ(0u, nvrsim_RM_DiagCancelDiagnostic(wire(port0), id));
+    EXPECT_EQ(0u, nvrsim_RM_DiagGetResults(wire(port0), id, &result));
+    EXPECT_EQ(1u, result.state);
+    EXPECT_EQ(0u, nvrsim_RM_DiagGetResults(wire(port0), id, &result));
+    EXPECT_EQ(unsigned(RM_DIAG_CANCELLED), result.state);
+    EXPECT_EQ(4u, nvrsim_RM_DiagGetResults(wire(port0), id + 1, &result));
+}
+
+TEST_F(Services, OldResultsMakeRoom)
+{
+    load("[[adapter]]\n");
+    RM_DIAGRESULT result = {};
+    uint32_t first = 0, id = 0;
+    ASSERT_EQ(0u, nvrsim_RM_DiagRunPOST(wire(port0), &first));
+    for (int i = 0; i < 64; ++i)
+        ASSERT_EQ(0u, nvrsim_RM_DiagRunPOST(wire(port0), &id));
+    EXPECT_EQ(4u, nvrsim_RM_DiagGetResults(wire(port0), first, &result));
+    EXPECT_EQ(60u, nvrsim_RM_DiagGetResults(wire(port0), id, &result));
+}
+
+TEST_F(Services, ALoopbackPlugHidesFabricAndTargets)
+{
+    load("[[adapter]]\n[[target]]\n");
+    RM_TARGETLIST list = {};
+    list.count = 1;
+    EXPECT_EQ(0u, nvrsim_RM_GetFcpTargetMapping(wire(port0), &list));
+    EXPECT_EQ(1u, list.count);
+    ASSERT_EQ(0, nvrsim_set("0", "loopback_plug", 1));
+    EXPECT_EQ(0u, nvrsim_RM_GetFcpTargetMapping(wire(port0), &list));
+    EXPECT_EQ(0u, list.count);
+}
+
 TEST_F(Services, DriverParametersAreListedAndSet)
 {
     std::vector<RM_DRIVERPARAM> list(RM_DRIVERPARAM_FIRST_COUNT);
