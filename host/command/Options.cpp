@@ -34,11 +34,13 @@ constexpr const char* footer =
     "  nvrcim wwn change 10000000C9A0F001 20000000C9A0F001 --type volatile --yes\n"
     "  nvrcim log trace /var/log/norvane.trace\n"
     "  nvrcim listen --json\n"
+    "  nvrcim diag run internal-loopback 10000000C9A00001 --loops 20 --pattern 5a5a\n"
     "\n"
     "Exit status: 0 done; a CIM status code (1 failed, 2 access denied, 3 no such namespace, 4 bad parameter,\n"
     "5 no such class, 6 not found, 7 not supported, ...); 64 for a command that cannot be understood; of the actions "
     "on\n"
-    "ports and logs also 65, the question was answered with no, and 66, the method returned another value than 0.\n"
+    "ports and logs also 65, the question was answered with no, and 66, the method returned another value than 0;\n"
+    "of diag run 67, the test found a fault.\n"
     "Environment: NVRCIM_MODULE, NVRCIM_MOF, NVRCIM_SIMULATOR name the places that are otherwise found beside nvrcim.";
 
 std::string manners()
@@ -84,6 +86,34 @@ void add_actions(CLI::App& app, Options& options)
             verb->callback([&options, &action] { options.action = &action; });
         }
     }
+}
+
+void add_diagnostics(CLI::App& app, Options& options)
+{
+    CLI::App* group = app.add_subcommand("diag", "List and run the diagnostic tests, and show what they have found");
+    group->require_subcommand(1);
+    const auto add = [&](const char* name, const char* help) {
+        CLI::App* verb = group->add_subcommand(name, help);
+        verb->callback([&options, name] { options.method = name; });
+        return verb;
+    };
+    add("list", "Show the tests, the ports that can run them, and their options");
+    CLI::App* run = add("run", "Run a test on a port, to its end");
+    run->add_option("test", options.object, "The test, as diag list shows it, or by its whole name")->required();
+    run->add_option("port", options.port, "The port, by its World Wide Name; not needed if there is one only");
+    const auto add_setting = [&](const char* label, const char* help) {
+        return run->add_option_function<std::string>(
+            label, [&options, label](const std::string& text) { options.given[label] = text; }, help);
+    };
+    add_setting("--loops", "How often, 1 to 4000")->check(CLI::Range(1, 4000));
+    add_setting("--pattern", "The bytes to send, as hexadecimal digits");
+    add_setting("--size", "How many of them, 1 to 8")->check(CLI::Range(1, 8));
+    add_setting("--target", "Port name of the device that answers an echo or a ping");
+    run->add_flag_callback(
+        "--halt-on-error", [&options] { options.given["--halt-on-error"] = ""; }, "End with the first loop that fails");
+    add("results", "Show the records of the runs since the module was loaded");
+    add("clear", "Remove the records of all tests, or of one")
+        ->add_option("test", options.object, "The test whose log is cleared");
 }
 
 } // namespace
@@ -163,6 +193,7 @@ int read_options(int count, char** arguments, Options& options)
 
     add_actions(app, options);
     add_log_verbs(app, options);
+    add_diagnostics(app, options);
 
     CLI::App* serve = app.add_subcommand("serve", "Answer CIM-XML over HTTP, for trying and testing");
     serve->add_option("--port", options.tcp_port, "TCP port; 0 for any that is free")->capture_default_str();

@@ -4,6 +4,7 @@
 #include "host/command/Actions.h"
 #include "host/command/Arguments.h"
 #include "host/command/Check.h"
+#include "host/command/Diagnostics.h"
 #include "host/command/Graph.h"
 #include "host/command/Logs.h"
 #include "host/command/Serve.h"
@@ -32,6 +33,7 @@ public:
     int verb()
     {
         if (m_options.action) return run_action(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "diag") return run_diagnostics(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "classes") return classes();
         if (m_options.verb == "tree") return show_tree(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "graph") return draw_graph(m_server, m_options, m_out, m_complaints);
