@@ -9,8 +9,8 @@
 
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Service.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/module/support/Test_Clock.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using testing::Contains;
