@@ -8,6 +8,7 @@
 #include "agent/fatal_signal.h"
 #include "agent/guarded.h"
 #include "agent/map_classes.h"
+#include "agent/settings_at_exit.h"
 #include "foundation/CLogger.h"
 #include "foundation/Management_Session.h"
 #include "foundation/NVR_Common.h"
@@ -32,6 +33,7 @@ void ProviderAgent::construct(int errno_found)
     prepareFatalSignalAction();
 
     CLogger::instance()->loadSettings();
+    saveAtExit(m_config);
     m_cacheTimeout = m_config.getCacheTimeout();
     m_bRefreshAdapterData = m_config.getRefreshAdapterData();
     m_bRefreshSANData = m_config.getRefreshSANData();
@@ -54,6 +56,7 @@ void ProviderAgent::construct(int errno_found)
 ProviderAgent::~ProviderAgent()
 {
     if (guarded([this] { destruct(); })) return;
+    letGoAtExit();
     NVR_LOG("Error in ProviderAgent unload. Just continue");
     CLogger::instance()->detachAll(); // the loggers go with the members
 }
@@ -80,6 +83,7 @@ void ProviderAgent::destruct()
     ClearMaps();
     forgetBaseServerProfile();
 
+    letGoAtExit();
     CLogger::instance()->saveSettings();
     NVR_LOG("Norvane Provider Unloaded");
     unloadLibraries();

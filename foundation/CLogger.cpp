@@ -51,6 +51,16 @@ CLogger::Hold::Hold() : m_outermost(!holds_dispatch_mutex)
     }
 }
 
+CLogger::Hold::Hold(std::try_to_lock_t) : m_outermost(!holds_dispatch_mutex && dispatch_mutex().lock_soon())
+{
+    if (m_outermost) holds_dispatch_mutex = true;
+}
+
+bool CLogger::Hold::held() const
+{
+    return holds_dispatch_mutex;
+}
+
 CLogger::Hold::~Hold()
 {
     if (m_outermost) {

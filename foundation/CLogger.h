@@ -10,6 +10,7 @@
 #pragma once
 
 #include <atomic>
+#include <mutex>
 #include <string>
 #include <vector>
 
@@ -62,6 +63,9 @@ public:
     /// Writes mode, level, enabled flag and the trace file's path (of the first attached NVR_FileLogger) to
     /// "/etc/norvane_fc_provider.dmp". A file that cannot be opened is logged and that is all.
     void saveSettings();
+    /// The same for a process that ends: logs nothing, and leaves the file as it is if another thread keeps the
+    /// dispatch mutex.
+    void saveSettingsAtExit();
 
     /// Reads them back and applies them; a fault is logged, and what was not yet applied stays as it was. Modes 0, 1
     /// and 3 have no path, which no file logger accepts: of such a file only the enabled flag takes effect.
@@ -72,9 +76,12 @@ public:
     class Hold {
     public:
         Hold();
+        /// Does not wait for ever: held() tells.
+        explicit Hold(std::try_to_lock_t);
         ~Hold();
         Hold(const Hold&) = delete;
         Hold& operator=(const Hold&) = delete;
+        bool held() const;
 
     private:
         bool m_outermost;
@@ -87,6 +94,7 @@ private:
     void countOthers();
     bool setTracePath(const char* path);
     std::string tracePath() const;
+    bool writeSettings() const;
 
     std::atomic<uint32> m_mode{0};
     std::atomic<sint32> m_level{0};

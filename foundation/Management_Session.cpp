@@ -114,6 +114,11 @@ Management_Session::Management_Session()
     NVR_LOG("RMLIB initialized");
 }
 
+void Management_Session::forgetName()
+{
+    ::sem_unlink(guard_name().c_str());
+}
+
 Management_Session::~Management_Session()
 {
     NVR_LOG("Destructor");

@@ -13,6 +13,10 @@ public:
     ~Management_Session();
     Management_Session(const Management_Session&) = delete;
     Management_Session& operator=(const Management_Session&) = delete;
+
+    /// For a process that ends without the destructor: takes the semaphore's name away, which would stay behind. Takes
+    /// no lock and calls no library.
+    static void forgetName();
 };
 
 } // namespace cimple

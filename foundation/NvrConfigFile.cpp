@@ -40,7 +40,7 @@ char* trim(char* text)
     return text;
 }
 
-bool read_flag(const char* value, bool& flag)
+bool read_flag(const char* value, std::atomic<bool>& flag)
 {
     if (std::strcmp(value, "TRUE") == 0)
         flag = true;
@@ -51,7 +51,7 @@ bool read_flag(const char* value, bool& flag)
     return true;
 }
 
-bool read_timeout(const char* value, uint32& minutes)
+bool read_timeout(const char* value, std::atomic<uint32>& minutes)
 {
     const long number = std::strtol(value, nullptr, 10);
     if (number < min_cache_timeout || number > max_cache_timeout) return false;
@@ -102,42 +102,38 @@ void NvrConfigFile::load(const char* path)
 void NvrConfigFile::save()
 {
     Undisturbed undisturbed;
-    File file = open_file(m_path.c_str(), "w");
-    if (!file) return;
-    std::fprintf(file.get(),
-                 "##################################################\n"
-                 "# Norvane HBA CIM Provider Configuration Settings #\n"
-                 "##################################################\n"
-                 "%s = %d\n"
-                 "%s = %s\n"
-                 "%s = %s\n",
-                 key_cache_timeout, static_cast<int>(getCacheTimeout()), key_refresh_adapter_data,
-                 getRefreshAdapterData() ? "TRUE" : "FALSE", key_refresh_san_data,
-                 getRefreshSANData() ? "TRUE" : "FALSE");
+    char text[400];
+    std::snprintf(text, sizeof text,
+                  "##################################################\n"
+                  "# Norvane HBA CIM Provider Configuration Settings #\n"
+                  "##################################################\n"
+                  "%s = %d\n"
+                  "%s = %s\n"
+                  "%s = %s\n",
+                  key_cache_timeout, static_cast<int>(getCacheTimeout()), key_refresh_adapter_data,
+                  getRefreshAdapterData() ? "TRUE" : "FALSE", key_refresh_san_data,
+                  getRefreshSANData() ? "TRUE" : "FALSE");
+    write_text(m_path.c_str(), text);
 }
 
 uint32 NvrConfigFile::getCacheTimeout() const
 {
-    Auto_Mutex lock(m_mutex);
     return m_cacheTimeout;
 }
 
 bool NvrConfigFile::getRefreshAdapterData() const
 {
-    Auto_Mutex lock(m_mutex);
     return m_refreshAdapterData;
 }
 
 bool NvrConfigFile::getRefreshSANData() const
 {
-    Auto_Mutex lock(m_mutex);
     return m_refreshSANData;
 }
 
 int NvrConfigFile::setCacheTimeout(uint32 minutes)
 {
     if (minutes < min_cache_timeout || minutes > max_cache_timeout) return -1;
-    Auto_Mutex lock(m_mutex);
     m_cacheTimeout = minutes;
     return 0;
 }
@@ -145,7 +141,6 @@ int NvrConfigFile::setCacheTimeout(uint32 minutes)
 int NvrConfigFile::setRefreshAdapterData(uint32 flag)
 {
     if (flag > 1) return -1;
-    Auto_Mutex lock(m_mutex);
     m_refreshAdapterData = flag == 1;
     return 0;
 }
@@ -153,7 +148,6 @@ int NvrConfigFile::setRefreshAdapterData(uint32 flag)
 int NvrConfigFile::setRefreshSANData(uint32 flag)
 {
     if (flag > 1) return -1;
-    Auto_Mutex lock(m_mutex);
     m_refreshSANData = flag == 1;
     return 0;
 }

@@ -1,12 +1,12 @@
 /// The provider's settings, "/etc/norvane_fc_provider.conf": read when the agent is built, written back when it goes.
 ///
-/// Any thread may read and set the values while the file is not being loaded. No fault in the file is an error: what it
-/// does not say validly keeps its default.
+/// Any thread may read, set and save the values while the file is not being loaded, without a lock. No fault in the
+/// file is an error: what it does not say validly keeps its default.
 #pragma once
 
+#include <atomic>
 #include <string>
 
-#include "runtime/Mutex.h"
 #include "runtime/String.h"
 #include "runtime/Type.h"
 
@@ -37,11 +37,10 @@ public:
     int setRefreshSANData(uint32 flag);
 
 private:
-    bool m_refreshAdapterData = false;
-    bool m_refreshSANData = true;
-    uint32 m_cacheTimeout = 10;
+    std::atomic<bool> m_refreshAdapterData{false};
+    std::atomic<bool> m_refreshSANData{true};
+    std::atomic<uint32> m_cacheTimeout{10};
     String m_path;
-    mutable Mutex m_mutex{true};
 };
 
 /// The agent's settings file.

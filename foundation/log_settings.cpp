@@ -29,18 +29,23 @@ bool CLogger::setTracePath(const char* path)
     return true;
 }
 
+bool CLogger::writeSettings() const
+{
+    char line[40];
+    std::snprintf(line, sizeof line, "%d,%d,%d\n", static_cast<int>(getMode()), getLevel(), isEnabled() ? 1 : 0);
+    return write_text(log_settings_path, line + tracePath());
+}
+
 void CLogger::saveSettings()
 {
     Undisturbed undisturbed;
-    const std::string path = tracePath();
-    File file = open_file(log_settings_path, "w");
-    if (!file) {
-        NVR_LOG("Unable to open file for storing config data");
-        return;
-    }
-    std::fprintf(file.get(), "%d,%d,%d\n", static_cast<int>(getMode()), getLevel(), isEnabled() ? 1 : 0);
-    std::fputs(path.c_str(), file.get());
-    std::fflush(file.get());
+    if (!writeSettings()) NVR_LOG("Unable to open file for storing config data");
+}
+
+void CLogger::saveSettingsAtExit()
+{
+    const Hold hold(std::try_to_lock);
+    if (hold.held()) static_cast<void>(writeSettings());
 }
 
 void CLogger::loadSettings()

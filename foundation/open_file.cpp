@@ -57,6 +57,19 @@ int fault_of_file(const char* path)
     return ::stat(path, &status) == 0 && is_regular(status) ? 0 : errno;
 }
 
+bool write_text(const char* path, std::string_view text)
+{
+    const int fd = ::open(path, O_WRONLY | O_CREAT | O_TRUNC | always, 0666);
+    if (fd < 0) return false;
+    while (!text.empty()) {
+        const ssize_t written = ::write(fd, text.data(), text.size());
+        if (written <= 0 && errno != EINTR) break;
+        if (written > 0) text.remove_prefix(static_cast<std::size_t>(written));
+    }
+    ::close(fd);
+    return true;
+}
+
 File open_regular_file(const char* path, const char* mode)
 {
     // Even to open a device can do something, so what is known to be none of ours is not opened at all.

@@ -3,6 +3,7 @@
 
 #include <cstdio>
 #include <memory>
+#include <string_view>
 
 namespace cimple {
 
@@ -15,7 +16,11 @@ using File = std::unique_ptr<std::FILE, Close_File>;
 /// that would wait fails. The file is closed in programs that the process starts.
 File open_file(const char* path, const char* mode);
 
-/// The same for paths that clients name, which may lead anywhere: as fopen with mode "rb" or "wb", but for regular
+/// Empties the file or makes it, and writes the text; false if it cannot be opened, with errno set. What does not fit
+/// is lost. Takes no lock, also none of the C library's: to be called by a process that ends, too.
+bool write_text(const char* path, std::string_view text);
+
+/// As open_file, for paths that clients name, which may lead anywhere: as fopen with mode "rb" or "wb", but for regular
 /// files alone (errno EINVAL for others). Writing empties a file that is there, also behind a link, and else makes it;
 /// a link that leads nowhere is refused (EEXIST).
 File open_regular_file(const char* path, const char* mode);

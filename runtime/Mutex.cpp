@@ -2,6 +2,7 @@
 
 #include <cassert>
 #include <cerrno>
+#include <ctime>
 
 namespace cimple {
 
@@ -21,6 +22,16 @@ int Mutex::try_lock()
 {
     const int status = pthread_mutex_trylock(&_rep.mutex);
     return status == 0 || status == EBUSY ? status : -1;
+}
+
+bool Mutex::lock_soon()
+{
+    constexpr timespec pause = {0, 1000000};
+    for (int tries = 0; tries < 100; tries++) {
+        if (try_lock() == 0) return true;
+        ::nanosleep(&pause, nullptr);
+    }
+    return false;
 }
 
 void Cond::wait(Mutex& mutex)

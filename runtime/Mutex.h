@@ -27,6 +27,9 @@ public:
     void unlock();
     /// 0, EBUSY (16) if another thread holds it, or -1.
     int try_lock();
+    /// True once the mutex is the caller's; false if that does not happen within about 100 milliseconds. For a process
+    /// that ends, whose other threads may hold the mutex for ever.
+    bool lock_soon();
 
 private:
     friend class Cond;

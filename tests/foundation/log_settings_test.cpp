@@ -1,6 +1,8 @@
 #include "foundation/CLogger.h"
 
 #include <cerrno>
+#include <future>
+#include <thread>
 
 #include <gmock/gmock.h>
 #include <sys/stat.h>
@@ -254,4 +256,35 @@ TEST(LogSettingsWithoutTraceFile, ApplyModeAndLevel)
     EXPECT_EQ(logger().getLevel(), 5);
     logger().saveSettings();
     EXPECT_EQ(read_file(settings), "1,5,1\n");
+}
+
+TEST_F(LogSettings, AreSavedAtExitWithoutAWord)
+{
+    load("2,5,1\n" + trace);
+    remove(settings);
+    logger().saveSettingsAtExit();
+    EXPECT_EQ(read_file(settings), "2,5,1\n" + trace);
+
+    remove(settings);
+    make_folder(settings);
+    Log_Capture capture;
+    logger().saveSettingsAtExit();
+    EXPECT_THAT(capture.words(), IsEmpty());
+    remove(settings);
+}
+
+TEST_F(LogSettings, StayAsTheyAreAtExitIfAnotherThreadKeepsTheLogger)
+{
+    write_file(settings, "as it was");
+    std::promise<void> holds, ends;
+    std::thread keeper([&] {
+        const CLogger::Hold hold;
+        holds.set_value();
+        ends.get_future().wait();
+    });
+    holds.get_future().wait();
+    logger().saveSettingsAtExit();
+    ends.set_value();
+    keeper.join();
+    EXPECT_EQ(read_file(settings), "as it was");
 }

@@ -6,7 +6,6 @@
 #include <dirent.h>
 #include <fstream>
 #include <string>
-#include <sys/wait.h>
 #include <thread>
 #include <unistd.h>
 #include <vector>
@@ -289,31 +288,4 @@ TEST(Life, AStopWhileARefreshRunsWaitsForIt)
     asks.join();
     EXPECT_THAT(rig.words(), contains_in_order({"PERF: DataFetch_Handler Thread END", unloaded}));
     EXPECT_EQ(nvrsim_open_handles(), 0u);
-}
-
-// The leak sanitizer cannot stop threads that are still running at exit, and what they hold is no leak.
-static bool exits_with_threads = false;
-extern "C" __attribute__((visibility("default"))) int __lsan_is_turned_off();
-int __lsan_is_turned_off()
-{
-    return exits_with_threads;
-}
-
-// A server ends an idle agent process so, while threads of the module may still run.
-TEST(Life, AnExitWhileARefreshRunsIsClean)
-{
-    Rig rig;
-    add_fault("call = \"RM_GetPortAttributes\", delay_ms = 200");
-    const pid_t child = fork();
-    if (child == 0) {
-        exits_with_threads = true;
-        std::thread([&] { (void)rig.enumerate("NVRHBA_FCPort"); }).detach();
-        while (calls("RM_GetPortAttributes") == 0)
-            std::this_thread::sleep_for(std::chrono::milliseconds(1));
-        std::exit(0);
-    }
-    int status = -1;
-    ASSERT_EQ(waitpid(child, &status, 0), child);
-    EXPECT_TRUE(WIFEXITED(status)) << "ended by signal " << WTERMSIG(status);
-    EXPECT_EQ(WEXITSTATUS(status), 0);
 }

@@ -1,0 +1,48 @@
+#include "agent/settings_at_exit.h"
+
+#include <atomic>
+#include <cstdlib>
+#include <unistd.h>
+
+#include "foundation/CLogger.h"
+#include "foundation/Management_Session.h"
+#include "foundation/NvrConfigFile.h"
+#include "runtime/Mutex.h"
+
+namespace cimple {
+
+namespace {
+
+Mutex mutex(false); // held for moments only
+NvrConfigFile* living = nullptr;
+std::atomic<pid_t> owner{0};
+bool registered = false;
+
+void save()
+{
+    if (owner != ::getpid() || !mutex.lock_soon()) return;
+    if (living) {
+        Management_Session::forgetName();
+        CLogger::instance()->saveSettingsAtExit();
+        living->save();
+    }
+    mutex.unlock();
+}
+
+} // namespace
+
+void saveAtExit(NvrConfigFile& config)
+{
+    const Auto_Mutex lock(mutex);
+    living = &config;
+    owner = ::getpid();
+    if (!registered) registered = std::atexit(save) == 0;
+}
+
+void letGoAtExit()
+{
+    const Auto_Mutex lock(mutex);
+    living = nullptr;
+}
+
+} // namespace cimple

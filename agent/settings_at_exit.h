@@ -1,0 +1,18 @@
+/// What the agent's end leaves on disk, for a process that ends without it.
+///
+/// CIM servers of one kind never balance factories with clean-ups: their processes just exit. The two settings files
+/// are then written and the session's name is taken away all the same. Threads of the module may still run, so that
+/// nothing is destroyed, nothing is waited for without end, and no library is called. A child that a fork made has only
+/// a copy of its parent's agent, and does nothing.
+#pragma once
+
+namespace cimple {
+
+class NvrConfigFile;
+
+/// Once both settings files are read: an exit from now on writes them. `config` stays until letGoAtExit.
+void saveAtExit(NvrConfigFile& config);
+/// Before the agent writes them itself. Waits for an exit that is writing them. May be called in vain.
+void letGoAtExit();
+
+} // namespace cimple
