@@ -52,7 +52,9 @@ TEST_F(Firmware_Command, WritesAFile)
 TEST_F(Firmware_Command, FetchesAnAddress)
 {
     File_Server server("http", served_folder);
-    const Ended_Command ended = run(server.url() + "an.image --yes");
+    // What libcurl's own libraries keep to the end counts as lost when the module has unloaded them.
+    const Ended_Command ended =
+        run(server.url() + "an.image --yes", "small", "ASAN_OPTIONS=\"$ASAN_OPTIONS:detect_leaks=0\"");
     EXPECT_EQ(ended.output, "firmware install, port 10000000C9A00001: done (0)\n");
     EXPECT_EQ(ended.status, 0);
     EXPECT_EQ(server.next_request(), "GET /an.image -");

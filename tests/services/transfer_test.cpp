@@ -79,6 +79,7 @@ protected:
         make_folder(folder);
         make_folder(served);
         EXPECT_EQ(::chdir(folder.c_str()), 0);
+        install_curl(); // so that it is in the process before libraries are counted
         install_no_curl();
         opened.clear();
         open_libraries = 0;

@@ -23,6 +23,9 @@ std::string system_curl()
 
 void install_curl()
 {
+    // What it and its own libraries keep to the end would count as lost if they were unloaded before.
+    static void* const kept = ::dlopen(system_curl().c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (!kept) throw std::runtime_error("the system's libcurl does not open");
     link(system_curl(), place());
 }
 

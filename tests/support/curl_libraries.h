@@ -7,7 +7,7 @@
 
 namespace nvrtest {
 
-/// The system's own.
+/// The system's own. From the first time on it stays in the process, whoever closes it.
 void install_curl();
 /// None: a file of that name that is no library.
 void install_no_curl();
@@ -15,7 +15,7 @@ void install_no_curl();
 /// which stays open; one a process for each entry.
 Curl_Stand_In& install_curl_without(const std::string& entry);
 
-/// The files of these, for tests that put them elsewhere.
+/// The file of the system's own.
 std::string system_curl();
 
 } // namespace nvrtest

@@ -59,7 +59,7 @@ ENTRY void* curl_easy_init()
 {
     if (curl_stand_in.refuses_handle) return nullptr;
     curl_stand_in.handles++;
-    return real<void*()>("curl_easy_init")();
+    return curl_stand_in.handle = real<void*()>("curl_easy_init")();
 }
 
 ENTRY int curl_easy_setopt(void* handle, int option, ...)

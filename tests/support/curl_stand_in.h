@@ -12,13 +12,14 @@ struct Curl_Stand_In {
     int failing_option = 0;     ///< 0: none
     int failing_option_use = 1; ///< which setting of it fails
     int failing_code = 0;
-    int perform_code = 0;       ///< of curl_easy_perform, if not 0; the library is not asked then
-    bool throws = false;        ///< curl_easy_perform
+    int perform_code = 0; ///< of curl_easy_perform, if not 0; the library is not asked then
+    bool throws = false;  ///< curl_easy_perform
 
     // Counted by the stand-in.
     int global_inits = 0, global_cleanups = 0;
     long features = 0;
     int handles = 0, handles_ended = 0;
+    void* handle = nullptr; // the newest
     int performed = 0;
     static constexpr int most_options = 32;
     struct Option {
