@@ -1,12 +1,17 @@
 #include "host/command/Actions.h"
 
+#include "host/command/DriverParams.h"
+
 namespace host {
 namespace {
 
 constexpr char boot_service[] = "NVRHBA_BootBIOSService";
+constexpr char dump_service[] = "NVRHBA_DumpService";
 constexpr char firmware_service[] = "NVRHBA_SoftwareInstallationService";
 constexpr char firmware_service_name[] = "NVRHBA_FCSoftwareInstallationService";
 constexpr char names_service[] = "NVRHBA_FCHBAWWNService";
+constexpr char params_service[] = "NVRHBA_FCHBADriverParamService";
+constexpr char tag_service[] = "NVRHBA_FCTagService";
 
 /// Codes that tell when written names become active; `first` is what 1 means.
 Meanings activation(const std::string& first)
@@ -32,6 +37,11 @@ const Meanings reading = {{0, "read"},
                           {8, "non-volatile, a restart of the adapter activates them"},
                           {9, "there are none"},
                           {65535, "nothing was read"}};
+
+Input global_flag(const std::string& help)
+{
+    return {Input::flag, "--global", "bGlobal", help, {{"yes", "true"}, {"no", "false"}}};
+}
 
 std::vector<Action> make_actions()
 {
@@ -131,6 +141,63 @@ std::vector<Action> make_actions()
     action = {"bootbios", "disable", "Disable the boot code", boot_service, "", "DisableBootBIOS"};
     action.question = "Disable the boot code of port";
     add(action);
+
+    action = {"dump", "generate", "Write a dump of an adapter for its maker", dump_service, "", "GenerateDump"};
+    action.question = "The oldest dump goes where more are kept than shall be. Write a dump of port";
+    action.doing = "writing the dump";
+    add(action);
+
+    action = {"dump", "list", "Show the names of the dumps", dump_service, "", "GetDumpFileNames"};
+    add(action);
+
+    action = {"dump", "delete", "Delete the dumps", dump_service, "", "DeleteDump"};
+    action.question = "Delete all dumps of port";
+    add(action);
+
+    action = {"param", "list", "Show the driver's parameters", params_service};
+    action.inputs = {global_flag("Those of all ports")};
+    action.own = list_driver_params;
+    add(action);
+
+    action = {"param", "set", "Set a parameter of the driver", params_service, "", "SetDriverParameter"};
+    action.inputs = {{Input::text, "name", "strParam", "The parameter's name"},
+                     {Input::text, "value", "strValue", "Its new value"},
+                     global_flag("For all ports"),
+                     {Input::flag,
+                      "--permanent",
+                      "bPermanent",
+                      "Also for the driver's next starts",
+                      {{"yes", "true"}, {"no", "false"}}}};
+    action.question = "Set a parameter of the driver for port";
+    action.meanings = {{40001, "the port is not local, or name and value are too long, or the library does not have "
+                               "the call"},
+                       {40004, "there is no such parameter, or the value is outside its limits"}};
+    add(action);
+
+    action = {"tag", "get", "Show whether frames are tagged", tag_service, "", "GetGlobalFlag"};
+    action.out_meanings = {{"State", {{0, "off"}, {1, "on"}}}};
+    add(action);
+
+    action = {"tag", "set", "Switch the tagging of frames", tag_service, "", "SetGlobalFlag"};
+    action.inputs = {{Input::choice, "state", "State", "on or off", {{"on", "1"}, {"off", "0"}}}};
+    action.question = "Switch the tagging of frames of the adapter of port";
+    add(action);
+
+    action = {"tag",       "save", "Write the tag table to a file in the port's dump directory",
+              tag_service, "",     "GetConfigTable"};
+    action.inputs = {{Input::text, "name", "URI", "The file's bare name"}};
+    action.meanings = {{0, "done, unless the log tells otherwise"},
+                       {32968, "the adapter cannot be opened, or the file's path is too long"}};
+    add(action);
+
+    action = {"tag", "load", "Load the tag table from a file", tag_service, "", "SetConfigTable"};
+    action.inputs = {{Input::text, "file", "URI", "A file of this host, or where to fetch it from"}};
+    action.question = "Replace the tag table of the adapter of port";
+    action.doing = "loading the table";
+    action.meanings = {{1, "the adapter refused the table"},
+                       {32968, "the adapter or the file cannot be opened, or the file is no whole tag table"},
+                       {32774, "memory ran out, or the file has more entries than an adapter can have"}};
+    add(action);
     return all;
 }
 
@@ -149,6 +216,9 @@ const std::vector<std::pair<std::string, std::string>>& action_groups()
         {"wwn", "Show and change the World Wide Names of a port"},
         {"firmware", "Write firmware to the adapter of a port"},
         {"bootbios", "Show and switch the boot code of an adapter"},
+        {"dump", "Write, list and delete dumps of an adapter"},
+        {"param", "Show and set the parameters of the driver"},
+        {"tag", "Switch the tagging of frames, save and load the tag table"},
     };
     return groups;
 }
