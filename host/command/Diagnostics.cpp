@@ -115,8 +115,8 @@ int Diagnostics::list()
         for (const Instance& setting : settings) {
             if (setting.get("InstanceID").as_text() != name) continue;
             loops = first_text(setting.get("LoopControlParameter"));
-            if (!setting.get("BufferSizes").is_null()) options = "--loops --pattern --size --halt-on-error";
-            if (!setting.get("TargetDevice").is_null()) options += " --target";
+            if (!setting.get("BufferSizes").is_null()) options = "loops pattern size halt";
+            if (!setting.get("TargetDevice").is_null()) options += " target";
         }
         for (const Instance& service : services)
             if (service.get("Name").as_text() == name) help = first_text(service.get("DocumentDescriptions"));
