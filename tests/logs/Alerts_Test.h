@@ -46,9 +46,10 @@ private:
     {
         auto& client = *static_cast<Client*>(data);
         if (!instance) return client.stops++, false;
+        Ref<cimple::NVRHBA_AlertIndication> alert(static_cast<cimple::NVRHBA_AlertIndication*>(instance));
         if (client.during) client.during();
         std::lock_guard<std::mutex> lock(client.m_mutex);
-        client.m_alerts.emplace_back(static_cast<cimple::NVRHBA_AlertIndication*>(instance));
+        client.m_alerts.push_back(std::move(alert));
         client.m_came.notify_all();
         return true;
     }
