@@ -1,5 +1,6 @@
 #include "host/command/Check.h"
 
+#include "host/command/Listing.h"
 #include "host/command/Table.h"
 #include "host/command/Views.h"
 #include "host/command/Walk.h"
@@ -197,13 +198,21 @@ private:
     std::vector<std::string> m_faults;
 };
 
-std::string class_table(const std::vector<Counts>& counts)
+Listing class_listing(const std::vector<Counts>& counts)
 {
-    Table table({"ASSOCIATION", "INSTANCES", "ENDS FOUND", "OF OTHERS", "LOOSE", "FAULTS"});
-    for (const Counts& each : counts)
-        table.add({each.class_name, std::to_string(each.instances), std::to_string(each.found),
-                   std::to_string(each.foreign), std::to_string(each.loose), std::to_string(each.faults)});
-    return table.to_text(page_width);
+    Listing listing({{"association", "ASSOCIATION"},
+                     {"instances", "INSTANCES"},
+                     {"endsFound", "ENDS FOUND"},
+                     {"endsOfOthers", "OF OTHERS"},
+                     {"endsLooseByDesign", "LOOSE"},
+                     {"faults", "FAULTS"}});
+    for (const Counts& each : counts) {
+        std::vector<Listing::Cell> row = {each.class_name};
+        for (std::size_t number : {each.instances, each.found, each.foreign, each.loose, each.faults})
+            row.emplace_back(std::to_string(number), Value::uint64(number));
+        listing.add(std::move(row));
+    }
+    return listing;
 }
 
 Json to_json(const Counts& counts)
@@ -222,7 +231,7 @@ std::string counted(std::size_t count, const char* one, const char* many)
 
 } // namespace
 
-int check_associations(Host& server, const Options& options, std::ostream& out, std::ostream&)
+int check_associations(Host& server, const Options& options, std::ostream& out, std::ostream& complaints)
 {
     Checker checker(server);
     checker.run();
@@ -243,7 +252,13 @@ int check_associations(Host& server, const Options& options, std::ostream& out, 
         out << json_text({{"status", status}, {"sum", to_json(sum)}, {"classes", classes}, {"faults", faults}});
         return status;
     }
-    if (options.all) out << class_table(counts) << "\n";
+    if (options.csv) {
+        out << class_listing(counts).csv();
+        for (const std::string& fault : checker.faults())
+            complaints << printable(fault) << "\n";
+        return status;
+    }
+    if (options.all) out << class_listing(counts).table(page_width) << "\n";
     for (const std::string& fault : checker.faults())
         out << printable(fault) << "\n";
     out << counted(counts.size(), "association class", "association classes") << ", " << filled << " with instances; "

@@ -56,7 +56,7 @@ Names options_of(const CLI::App& app, bool valued)
 {
     Names names;
     for (const CLI::Option* option : app.get_options()) {
-        if (valued && option->get_type_size() == 0) continue;
+        if (valued && option->get_items_expected_max() == 0) continue;
         for (const std::string& name : option->get_snames())
             names.push_back("-" + name);
         for (const std::string& name : option->get_lnames())
@@ -98,7 +98,7 @@ private:
             m_valued.insert(name);
         if (!path.empty())
             for (const std::string& name : options_of(app, false))
-                words.push_back(name);
+                if ((" " + m_common + " ").find(" " + name + " ") == std::string::npos) words.push_back(name);
         m_branches += "    " + (path.empty() ? "''" : path + " | " + path + "\\ *") + ")\n";
         m_branches += "        words='" + joined(words, " ") + " " + m_common + "'\n";
         const CLI::Option* object = app.get_option_no_throw("class");

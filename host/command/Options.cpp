@@ -2,14 +2,21 @@
 
 #include "host/Manner.h"
 #include "host/command/Actions.h"
+#include "host/command/Completion.h"
 #include "host/command/Logs.h"
 
 #include <CLI/CLI.hpp>
 
+#include <algorithm>
 #include <iostream>
+#include <iterator>
 
 namespace host {
 namespace {
+
+/// Verbs whose answers are rows.
+const std::string with_table[] = {"associators", "check", "classes", "enum",      "get",
+                                  "names",       "paths", "ports",   "references"};
 
 constexpr const char* description =
     "nvrcim asks the Fibre Channel provider module as a CIM server would: it loads the module, calls it through CMPI,\n"
@@ -29,6 +36,8 @@ constexpr const char* footer =
     "  nvrcim set 'NVRHBA_ProviderConfigSetting.InstanceID=\"Norvane HBA Provider:cachetimeout\"' current=20\n"
     "  nvrcim associators 'NVRHBA_PhysicalPackage.Tag=\"...\",CreationClassName=\"NVRHBA_PhysicalPackage\"' --names\n"
     "  nvrcim --scenario typical.toml tree\n"
+    "  nvrcim --scenario typical.toml paths --csv\n"
+    "  nvrcim ports --json\n"
     "  nvrcim --manner pegasus --server-log - names NVRHBA_Product\n"
     "  nvrcim port beacon on --port 10:00:00:00:c9:a0:00:01\n"
     "  nvrcim wwn change 10000000C9A0F001 20000000C9A0F001 --type volatile --yes\n"
@@ -137,7 +146,8 @@ int read_options(int count, char** arguments, Options& options)
     app.add_option("--module", options.module, "The provider module to load");
     app.add_option("--mof", options.mof, "Folder with the class files");
     app.add_option("--user", options.user, "Name of the user that the requests come from");
-    app.add_flag("--json", options.json, "Print JSON");
+    CLI::Option* json = app.add_flag("--json", options.json, "Print JSON");
+    app.add_flag("--csv", options.csv, "Print tables and lists as comma-separated values")->excludes(json);
 
     CLI::App* classes = app.add_subcommand("classes", "List the classes that the module serves");
     classes->add_option("pattern", options.object, "Only classes with this in their name");
@@ -182,6 +192,10 @@ int read_options(int count, char** arguments, Options& options)
 
     app.add_subcommand("tree", "Show the host with its adapters, ports, targets and logical units");
 
+    app.add_subcommand("paths", "Show the whole route of each logical unit in one row");
+    app.add_subcommand("ports", "Show each port with its speeds, firmware, driver and error counters");
+    CLI::App* completion = app.add_subcommand("completion", "Print what makes bash complete this command");
+
     CLI::App* graph = app.add_subcommand("graph", "Draw the tree as a picture (needs Graphviz)");
     graph
         ->add_option("file", options.file, "Where to: a name that ends in .svg or .png, or in .dot for the plain graph")
@@ -207,7 +221,17 @@ int read_options(int count, char** arguments, Options& options)
         std::cerr << "nvrcim: wrong command: " << error.what() << "\nTry nvrcim --help.\n";
         return usage_error;
     }
-    options.verb = app.get_subcommands().front()->get_name();
+    const CLI::App* verb = app.get_subcommands().front();
+    options.verb = verb->get_name();
+    if (verb == completion) {
+        std::cout << bash_completion(app);
+        return 0;
+    }
+    const bool has_table = std::count(std::begin(with_table), std::end(with_table), options.verb) != 0;
+    if (options.csv && !has_table) {
+        std::cerr << "nvrcim: wrong command: " << options.verb << " prints no table that --csv could show\n";
+        return usage_error;
+    }
     return -1;
 }
 

@@ -28,6 +28,7 @@ struct Options {
     std::uint16_t tcp_port = 5988;                                  ///< of `serve`; 0 for any free one
     bool all = false;
     bool json = false;
+    bool csv = false;
 
     const Action* action = nullptr;           ///< one of Actions.h instead of a verb
     std::map<std::string, std::string> given; ///< its inputs by their labels, as far as they were given

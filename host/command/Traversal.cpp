@@ -35,8 +35,11 @@ void print_json(const Answer& answer, bool names_only, std::ostream& out)
 
 void print_text(const Answer& answer, const Options& options, const Schema& schema, std::ostream& out)
 {
-    for (const Path& path : answer.paths)
-        out << printable(path.to_text()) << "\n";
+    if (options.csv && !options.names_only) {
+        out << instance_listing(answer.instances, schema, options.properties, options.all).csv();
+        return;
+    }
+    out << path_lines(answer.paths, options);
     if (!options.all) {
         out << instance_table(answer.instances, schema, options.properties);
         return;
@@ -61,7 +64,7 @@ int traverse(Host& server, const Path& path, const Options& options, std::ostrea
     print_text(answer, options, server.schema(), out);
     // What came before a failure is shown, and then the failure.
     if (!answer.ok()) return tell_failure(answer.status, options, out, complaints);
-    if (answer.instances.empty() && answer.paths.empty())
+    if (answer.instances.empty() && answer.paths.empty() && !options.csv)
         out << (options.verb == "references" ? "no association holds it\n" : "no association ties anything to it\n");
     return 0;
 }

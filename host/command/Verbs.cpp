@@ -6,7 +6,10 @@
 #include "host/command/Check.h"
 #include "host/command/Diagnostics.h"
 #include "host/command/Graph.h"
+#include "host/command/Listing.h"
 #include "host/command/Logs.h"
+#include "host/command/Paths.h"
+#include "host/command/Ports.h"
 #include "host/command/Serve.h"
 #include "host/command/Table.h"
 #include "host/command/Traversal.h"
@@ -38,6 +41,8 @@ public:
         if (m_options.verb == "tree") return show_tree(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "graph") return draw_graph(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "serve") return serve(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "paths") return show_paths(m_server, m_options, m_out, m_complaints);
+        if (m_options.verb == "ports") return show_ports(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "check") return check_associations(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "log") return run_log(m_server, m_options, m_out, m_complaints);
         if (m_options.verb == "driverlog") return show_driver_log(m_server, m_options, m_out, m_complaints);
@@ -113,7 +118,8 @@ int Run::classes()
 {
     const std::string pattern = lower_case(m_options.object);
     const std::vector<Registration> served = m_server.registrations();
-    Table table({"CLASS", "SUPERCLASS", "SERVED AS", "NAMESPACES"});
+    Listing listing(
+        {{"class", "CLASS"}, {"superclass", "SUPERCLASS"}, {"kinds", "SERVED AS"}, {"namespaces", "NAMESPACES"}});
     Json json = Json::array();
     for (const Class_Record* record : m_server.schema().classes()) {
         if (lower_case(record->name).find(pattern) == std::string::npos) continue;
@@ -130,15 +136,17 @@ int Run::classes()
             }
         }
         const std::string super = record->super ? record->super->name : "";
-        table.add({record->name, super, kinds, spaces});
+        listing.add({record->name, super, kinds, spaces});
         json.push_back({{"class", record->name}, {"superclass", super}, {"kinds", kinds}, {"namespaces", space_list}});
     }
     if (m_options.json)
         m_out << json_text({{"status", 0}, {"classes", json}});
-    else if (table.empty())
+    else if (m_options.csv)
+        m_out << listing.csv();
+    else if (listing.empty())
         m_out << "no class has " << quote(m_options.object) << " in its name\n";
     else
-        m_out << table.to_text(page_width);
+        m_out << listing.table(page_width);
     return 0;
 }
 
@@ -153,6 +161,10 @@ int Run::enumerate()
             instances.push_back(to_json(instance));
         m_out << json_text({{"status", 0}, {"instances", instances}});
         return 0;
+    }
+    if (m_options.csv) {
+        m_out << instance_listing(answer.instances, m_server.schema(), m_options.properties, m_options.all).csv();
+        return answer.ok() ? 0 : failed(answer.status);
     }
     if (m_options.all) {
         const char* between = "";
@@ -180,10 +192,10 @@ int Run::names()
         m_out << json_text({{"status", 0}, {"paths", paths}});
         return 0;
     }
-    for (const Path& path : answer.paths)
-        m_out << printable(path.to_text()) << "\n";
+    m_out << path_lines(answer.paths, m_options);
     if (!answer.ok()) return failed(answer.status);
-    if (answer.paths.empty()) m_out << "no instances of " << m_class->name << " in " << m_path.name_space << "\n";
+    if (answer.paths.empty() && !m_options.csv)
+        m_out << "no instances of " << m_class->name << " in " << m_path.name_space << "\n";
     return 0;
 }
 
@@ -206,6 +218,8 @@ int Run::get()
     const Instance& instance = answer.instances.front();
     if (m_options.json)
         m_out << json_text({{"status", 0}, {"instance", to_json(instance)}});
+    else if (m_options.csv)
+        m_out << instance_listing({instance}, m_server.schema(), m_options.properties, true).csv();
     else
         m_out << property_list(instance, m_server.schema(), m_options.all);
     return 0;
@@ -296,6 +310,19 @@ std::string complaint(const Status& status)
     default:
         return "nvrcim: the provider answers " + name + tail;
     }
+}
+
+std::string path_lines(const std::vector<Path>& paths, const Options& options)
+{
+    Listing listing(std::vector<Listing::Field>{{"path", ""}});
+    std::string text;
+    for (const Path& path : paths) {
+        if (options.csv)
+            listing.add({path.to_text()});
+        else
+            text += printable(path.to_text()) + "\n";
+    }
+    return options.csv ? listing.csv() : text;
 }
 
 int tell_wrong(const std::string& text, std::ostream& complaints)

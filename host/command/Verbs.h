@@ -15,6 +15,9 @@ int run_verb(Host& server, const Options& options, std::ostream& out, std::ostre
 /// "nvrcim: the provider answered CMPI_RC_ERR_NOT_FOUND (6): ..." and so on.
 std::string complaint(const Status& status);
 
+/// Object paths, one a line; with --csv under a header.
+std::string path_lines(const std::vector<Path>& paths, const Options& options);
+
 // For the verbs, the two ways to end without success; each gives the exit status.
 
 /// The command cannot be understood.

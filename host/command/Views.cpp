@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <set>
 
 namespace host {
 namespace {
@@ -172,6 +173,15 @@ std::vector<std::string> wrapped(const std::string& text, std::size_t width)
     return lines;
 }
 
+/// Every property that one of the instances has, in the order in which they come.
+void add_all_properties(std::vector<Listing::Field>& fields, const std::vector<Instance>& instances)
+{
+    std::set<std::string> known;
+    for (const Instance& instance : instances)
+        for (const Named_Value& property : instance.properties)
+            if (known.insert(lower_case(property.name)).second) fields.push_back({property.name, property.name});
+}
+
 } // namespace
 
 std::string value_text(const Element_Record* property, const Value& value)
@@ -197,44 +207,53 @@ std::string value_text_with_number(const Element_Record* property, const Value& 
     return word.empty() ? value.to_text() : value.to_text() + " (" + word + ")";
 }
 
-std::string instance_table(const std::vector<Instance>& instances, const Schema& schema,
-                           const std::vector<std::string>& columns)
+Listing instance_listing(const std::vector<Instance>& instances, const Schema& schema,
+                         const std::vector<std::string>& columns, bool all)
 {
-    if (instances.empty()) return "";
+    if (instances.empty()) return Listing({});
     const Class_Record* record = schema.find(instances.front().path.class_name);
     bool mixed = std::any_of(instances.begin(), instances.end(), [&](const Instance& instance) {
         return !same_name(instance.path.class_name, instances.front().path.class_name);
     });
-    std::vector<Column> shown;
+    std::vector<Listing::Field> fields;
+    if (mixed) fields = {{"class", "CLASS"}, {"object", "OBJECT"}};
+    const std::size_t first = fields.size();
     if (!columns.empty())
         for (const std::string& name : columns)
-            shown.push_back({name.c_str(), name.c_str()});
+            fields.push_back({name, name});
+    else if (all)
+        add_all_properties(fields, instances);
     else if (mixed)
-        shown = {{"ElementName", "ElementName"}, {"Name", "Name"}, {"Description", "Description"}};
+        for (const char* name : {"ElementName", "Name", "Description"})
+            fields.push_back({name, name});
     else if (record)
-        shown = columns_for(*record);
+        for (const Column& column : columns_for(*record))
+            fields.push_back({column.property, column.header});
 
-    std::vector<std::string> headers;
-    if (mixed) headers = {"CLASS", "OBJECT"};
-    for (const Column& column : shown)
-        headers.push_back(column.header);
-    Table table(headers);
+    Listing listing(fields);
     for (const Instance& instance : instances) {
         const Class_Record* own = schema.find(instance.path.class_name);
-        std::vector<std::string> cells;
+        std::vector<Listing::Cell> cells;
         if (mixed) {
             std::string path = short_path(instance.path);
             std::size_t blank = path.find(' ');
             cells = {instance.path.class_name, blank == std::string::npos ? "" : path.substr(blank + 1)};
         }
-        for (const Column& column : shown) {
-            const Value* value = instance.find(column.property);
-            if (!value) value = instance.path.find(column.property);
-            cells.push_back(value ? value_text(own ? own->property(column.property) : nullptr, *value) : "");
+        for (std::size_t i = first; i < fields.size(); ++i) {
+            const Value* value = instance.find(fields[i].key);
+            if (!value) value = instance.path.find(fields[i].key);
+            const Value plain = value ? *value : Value();
+            cells.emplace_back(value_text(own ? own->property(fields[i].key) : nullptr, plain), plain);
         }
-        table.add(std::move(cells));
+        listing.add(std::move(cells));
     }
-    return table.to_text(page_width);
+    return listing;
+}
+
+std::string instance_table(const std::vector<Instance>& instances, const Schema& schema,
+                           const std::vector<std::string>& columns)
+{
+    return instance_listing(instances, schema, columns, false).table(page_width);
 }
 
 std::string property_list(const Instance& instance, const Schema& schema, bool nulls)

@@ -6,6 +6,7 @@
 
 #include "host/Host.h"
 #include "host/Schema.h"
+#include "host/command/Listing.h"
 
 #include <nlohmann/json_fwd.hpp>
 
@@ -22,7 +23,11 @@ std::string value_text(const Element_Record* property, const Value& value);
 /// The same with the number beside its word: "2 (OK)".
 std::string value_text_with_number(const Element_Record* property, const Value& value);
 
-/// One line an instance: known classes by their own columns, others by their keys and names. `columns` overrides.
+/// A row an instance: known classes by their own columns, others by their keys and names. `columns` overrides; without
+/// them, `all` takes every property.
+Listing instance_listing(const std::vector<Instance>& instances, const Schema& schema,
+                         const std::vector<std::string>& columns, bool all);
+/// The same as a table that fits the page.
 std::string instance_table(const std::vector<Instance>& instances, const Schema& schema,
                            const std::vector<std::string>& columns);
 /// Every property, one a line, the values aligned and wrapped; null ones only if `nulls`.

@@ -92,19 +92,12 @@ private:
             if (found == ends.end()) continue;
             const std::string& text = endpoint->second.get("Name").as_text();
             port.targets[place->second].units.push_back(
-                {number(text.substr(text.rfind(':') + 1)), device(endpoint->second), found->second});
+                {number(text.substr(text.rfind(':') + 1)), device_name(endpoint->second), found->second});
         }
         for (Target_Node& target : port.targets)
             std::stable_sort(target.units.begin(), target.units.end(), [](const Unit_Node& a, const Unit_Node& b) {
                 return std::pair(a.number.size(), a.number) < std::pair(b.number.size(), b.number);
             });
-    }
-
-    /// Each route to a unit has an endpoint of its own, which has the name of the unit's device and no other.
-    static std::string device(const Instance& endpoint)
-    {
-        const std::vector<Value>& names = endpoint.get("OtherIdentifyingInfo").elements();
-        return names.empty() ? "" : names.front().as_text();
     }
 
     /// The number that people know for eight bytes of FCP addressing, if it is of the peripheral or the flat kind.
@@ -129,25 +122,6 @@ std::string text_of(const Instance& instance, const Schema& schema, const char* 
     return value.is_null() ? "" : value_text(record ? record->property(property) : nullptr, value);
 }
 
-/// A size in the binary unit that keeps it readable: "8 GiB", "1.5 TiB".
-std::string size_text(const Value& bytes)
-{
-    if (bytes.is_null()) return "";
-    constexpr const char* names[] = {"B", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"};
-    double size = static_cast<double>(bytes.as_uint());
-    std::size_t unit = 0;
-    // By the rounded value: what would read "1024 MiB" is "1 GiB".
-    while (size >= 1023.95 && unit + 1 < std::size(names)) {
-        size /= 1024;
-        ++unit;
-    }
-    char text[32];
-    std::snprintf(text, sizeof text, "%.1f", size);
-    std::string number = text;
-    if (number.size() > 2 && number.compare(number.size() - 2, 2, ".0") == 0) number.resize(number.size() - 2);
-    return number + " " + names[unit];
-}
-
 /// "port 0" from "port" and a value; nothing without a value.
 std::string named(const char* name, const std::string& value)
 {
@@ -165,6 +139,30 @@ std::vector<std::string> without_empty(std::vector<std::string> parts)
 Walk walk_hosts(Host& server, const std::string& name_space)
 {
     return Walker(server, name_space).go();
+}
+
+std::string device_name(const Instance& endpoint)
+{
+    const std::vector<Value>& names = endpoint.get("OtherIdentifyingInfo").elements();
+    return names.empty() ? "" : names.front().as_text();
+}
+
+std::string size_text(const Value& bytes)
+{
+    if (bytes.is_null()) return "";
+    constexpr const char* names[] = {"B", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"};
+    double size = static_cast<double>(bytes.as_uint());
+    std::size_t unit = 0;
+    // By the rounded value: what would read "1024 MiB" is "1 GiB".
+    while (size >= 1023.95 && unit + 1 < std::size(names)) {
+        size /= 1024;
+        ++unit;
+    }
+    char text[32];
+    std::snprintf(text, sizeof text, "%.1f", size);
+    std::string number = text;
+    if (number.size() > 2 && number.compare(number.size() - 2, 2, ".0") == 0) number.resize(number.size() - 2);
+    return number + " " + names[unit];
 }
 
 std::string identity(const Path& path)

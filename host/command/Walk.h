@@ -54,6 +54,13 @@ Walk walk_hosts(Host& server, const std::string& name_space);
 /// The same text for paths that mean the same object, whatever their namespace or the order of their keys.
 std::string identity(const Path& path);
 
+/// What the operating system calls the unit behind an endpoint. Each route to a unit has an endpoint of its own, which
+/// has the name of the unit's device and no other. May be empty.
+std::string device_name(const Instance& endpoint);
+
+/// A size in the binary unit that keeps it readable: "8 GiB", "1.5 TiB". Null gives an empty text.
+std::string size_text(const Value& bytes);
+
 // What tree and picture tell of a node, in short parts for one line each; empty parts are left out.
 
 std::vector<std::string> facts(const Adapter_Node& adapter);

@@ -137,3 +137,105 @@ TEST(Command, SaysThatGraphvizIsMissing)
               "nvrcim: Graphviz is not there: its program dot is not in PATH. Install the package graphviz, or "
               "name a file that ends in .dot for the plain graph\n");
 }
+
+TEST(Command, ShowsTheRouteOfEachUnitInOneRow)
+{
+    const Ended_Command run = nvrcim("paths");
+    EXPECT_EQ(run.status, 0);
+    EXPECT_EQ(run.output,
+              "DEVICE    BUS:TARGET:LUN  LOCAL WWPN        LOCAL WWNN        FABRIC            TARGET WWPN       "
+              "LUN IDENTIFIER                    VENDOR   PRODUCT       SIZE\n"
+              "/dev/sda  0:0:0           10000000C9A00001  20000000C9A00001  1000000533A00001  50060E8005A10000  "
+              "600C9A0F05A1FF000000000000000000  NORVANE  VIRTUAL-DISK  8 GiB\n"
+              "/dev/sdb  0:0:1           10000000C9A00001  20000000C9A00001  1000000533A00001  50060E8005A10000  "
+              "600C9A0F05A1FF000000000000000001  NORVANE  VIRTUAL-DISK  16 GiB\n"
+              "/dev/sdc  0:0:2           10000000C9A00001  20000000C9A00001  1000000533A00001  50060E8005A10000  "
+              "600C9A0F05A1FF000000000000000002  NORVANE  VIRTUAL-DISK  24 GiB\n"
+              "/dev/st3  0:1:0           10000000C9A00001  20000000C9A00001  1000000533A00001  50060E8005A10001  "
+              "600C9A0F05A1FF010000000000000000  NORVANE  VIRTUAL-TAPE\n");
+}
+
+TEST(Command, HasSizesInBytesAndMissingOnesEmptyInCsv)
+{
+    const std::string rows = nvrcim("paths --csv").output;
+    EXPECT_THAT(rows, testing::StartsWith("device,address,localWWPN,localWWNN,fabric,targetWWPN,identifier,vendor,"
+                                          "product,size\r\n/dev/sda,0:0:0,10000000C9A00001,20000000C9A00001,"));
+    EXPECT_THAT(rows, HasSubstr(",VIRTUAL-DISK,8589934080\r\n"));
+    EXPECT_THAT(rows, testing::EndsWith(",VIRTUAL-TAPE,\r\n"));
+    EXPECT_THAT(nvrcim("paths --json").output, HasSubstr("\"product\": \"VIRTUAL-TAPE\",\n      \"size\": null\n"));
+}
+
+TEST(Command, ShowsAPortLikeAnFcHost)
+{
+    const std::string port = nvrcim("ports").output;
+    EXPECT_THAT(port, testing::StartsWith("Device                host0\n"
+                                          "Node name             20000000C9A00001\n"
+                                          "Port name             10000000C9A00001\n"
+                                          "Port ID               0x010100\n"));
+    EXPECT_THAT(port, HasSubstr("\nState                 OK\n"
+                                "Speed                 16 Gbit/s\n"
+                                "Supported speeds      up to 16 Gbit/s\n"));
+    EXPECT_THAT(port, HasSubstr("\nFirmware              2.01a4\nDriver                nvrfc v8.3.7.18\n"));
+    EXPECT_THAT(port, testing::EndsWith("\nCRC errors            9\n"));
+}
+
+TEST(Command, AsksForEachClassOnceWhateverTheNumberOfRoutes)
+{
+    const auto requests = [](const std::string& scenario) {
+        const std::string log = nvrcim("--server-log - paths", scenario).output;
+        std::size_t count = 0;
+        for (std::size_t at = log.find(" enumerateInstances "); at != std::string::npos;
+             at = log.find(" enumerateInstances ", at + 1))
+            count++;
+        return count;
+    };
+    EXPECT_EQ(requests("small"), 17u); // two of them are the module's own
+    EXPECT_EQ(requests("typical"), 17u);
+}
+
+TEST(Command, SaysWhichCountersAreNotReported)
+{
+    const std::string scenario = testing::TempDir() + "norvane_counters.toml";
+    write_file(scenario, "[[adapter]]\n[[adapter.port]]\nstatistics = { 1030 = -1, 1037 = -1, 1040 = false }\n");
+    const std::string table = nvrcim("ports", scenario).output;
+    EXPECT_THAT(table, HasSubstr("\nFrames sent           not reported\n"));
+    EXPECT_THAT(table, HasSubstr("\nLosses of sync        5\n"));
+    EXPECT_THAT(table, testing::Not(HasSubstr("4294967295")));
+    EXPECT_THAT(nvrcim("ports --json", scenario).output, HasSubstr("\"txFrames\": null,\n"));
+    remove(scenario);
+}
+
+TEST(Command, PrintsRowsAsCsvWhereverThereAreRows)
+{
+    EXPECT_EQ(nvrcim("enum NVRHBA_FCPort --csv -p DeviceID,Speed,SupportedFC4Types").output,
+              "DeviceID,Speed,SupportedFC4Types\r\n10000000C9A00001,16000000000,\"{8, 32}\"\r\n");
+    EXPECT_THAT(nvrcim("--csv names NVRHBA_Product").output,
+                testing::StartsWith("path\r\n\"root/norvane:NVRHBA_Product.Name=\"\"FC2162\"\","));
+    EXPECT_EQ(nvrcim("--csv classes FCPortStat").output,
+              "class,superclass,kinds,namespaces\r\n"
+              "NVRHBA_FCPortStatistics,CIM_FCPortStatistics,instance method,root/norvane\r\n");
+    EXPECT_THAT(nvrcim("--csv check").output, HasSubstr("\r\nNVRHBA_ControlledBy,1,2,0,0,0\r\n"));
+    EXPECT_EQ(nvrcim("tree --csv").status, 64);
+    EXPECT_EQ(nvrcim("paths --csv --json").status, 64);
+}
+
+TEST(Command, CompletesVerbsOptionsAndClasses)
+{
+    const std::string script = testing::TempDir() + "norvane_completion";
+    ASSERT_EQ(nvrcim("completion > " + script).output, "");
+    const auto completed = [&](const std::string& words) {
+        const std::string command = "bash -c '. " + script + "; COMP_WORDS=(" NVR_NVRCIM " " + words +
+                                    "); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _nvrcim; echo \"${COMPREPLY[*]}\"'";
+        FILE* shell = popen(command.c_str(), "r");
+        char buffer[4096];
+        const std::size_t size = fread(buffer, 1, sizeof buffer, shell);
+        pclose(shell);
+        return std::string(buffer, size);
+    };
+    EXPECT_EQ(completed("po"), "ports port\n");
+    EXPECT_EQ(completed("port be"), "beacon\n");
+    EXPECT_EQ(completed("--json --manner s"), "strict sfcb sfcb-1.3.7\n");
+    EXPECT_EQ(completed("--manner sfcb wwn read --ty"), "--type\n");
+    EXPECT_EQ(completed("enum NVRHBA_FCPortStat"), "NVRHBA_FCPortStatistics\n");
+    std::remove(script.c_str());
+}

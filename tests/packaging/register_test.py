@@ -3,6 +3,7 @@
 import json
 import os
 import pathlib
+import re
 import shutil
 import subprocess
 import sys
@@ -192,6 +193,33 @@ class Register(unittest.TestCase):
         self.assertEqual(back.returncode, 0, back.stderr)
         self.assertEqual(self.server(), {"stage": [], "modules": [], "classes": []})
         self.assertFalse(self.has_state())
+
+    def block_of(self, heading):
+        """Runs the first block of shell code under a heading of the installation's page, with the stand-ins."""
+        page = (pathlib.Path(__file__).parents[2] / "docs/install.md").read_text(encoding="utf-8")
+        section = page[page.index(f"\n## {heading}\n"):]
+        block = re.search(r"^```sh\n(.*?)^```", section, re.M | re.S).group(1)
+        script = block.replace("data=/usr/share/norvane-fc-provider", f"data={self.data}")
+        done = subprocess.run(["sh", "-e", "-c", script], capture_output=True, text=True, check=False,
+                              env={"WORLD": str(self.world), "PATH": f"{self.world}/bin:/usr/bin:/bin"})
+        self.assertEqual(done.returncode, 0, done.stderr)
+        return self.calls()
+
+    def test_the_page_shows_for_sfcb_what_the_command_does(self):
+        self.install(*SFCB, "systemctl")
+        by_hand = self.block_of("sfcb by hand")
+        self.assertEqual(by_hand.pop(), "systemctl restart sblim-sfcb")
+        (self.world / "server.json").unlink()
+        self.assertEqual(self.run_tool("register").returncode, 0)
+        self.assertEqual(by_hand, self.calls())
+
+    def test_the_page_shows_for_pegasus_what_the_command_does(self):
+        self.install(*PEGASUS)
+        by_hand = self.block_of("OpenPegasus by hand")
+        self.assertEqual(by_hand.pop(), "cimprovider -l")
+        (self.world / "server.json").unlink()
+        self.assertEqual(self.run_tool("register").returncode, 0)
+        self.assertEqual(by_hand, [call for call in self.calls() if call.startswith("cimmof")])
 
     def test_classes_that_pegasus_had_before_stay(self):
         self.install(*PEGASUS)

@@ -8,8 +8,10 @@ namespace nvrtest {
 
 Ended_Command nvrcim(const std::string& arguments, const std::string& scenario, const std::string& environment)
 {
+    const std::string file =
+        scenario[0] == '/' ? scenario : std::string(NVRSIM_BUILD) + "/scenarios/" + scenario + ".toml";
     const std::string command = environment + " '" + NVR_NVRCIM + "' --module '" + NVR_MODULE + "' --scenario '" +
-                                NVRSIM_BUILD + "/scenarios/" + scenario + ".toml' " + arguments + " 2>&1";
+                                file + "' " + arguments + " 2>&1";
     FILE* child = popen(command.c_str(), "r");
     if (!child) throw std::runtime_error("cannot start a shell");
     Ended_Command run;
