@@ -7,6 +7,14 @@ function(norvane_room name)
   target_link_libraries(nvr_${name} PUBLIC ${ROOM_LINK} Threads::Threads)
 endfunction()
 
+# norvane_test_headers(): GoogleTest's headers, compiled once for all tests: they are a third of each test's compile time.
+function(norvane_test_headers)
+  file(CONFIGURE OUTPUT test_headers.cpp CONTENT "int main() {}\n")
+  add_executable(norvane_test_headers ${CMAKE_CURRENT_BINARY_DIR}/test_headers.cpp)
+  target_link_libraries(norvane_test_headers PRIVATE GTest::gmock Threads::Threads)
+  target_precompile_headers(norvane_test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
+endfunction()
+
 # norvane_test(NAME SOURCES... [LINK libs...] [TIMEOUT s]): a GoogleTest program; each test runs in a process of its own,
 # since much of what is tested lives once a process. Under a sanitizer it may take five times as long.
 function(norvane_test name)
@@ -19,6 +27,9 @@ function(norvane_test name)
   endif()
   add_executable(${name} ${TEST_SOURCES})
   target_link_libraries(${name} PRIVATE ${TEST_LINK} GTest::gmock)
+  if(NOT TEST_SOURCES MATCHES "\\.c(;|$)") # the headers are compiled for C++ alone
+    target_precompile_headers(${name} REUSE_FROM norvane_test_headers)
+  endif()
   gtest_discover_tests(${name} TEST_PREFIX "${name}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST
     PROPERTIES TIMEOUT ${TEST_TIMEOUT} ENVIRONMENT "${TEST_ENVIRONMENT}")
 endfunction()

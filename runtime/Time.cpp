@@ -1,5 +1,6 @@
 #include "runtime/Time.h"
 
+#include <cerrno>
 #include <sys/select.h>
 #include <sys/time.h>
 
@@ -23,7 +24,9 @@ void Time::sleep(uint64 usec)
     timeval time;
     time.tv_sec = static_cast<time_t>(usec / second);
     time.tv_usec = static_cast<suseconds_t>(usec % second);
-    select(0, nullptr, nullptr, nullptr, &time);
+    // Linux leaves in the time-out what a signal cut off.
+    while (select(0, nullptr, nullptr, nullptr, &time) == -1 && errno == EINTR) {
+    }
 }
 
 } // namespace cimple
