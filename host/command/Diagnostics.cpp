@@ -2,6 +2,7 @@
 
 #include "host/command/Actions.h"
 #include "host/command/Dialogue.h"
+#include "host/command/Listing.h"
 #include "host/command/Meanings.h"
 #include "host/command/Options.h"
 #include "host/command/Table.h"
@@ -107,7 +108,11 @@ int Diagnostics::list()
     if (!tests.ok()) return failed(tests.status);
     const std::vector<Instance> settings = all(setting_class), services = all("NVRHBA_HelpService");
     const std::vector<Instance> offers = all("NVRHBA_AvailableDiagnosticService");
-    Table table({"TEST", "LOOPS", "PORTS", "OPTIONS", "WHAT IT DOES"});
+    Listing listing({{"test", "TEST"},
+                     {"loops", "LOOPS"},
+                     {"ports", "PORTS"},
+                     {"options", "OPTIONS"},
+                     {"description", "WHAT IT DOES"}});
     Json json = Json::array();
     for (const Instance& test : tests.instances) {
         const std::string name = test.get("Name").as_text();
@@ -126,15 +131,17 @@ int Diagnostics::list()
             const Path* port = offer.get("UserOfService").as_path();
             if (provided && port && key_text(*provided, "Name") == name) ports.push_back(key_text(*port, "DeviceID"));
         }
-        table.add({short_name(name), loops, std::to_string(ports.size()), options, help});
+        listing.add({short_name(name), loops, std::to_string(ports.size()), options, help});
         json.push_back({{"test", short_name(name)}, {"name", name}, {"description", help}, {"ports", ports}});
     }
     if (m_options.json)
         m_out << json_text({{"status", 0}, {"tests", json}});
-    else if (table.empty())
+    else if (m_options.csv)
+        m_out << listing.csv();
+    else if (listing.empty())
         m_out << "this host has no diagnostic tests\n";
     else
-        m_out << table.to_text(page_width);
+        m_out << listing.table(page_width);
     return 0;
 }
 
@@ -272,24 +279,32 @@ int Diagnostics::results()
 {
     const Answer records = m_server.enumerate(m_options.name_space, record_class);
     if (!records.ok()) return failed(records.status);
-    Table table({"TEST", "OUTCOME", "PASSED", "FAILED", "SECONDS", "ADAPTER", "RESULT"});
+    Listing listing({{"test", "TEST"},
+                     {"outcome", "OUTCOME"},
+                     {"passed", "PASSED"},
+                     {"failed", "FAILED"},
+                     {"seconds", "SECONDS"},
+                     {"adapter", "ADAPTER"},
+                     {"result", "RESULT"}});
     Json json = Json::array();
     for (const Instance& record : records.instances) {
         const std::string test = record.get("ServiceName").as_text();
         const auto text = [&record](const char* name) {
-            return record.get(name).is_null() ? "" : record.get(name).to_text();
+            return record.get(name).is_null() ? std::string() : record.get(name).to_text();
         };
         const std::string outcome = record.get("CompletionState").as_uint() == passed ? "passed" : "failed";
-        table.add({short_name(test), outcome, text("LoopsPassed"), text("LoopsFailed"), text("TimeToExecute"),
-                   text("ManagedElementName"), text("RecordData")});
+        listing.add({short_name(test), outcome, text("LoopsPassed"), text("LoopsFailed"), text("TimeToExecute"),
+                     text("ManagedElementName"), text("RecordData")});
         json.push_back(to_json(record));
     }
     if (m_options.json)
         m_out << json_text({{"status", 0}, {"records", json}});
-    else if (table.empty())
+    else if (m_options.csv)
+        m_out << listing.csv();
+    else if (listing.empty())
         m_out << "no records of diagnostic tests: the module keeps them as long as it is loaded\n";
     else
-        m_out << table.to_text(page_width);
+        m_out << listing.table(page_width);
     return 0;
 }
 

@@ -1,6 +1,7 @@
 #include "host/command/Logs.h"
 
 #include "host/command/Actions.h"
+#include "host/command/Listing.h"
 #include "host/command/Table.h"
 #include "host/command/Verbs.h"
 #include "host/command/Views.h"
@@ -113,6 +114,13 @@ public:
             for (const Instance& line : lines.instances)
                 texts.push_back(line.get("RecordData").as_text());
             m_out << json_text({{"status", 0}, {"lines", texts}});
+            return 0;
+        }
+        if (m_options.csv) {
+            Listing listing(std::vector<Listing::Field>{{"line", ""}});
+            for (auto line = lines.instances.rbegin(); line != lines.instances.rend(); ++line)
+                listing.add({line->get("RecordData").as_text()});
+            m_out << listing.csv();
             return 0;
         }
         for (auto line = lines.instances.rbegin(); line != lines.instances.rend(); ++line)

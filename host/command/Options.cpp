@@ -15,8 +15,8 @@ namespace host {
 namespace {
 
 /// Verbs whose answers are rows.
-const std::string with_table[] = {"associators", "check", "classes", "enum",      "get",
-                                  "names",       "paths", "ports",   "references"};
+const std::string with_table[] = {"associators", "check", "classes", "diag list", "diag results", "driverlog",
+                                  "enum",        "get",   "names",   "paths",     "ports",        "references"};
 
 constexpr const char* description =
     "nvrcim asks the Fibre Channel provider module as a CIM server would: it loads the module, calls it through CMPI,\n"
@@ -227,9 +227,10 @@ int read_options(int count, char** arguments, Options& options)
         std::cout << bash_completion(app);
         return 0;
     }
-    const bool has_table = std::count(std::begin(with_table), std::end(with_table), options.verb) != 0;
+    const std::string whole = options.verb + (options.verb == "diag" ? " " + options.method : "");
+    const bool has_table = std::count(std::begin(with_table), std::end(with_table), whole) != 0;
     if (options.csv && !has_table) {
-        std::cerr << "nvrcim: wrong command: " << options.verb << " prints no table that --csv could show\n";
+        std::cerr << "nvrcim: wrong command: " << whole << " prints no table that --csv could show\n";
         return usage_error;
     }
     return -1;

@@ -215,6 +215,10 @@ TEST(Command, PrintsRowsAsCsvWhereverThereAreRows)
               "class,superclass,kinds,namespaces\r\n"
               "NVRHBA_FCPortStatistics,CIM_FCPortStatistics,instance method,root/norvane\r\n");
     EXPECT_THAT(nvrcim("--csv check").output, HasSubstr("\r\nNVRHBA_ControlledBy,1,2,0,0,0\r\n"));
+    EXPECT_THAT(nvrcim("--csv diag list").output, testing::StartsWith("test,loops,ports,options,description\r\n"));
+    EXPECT_EQ(nvrcim("--csv diag results").output, "test,outcome,passed,failed,seconds,adapter,result\r\n");
+    EXPECT_THAT(nvrcim("--csv driverlog").output, testing::StartsWith("line\r\n"));
+    EXPECT_EQ(nvrcim("diag clear --csv").status, 64);
     EXPECT_EQ(nvrcim("tree --csv").status, 64);
     EXPECT_EQ(nvrcim("paths --csv --json").status, 64);
 }

@@ -27,7 +27,8 @@ for package in "$provider" "$tools"; do
 done
 for file in usr/sbin/norvane-provider-register usr/share/norvane-fc-provider/mof/20_module.mof \
     usr/share/norvane-fc-provider/sfcb/norvane_fc_provider.reg usr/share/man/man8/norvane-provider-register.8.gz \
-    usr/share/doc/norvane-fc-provider/docs/install.md usr/share/doc/norvane-fc-provider/copyright usr/bin/nvrcim usr/bin/nvrsimctl; do
+    usr/share/doc/norvane-fc-provider/docs/install.md usr/share/doc/norvane-fc-provider/copyright usr/bin/nvrcim usr/bin/nvrsimctl \
+    usr/share/man/man5/norvane_fc_provider.conf.5.gz usr/share/bash-completion/completions/nvrcim; do
     [ -e "root/$file" ] || fail "$file is not installed"
 done
 dpkg-deb -I "$provider" postinst | grep -q 'register register || true' || fail "postinst"
