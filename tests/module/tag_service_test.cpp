@@ -587,8 +587,9 @@ protected:
         make_place(here);
         make_place(served);
         EXPECT_EQ(::chdir(here), 0);
+        // What the module has opened by that name once is found by it again while the library is in the process.
+        install_no_curl();
         rig.emplace(Rig_Options{host::Manner::strict(), tagged_host()});
-        install_curl();
         service.emplace(*rig, "NVRHBA_FCTagService");
     }
     Called fetch(const std::string& uri)
@@ -605,6 +606,7 @@ protected:
 
 TEST_F(TagServiceTransfer, AFetchedTableIsLoadedAndItsFileRemoved)
 {
+    install_curl();
     const std::string file = std::string(served) + "/tags.xml";
     for (const char* kind : {"http", "ftp"}) {
         write_file(file, document("<numberOfEntries>1</numberOfEntries>" + row(*kind == 'h' ? "1" : "2")));
@@ -624,6 +626,7 @@ TEST_F(TagServiceTransfer, AFetchedTableIsLoadedAndItsFileRemoved)
 
 TEST_F(TagServiceTransfer, AFetchedFileIsRemovedWhateverComesOfIt)
 {
+    install_curl();
     write_file(std::string(served) + "/tags.xml", document("<numberOfEntries>1</numberOfEntries>" + row("1")));
     const std::string uri = std::string("file://") + served + "/tags.xml";
 
@@ -665,6 +668,7 @@ TEST_F(TagServiceTransfer, AFetchedFileIsRemovedWhateverComesOfIt)
 
 TEST_F(TagServiceTransfer, AMalformedAddressIsNotFoundAndLeavesItsFile)
 {
+    install_curl();
     const Called called = fetch("http://[:]:x/tags.xml");
     EXPECT_THAT(called, returned(4107));
     EXPECT_THAT(called.words, Contains("download failed 3"));
@@ -674,7 +678,6 @@ TEST_F(TagServiceTransfer, AMalformedAddressIsNotFoundAndLeavesItsFile)
 
 TEST_F(TagServiceTransfer, WithoutALibraryForItNothingIsFetched)
 {
-    install_no_curl();
     EXPECT_THAT(fetch("ftp://127.0.0.1/tags.xml"), returned(4107));
     EXPECT_THAT(files(here), IsEmpty());
 }

@@ -1,4 +1,0 @@
-/// The simulated libraries: see tests/support/simulator.h.
-#pragma once
-
-#include "tests/support/simulator.h"
