@@ -16,13 +16,15 @@ import unittest
 
 NVRCIM, NVRSIMCTL, SCENARIO = sys.argv.pop(1), sys.argv.pop(1), sys.argv.pop(1)
 NAMESPACE = "root/norvane"
+# The module keeps its settings in /etc when it goes.
+PRIVATE = ["sh", os.path.join(os.path.dirname(os.path.abspath(__file__)), "../support/private_etc.sh"), NVRCIM]
 
 
 def setUpModule():  # pylint: disable=invalid-name
     global SERVER, PORT, WORK  # pylint: disable=global-statement
     WORK = tempfile.mkdtemp()
     SERVER = subprocess.Popen(
-        [NVRCIM, "--scenario", SCENARIO, "serve", "--port", "0"], stdout=subprocess.PIPE, text=True,
+        [*PRIVATE, "--scenario", SCENARIO, "serve", "--port", "0"], stdout=subprocess.PIPE, text=True,
         env={**os.environ, "NVRSIM_SOCKET": WORK + "/socket"})
     first = SERVER.stdout.readline()
     assert "for trying and testing" in first, first
@@ -62,7 +64,7 @@ def bare(lines):
 
 
 def nvrcim(*arguments):
-    done = subprocess.run([NVRCIM, "--scenario", SCENARIO, "--json", *arguments], capture_output=True, text=True,
+    done = subprocess.run([*PRIVATE, "--scenario", SCENARIO, "--json", *arguments], capture_output=True, text=True,
                           check=False)
     return json.loads(done.stdout)
 

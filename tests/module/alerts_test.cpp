@@ -16,8 +16,8 @@
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Entries.h"
 #include "tests/module/support/Rig.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
 using namespace nvrtest;

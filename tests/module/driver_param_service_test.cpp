@@ -3,7 +3,7 @@
 
 #include "simulator/Calls.h"
 #include "tests/module/support/Service.h"
-#include "tests/module/support/Simulated_Hardware.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using host::Value;

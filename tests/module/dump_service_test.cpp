@@ -5,8 +5,8 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Service.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using host::Value;

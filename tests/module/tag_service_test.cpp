@@ -11,10 +11,10 @@
 #include "simulator/Calls.h"
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Service.h"
-#include "tests/module/support/Simulated_Hardware.h"
 #include "tests/support/curl_libraries.h"
 #include "tests/support/file_server.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using host::Value;
