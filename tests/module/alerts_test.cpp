@@ -186,13 +186,14 @@ TEST_P(Alerts, ThousandDeliveriesLeaveNothingOnAThreadThatStays)
     sink.wait_for(1);
     rig.wait_for_refreshes(1); // whose up-calls make objects too
     rig.server().reset_report();
+    const auto alive = rig.server().report().peak_objects; // the refresh may not have given back its own yet
     for (int i = 0; i < 1000; i++)
         ASSERT_EQ(nvrsim_event(first_port, link_up, 0), 1);
     const auto seen = sink.wait_for(1001);
     for (unsigned i = 0; i < 1001; i++)
         ASSERT_EQ(seen[i].instance.get("SequenceNumber").as_uint(), i);
     // While it is still attached; what a thread holds at its end a server would free anyway.
-    EXPECT_LT(rig.server().report().peak_objects, 200u);
+    EXPECT_LT(rig.server().report().peak_objects, alive + 200);
     unsubscribe(rig, id);
     rig.stop();
     EXPECT_EQ(left_beside_strings(rig.server().report()), 0u) << rig.server().report().to_text();
