@@ -59,12 +59,27 @@ bool is_compared(const Meta_Feature* feature)
     return is_property(feature) || (is_reference(feature) && as_reference(feature)->subscript == 0);
 }
 
+/// True if key_eq looks at the very same features, in the same places, of instances of the two classes: it is symmetric
+/// between them then.
+bool share_keys(const Meta_Class* a, const Meta_Class* b)
+{
+    if (!a || !b) return a == b;
+    const std::size_t most = std::max(a->num_meta_features, b->num_meta_features);
+    const auto key_of = [](const Meta_Class* of, std::size_t i) -> const Meta_Feature* {
+        return i < of->num_meta_features && is_compared(of->meta_features[i]) ? of->meta_features[i] : nullptr;
+    };
+    for (std::size_t i = 0; i < most; i++)
+        if (key_of(a, i) != key_of(b, i)) return false;
+    return true;
+}
+
 } // namespace
 
 bool Key_Index::walk(const Instance* instance, std::size_t& depth, uint64& value) const
 {
     const Meta_Class* meta_class = instance ? instance->meta_class : nullptr;
-    if (depth == m_shape.size() || m_shape[depth].meta_class != meta_class) return false;
+    if (depth == m_shape.size()) return false;
+    if (m_shape[depth].meta_class != meta_class && !share_keys(m_shape[depth].meta_class, meta_class)) return false;
     const Node& node = m_shape[depth++];
     for (std::size_t i = node.first; i < node.first + node.count; i++) {
         const Meta_Feature* key = m_keys[i];

@@ -1,7 +1,8 @@
 /// A hash index over the keys of a list of instances, beside the list that owns them.
 ///
 /// key_eq is not symmetric across classes, so the index answers only where it can be exact: for a key and elements of
-/// one shape (the same classes in the instance and in all that its key references reach). A list that holds an
+/// one shape (the same classes, or classes with the very same keys, in the instance and in all that its key references
+/// reach). A list that holds an
 /// instance of another shape, or is asked for one, is scanned. No locks: the owner of the list sees to that.
 #pragma once
 

@@ -1,5 +1,7 @@
 #include "agent/driver_param_instances.h"
 
+#include <new>
+
 #include "agent/ProviderAgent.h"
 #include "agent/associations.h"
 #include "agent/instance_table.h"
@@ -123,10 +125,14 @@ uint32 nvrcimGetDriverParam(ProviderAgent& agent, const std::string& wwpn, bool 
     try {
         for (std::size_t i = 0; i < records.size(); i++) {
             NVR_LOG("saving the values of driver parameter %d", static_cast<int>(i));
-            if (global)
-                insertGlobal(agent, records[i], i, service);
-            else
-                insertLocal(agent, records[i], i, service, port, wwpn, wwn);
+            try {
+                if (global)
+                    insertGlobal(agent, records[i], i, service);
+                else
+                    insertLocal(agent, records[i], i, service, port, wwpn, wwn);
+            } catch (const std::bad_alloc&) {
+                continue; // a record that cannot be made is left out
+            }
         }
     } catch (const Update_Ended&) {
         return status_failed; // of this list alone: the update goes on

@@ -4,6 +4,7 @@
 #include <cstdlib>
 #include <unistd.h>
 
+#include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "foundation/Management_Session.h"
 #include "foundation/NvrConfigFile.h"
@@ -21,11 +22,12 @@ bool registered = false;
 void save()
 {
     if (owner != ::getpid() || !mutex.lock_soon()) return;
-    if (living) {
-        Management_Session::forgetName();
-        CLogger::instance()->saveSettingsAtExit();
-        living->save();
-    }
+    if (living)
+        guarded([] {
+            Management_Session::forgetName();
+            CLogger::instance()->saveSettingsAtExit();
+            living->save();
+        });
     mutex.unlock();
 }
 

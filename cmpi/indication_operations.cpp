@@ -50,9 +50,10 @@ CMPIStatus change_filters(CMPIIndicationMI* mi, const CMPIObjectPath* op, const 
         if (!adapter) return CMPI_RC_ERR_FAILED;
         Auto_Mutex locked(adapter->lock);
         log_enter(label);
+        const String name_space = name_space_of(op); // a call of the server's: not under the innermost mutex
         {
             Auto_Mutex filters_locked(adapter->filters_lock);
-            change(adapter->filters, name_space_of(op));
+            change(adapter->filters, name_space);
         }
         log_return(label, CMPI_RC_OK);
         return CMPI_RC_OK;

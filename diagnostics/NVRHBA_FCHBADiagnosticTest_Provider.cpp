@@ -65,8 +65,9 @@ void recordSettings(ProviderAgent& agent, const NVRHBA_FCHBADiagnosticSettingDat
         NVRHBA_DiagnosticSettingDataRecord& record = *records[i];
         if (!(record.Caption.value == jobId)) continue;
         NVR_LOG("Adding the embedded instance for Settingdatarecord : %s", record.InstanceID.value.c_str());
+        auto* copy = static_cast<CIM_DiagnosticSettingData*>(clone(&setting));
         unref(record.Settings);
-        record.Settings = static_cast<CIM_DiagnosticSettingData*>(clone(&setting));
+        record.Settings = copy;
         return;
     }
 }

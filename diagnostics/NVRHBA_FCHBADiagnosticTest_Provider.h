@@ -16,11 +16,11 @@ class NVRHBA_FCHBADiagnosticTest_Provider : public Read_Only_Provider<NVRHBA_FCH
 public:
     Enum_Instances_Status enum_instances(const NVRHBA_FCHBADiagnosticTest* model, const Enum_Handler& handler);
 
-    /// Runs the test on the port behind the port controller `ManagedElement`, to its end: that takes up to two minutes
-    /// under the agent's locks. Settings that are null are the defaults; those that are given are written over the
-    /// defaults for good. Return value 0 for a test that was carried out, whatever it found; 1 for an unknown test; 5
-    /// for instances, settings or a target that are none; 40000 plus the status of a test that could not be carried
-    /// out. `Job` is the job that the run has left, also beside a failure.
+    /// Runs the test on the port behind the port controller `ManagedElement`, to its end: that takes up to two minutes,
+    /// and as long again where a cancel fails, under the agent's locks. Settings that are null are the defaults; those
+    /// that are given are written over the defaults for good. Return value 0 for a test that was carried out, whatever
+    /// it found; 1 for an unknown test; 5 for instances, settings or a target that are none; 40000 plus the status of a
+    /// test that could not be carried out. `Job` is the job that the run has left, also beside a failure.
     Invoke_Method_Status RunDiagnosticService(const NVRHBA_FCHBADiagnosticTest* self,
                                               CIM_ManagedElement*& ManagedElement,
                                               CIM_DiagnosticSettingData*& DiagnosticSettings,

@@ -88,10 +88,8 @@ public:
     };
 
 private:
-    friend class NVR_SysLogger;
     CLogger();
     void dispatch(const char* file, uint32 line, sint32 level, const char* text);
-    void countOthers();
     bool setTracePath(const char* path);
     std::string tracePath() const;
     bool writeSettings() const;
@@ -100,6 +98,7 @@ private:
     std::atomic<sint32> m_level{0};
     std::atomic<sint32> m_enabled{0};
     std::vector<NVR_LoggerInterface*> m_loggers;
+    bool m_ending = false; ///< the exit has written the settings: no other thread truncates them any more
 
     template <class>
     friend class Immortal;

@@ -17,8 +17,8 @@ struct Asked {
 
 /// Fills `records` by `ask(Record* room, uint32* count)`, `*count` being the room on the way in and the number of
 /// records on the way out. Statuses 7 and 191 mean that more room is needed. On success `records` has what was given,
-/// but never more than there was room for, zeroed behind what the library wrote; otherwise it is empty. No more than
-/// `limit` records are ever asked for.
+/// but never more than there was room for, zeroed behind what the library wrote; otherwise it is empty. A need
+/// of more than `limit` records counts as memory that is not to be had.
 template <class Record, class Ask>
 Asked ask_again(std::vector<Record>& records, uint32 first, uint32 limit, Ask ask)
 {
@@ -41,7 +41,8 @@ Asked ask_again(std::vector<Record>& records, uint32 first, uint32 limit, Ask as
         records.clear();
         const bool more = asked.status == RM_STATUS_MORE_DATA || asked.status == RM_STATUS_LIST_TOO_LONG;
         if (!more || asked.calls == 2) return asked;
-        room = count < limit ? count : limit;
+        if (count > limit) return asked; // as memory that is not to be had
+        room = count;
     }
 }
 

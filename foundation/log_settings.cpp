@@ -39,13 +39,20 @@ bool CLogger::writeSettings() const
 void CLogger::saveSettings()
 {
     Undisturbed undisturbed;
-    if (!writeSettings()) NVR_LOG("Unable to open file for storing config data");
+    bool written = false;
+    {
+        const Hold hold;
+        written = m_ending || writeSettings();
+    }
+    if (!written) NVR_LOG("Unable to open file for storing config data");
 }
 
 void CLogger::saveSettingsAtExit()
 {
     const Hold hold(std::try_to_lock);
-    if (hold.held()) static_cast<void>(writeSettings());
+    if (!hold.held()) return;
+    m_ending = true;
+    static_cast<void>(writeSettings());
 }
 
 void CLogger::loadSettings()

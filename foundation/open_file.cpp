@@ -63,8 +63,9 @@ bool write_text(const char* path, std::string_view text)
     if (fd < 0) return false;
     while (!text.empty()) {
         const ssize_t written = ::write(fd, text.data(), text.size());
-        if (written <= 0 && errno != EINTR) break;
-        if (written > 0) text.remove_prefix(static_cast<std::size_t>(written));
+        if (written < 0 && errno == EINTR) continue;
+        if (written <= 0) break;
+        text.remove_prefix(static_cast<std::size_t>(written));
     }
     ::close(fd);
     return true;

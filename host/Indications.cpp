@@ -171,7 +171,8 @@ Status Indications::unsubscribe(int id)
     {
         std::lock_guard lock(m_mutex);
         auto found = m_subscriptions.find(id);
-        if (found == m_subscriptions.end()) return {CMPI_RC_ERR_NOT_FOUND, "there is no subscription of that number", Fault::request};
+        if (found == m_subscriptions.end())
+            return {CMPI_RC_ERR_NOT_FOUND, "there is no subscription of that number", Fault::request};
         subscription = found->second;
     }
     Status status;

@@ -53,6 +53,7 @@ Unload_Status NVRHBA_AlertIndication_Provider::unload()
     const uint32 result = cleanUp();
     {
         Auto_Mutex lock(m_IndicationProviderMutex);
+        m_unloaded = true;
         retryRemovals();
     }
     ProviderAgent::releaseRef();
@@ -65,6 +66,7 @@ NVRHBA_AlertIndication_Provider::enable_indications(std::unique_ptr<Indication_H
     Auto_Mutex change(change_mutex);
     Auto_Mutex lock(m_IndicationProviderMutex);
     NVR_LOG("NVRHBA_AlertIndication_Provider::enable_indications()");
+    if (m_unloaded) return ENABLE_INDICATIONS_FAILED; // it came in while the last clean-up was under way
     if (const Indication_Handler* in_use = _indication_handler)
         return same(*in_use, *handler) ? ENABLE_INDICATIONS_OK : ENABLE_INDICATIONS_FAILED;
     m_agent = ProviderAgent::GetInstance();

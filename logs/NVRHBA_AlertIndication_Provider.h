@@ -49,6 +49,7 @@ private:
     uint32 cleanUp();
 
     std::atomic<Indication_Handler*> _indication_handler{nullptr}; // owned; null: alerts are off
+    bool m_unloaded = false;                                       // nothing is enabled any more
     ProviderAgent* m_agent = nullptr;                              // good while a handler is there
     Thread m_IndicationThread;
 };

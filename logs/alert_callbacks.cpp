@@ -74,11 +74,13 @@ private:
 
 uint32 registerPort(const Adapter& adapter, int index, const Port& port, void* provider)
 {
+    // Memory first: a registration must not be forgotten, nor a place without one be left.
+    const std::string name = adapter.name();
     auto& ports = registered_ports();
-    ports.push_back({nullptr, port.portName()}); // memory first: a registration must not be forgotten
+    ports.push_back({nullptr, port.portName()});
     HBA_STATUS status = HBA_STATUS_ERROR;
     {
-        const Open_Adapter handle(adapter.name());
+        const Open_Adapter handle(name);
         HBA_WWN wwpn;
         if (handle == 0) NVR_LOG("Failed to Open Adapter, Skipping registration for Indication notification");
         if (handle == 0 || !string2HBAName(&wwpn, port.portName().c_str())) {

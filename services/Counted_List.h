@@ -39,11 +39,21 @@ public:
         std::memcpy(&count, m_bytes.data(), sizeof count);
         return count;
     }
-    /// The records that were counted and had room.
+    /// How many records were counted and had room.
+    uint32 size() const { return std::min(count(), m_room); }
+    /// One of them.
+    template <class Record>
+    Record record(uint32 index) const
+    {
+        Record one;
+        std::memcpy(&one, m_bytes.data() + m_head + std::size_t{index} * sizeof one, sizeof one);
+        return one;
+    }
+    /// All of them. Throws std::bad_alloc.
     template <class Record>
     std::vector<Record> records() const
     {
-        std::vector<Record> all(std::min(count(), m_room));
+        std::vector<Record> all(size());
         if (!all.empty()) std::memcpy(all.data(), m_bytes.data() + m_head, all.size() * sizeof(Record));
         return all;
     }

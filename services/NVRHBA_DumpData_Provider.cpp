@@ -1,5 +1,7 @@
 #include "services/NVRHBA_DumpData_Provider.h"
 
+#include <cstring>
+
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
 #include "agent/library_name.h"
@@ -64,7 +66,7 @@ Modify_Instance_Status NVRHBA_DumpData_Provider::modify_instance(const NVRHBA_Du
 
     const bool directory_given = !model->DumpDirectory.null && !instance->DumpDirectory.null;
     if (directory_given && *instance->DumpDirectory.value.c_str()) {
-        if (instance->DumpDirectory.value != data->DumpDirectory.value) {
+        if (std::strcmp(instance->DumpDirectory.value.c_str(), data->DumpDirectory.value.c_str()) != 0) {
             NVR_LOG("nvrcimSetDumpDirectory is not supported");
             return MODIFY_INSTANCE_UNSUPPORTED;
         }

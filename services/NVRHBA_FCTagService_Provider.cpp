@@ -237,8 +237,7 @@ Invoke_Method_Status NVRHBA_FCTagService_Provider::GetGlobalFlag(const NVRHBA_FC
             static_cast<int>(adapter.handle()));
     uint32 flag = 0;
     if (const uint32 status = CPQFC_QoSGetGlobalFlag(adapter.handle(), &flag)) {
-        NVR_LOG("NVRHBA_FCTagService_Provider::CPQFC_QoSGetGlobalFlag Failed with Error :%d",
-                static_cast<int>(status));
+        NVR_LOG("NVRHBA_FCTagService_Provider::CPQFC_QoSGetGlobalFlag Failed with Error :%d", static_cast<int>(status));
         return answer(return_value, answer_refused);
     }
     adapter.close();
@@ -263,8 +262,7 @@ Invoke_Method_Status NVRHBA_FCTagService_Provider::SetGlobalFlag(const NVRHBA_FC
     NVR_LOG("NVRHBA_FCTagService_Provider::Successfully Opened Adaptor, Adapter Handle:%d",
             static_cast<int>(adapter.handle()));
     if (const uint32 status = CPQFC_QoSSetGlobalFlag(adapter.handle(), given(State))) {
-        NVR_LOG("NVRHBA_FCTagService_Provider::CPQFC_QoSSetGlobalFlag Failed with Error :%d",
-                static_cast<int>(status));
+        NVR_LOG("NVRHBA_FCTagService_Provider::CPQFC_QoSSetGlobalFlag Failed with Error :%d", static_cast<int>(status));
         return answer(return_value, answer_refused);
     }
     adapter.close();

@@ -18,10 +18,10 @@ public:
     Enum_Instances_Status enum_instances(const NVRHBA_FCTagService* model, const Enum_Handler& handler);
 
     /// `State` is set on success alone.
-    Invoke_Method_Status GetGlobalFlag(const NVRHBA_FCTagService* self, NVRHBA_FCPort*& Target,
-                                       Property<uint32>& State, Property<uint32>& return_value);
-    Invoke_Method_Status SetGlobalFlag(const NVRHBA_FCTagService* self, NVRHBA_FCPort*& Target,
-                                       Property<uint32>& State, Property<uint32>& return_value);
+    Invoke_Method_Status GetGlobalFlag(const NVRHBA_FCTagService* self, NVRHBA_FCPort*& Target, Property<uint32>& State,
+                                       Property<uint32>& return_value);
+    Invoke_Method_Status SetGlobalFlag(const NVRHBA_FCTagService* self, NVRHBA_FCPort*& Target, Property<uint32>& State,
+                                       Property<uint32>& return_value);
 
     /// Writes the table to a file of the name `URI` in the port's dump directory, or in the last one that was known, or
     /// else in /tmp. 4097 without a name; 32767 for an empty table; 32968 for a path of more than 255 characters. A

@@ -1,7 +1,7 @@
 /// Serves the firmware installation service of the host. Its instance comes from the agent's map.
 ///
 /// Each method runs to its end inside the call, under the locks of the agent wait, transfers included; no job is made.
-/// The return values stand in services/service_method.h, and beside them 4 and 5, told in the source.
+/// The return values stand in agent/method_answer.h, and beside them 4 and 5, told in the source.
 #pragma once
 
 #include "agent/Read_Only_Provider.h"

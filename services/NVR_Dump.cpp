@@ -1,5 +1,7 @@
 #include "services/NVR_Dump.h"
 
+#include <new>
+
 #include "agent/ProviderAgent.h"
 #include "agent/associations.h"
 #include "agent/instance_table.h"
@@ -82,11 +84,8 @@ uint32 createForPort(ProviderAgent& agent, const NVRHBA_FCPort& port, const Inst
     return 0;
 }
 
-} // namespace
-
-uint32 NVR_Dump::FC_CreateDumpClasses(ProviderAgent& agent)
+uint32 createClasses(ProviderAgent& agent)
 {
-    NVR_LOG("Entered FC_CreateDumpClasses");
     const auto& hosts = agent.m_CIM_ComputerSystem_map;
     const Instance* host = hosts.empty() ? nullptr : static_cast<const Instance_Map&>(hosts)[0];
 
@@ -108,6 +107,18 @@ uint32 NVR_Dump::FC_CreateDumpClasses(ProviderAgent& agent)
     for (std::size_t i = 0; i < ports.size(); i++)
         if (const uint32 status = createForPort(agent, *ports[i], service)) return status;
     return 0;
+}
+
+} // namespace
+
+uint32 NVR_Dump::FC_CreateDumpClasses(ProviderAgent& agent)
+{
+    NVR_LOG("Entered FC_CreateDumpClasses");
+    try {
+        return createClasses(agent);
+    } catch (const std::bad_alloc&) {
+        return status_not_made;
+    }
 }
 
 uint32 NVR_Dump::FC_ClearDumpClasses(ProviderAgent& agent)

@@ -63,8 +63,10 @@ bool hasVPortNamed(const HBA_WWN& port, const HBA_WWN& newWWPN, const HBA_WWN& n
     Counted_List list(offsetof(RM_VPORTLIST, entry), sizeof(RM_VPORTENTRY));
     if (!list.fill([&](void* room) { return RM_VPList(port, room); })) return false;
     if (list.status != RM_STATUS_OK || list.count() == 0 || list.count() > RM_VPORT_MAX_ENTRIES) return false;
-    for (const RM_VPORTENTRY& vport : list.records<RM_VPORTENTRY>())
-        if (same(vport.wwpn, newWWPN) || same(vport.wwpn, newWWNN)) return true;
+    for (uint32 i = 0; i < list.size(); i++) {
+        const HBA_WWN vport = list.record<RM_VPORTENTRY>(i).wwpn;
+        if (same(vport, newWWPN) || same(vport, newWWNN)) return true;
+    }
     return false;
 }
 
@@ -81,6 +83,25 @@ Duplicate findDuplicate(const HBA_WWN& newWWPN, const HBA_WWN& newWWNN)
         if (hasVPortNamed(record.wwpn, newWWPN, newWWNN)) duplicate = VPORT_WWPN;
     }
     return duplicate;
+}
+
+/// The answer for names that cannot be given to a port, or ANSWER_DONE.
+uint32 refuseNames(const HBA_WWN& newWWPN, const HBA_WWN& newWWNN, Property<uint16>& operationStatus)
+{
+    if (RM_ValidateWwn(&newWWPN) == RM_STATUS_ILLEGAL_WWN) {
+        NVR_LOG("The supplied 'New WWPN' is not valid");
+        return libraryAnswer(RM_STATUS_ILLEGAL_WWN);
+    }
+    if (RM_ValidateWwn(&newWWNN) == RM_STATUS_ILLEGAL_WWN) {
+        NVR_LOG("The supplied 'New WWNN' is not valid");
+        return libraryAnswer(RM_STATUS_ILLEGAL_WWN);
+    }
+    if (const Duplicate duplicate = findDuplicate(newWWPN, newWWNN)) {
+        NVR_LOG("%s", wordsOf(duplicate));
+        operationStatus.set(static_cast<uint16>(duplicate));
+        return answer_duplicate;
+    }
+    return ANSWER_DONE;
 }
 
 /// Calls, and calls again every second while the library is busy, for five minutes; the first time with a word. An
@@ -187,19 +208,12 @@ void logReadFailure(uint16 type, uint32 status)
 uint32 NVR_MethodWrapper::ChangeWWN(const HBA_WWN& port, const HBA_WWN& newWWPN, const HBA_WWN& newWWNN, uint16 type,
                                     Property<uint16>& operationStatus)
 {
-    if (RM_ValidateWwn(&newWWPN) == RM_STATUS_ILLEGAL_WWN) {
-        NVR_LOG("The supplied 'New WWPN' is not valid");
-        return libraryAnswer(RM_STATUS_ILLEGAL_WWN);
+    uint32 refusal = ANSWER_DONE;
+    if (!guarded([&] { refusal = refuseNames(newWWPN, newWWNN, operationStatus); })) {
+        NVR_LOG("Error in RM_ChangeWWN");
+        return libraryAnswer(RM_STATUS_ERROR);
     }
-    if (RM_ValidateWwn(&newWWNN) == RM_STATUS_ILLEGAL_WWN) {
-        NVR_LOG("The supplied 'New WWNN' is not valid");
-        return libraryAnswer(RM_STATUS_ILLEGAL_WWN);
-    }
-    if (const Duplicate duplicate = findDuplicate(newWWPN, newWWNN)) {
-        NVR_LOG("%s", wordsOf(duplicate));
-        operationStatus.set(static_cast<uint16>(duplicate));
-        return answer_duplicate;
-    }
+    if (refusal != ANSWER_DONE) return refusal;
     NVR_LOG("ChangeWWN operation initiated");
     uint32 code = 0;
     const uint32 status = callWhileBusy("Validating new WWNs...", "Error in RM_ChangeWWN",

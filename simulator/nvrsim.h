@@ -55,7 +55,8 @@ void nvrsim_drain_events(void);
 
 /* A value of a port as text: "wwpn", "wwnn", "state", "speed", "fc_id", "beacon", "enabled", "boot_code", "resets",
  * "retention", "pending", "firmware", "present", "targets", "paths", "test" (the newest diagnostic test with its
- * arguments: echo cycles=5 halt=0 pattern=1a2b3c4d target=50060E8005A10000). Length, or 0 for an unknown port or name. */
+ * arguments: echo cycles=5 halt=0 pattern=1a2b3c4d target=50060E8005A10000). Length, or 0 for an unknown port or name.
+ */
 size_t nvrsim_get(const char* port, const char* name, char* buffer, size_t size);
 /* Sets "state", "speed", "fc_id", "beacon", "enabled", "boot_code", "retention", "present" (0 takes the port's whole
  * adapter out of the host), "local", "loopback_plug", "statistic:N", "attribute:N" (32-bit number). */

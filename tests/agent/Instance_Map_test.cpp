@@ -9,8 +9,11 @@
 #include "classes/CIM_ComputerSystem.h"
 #include "classes/CIM_FCPort.h"
 #include "classes/IBMSD_ComputerSystem.h"
+#include "classes/NVRHBA_DiagnosticCompletionRecord.h"
+#include "classes/NVRHBA_DiagnosticServiceRecord.h"
 #include "classes/NVRHBA_FCPort.h"
 #include "classes/NVRHBA_FCPortSystemDevice.h"
+#include "classes/NVRHBA_RecordAppliesToElement.h"
 
 using namespace cimple;
 
@@ -42,6 +45,17 @@ NVRHBA_FCPortSystemDevice* device(Host* of, const char* id)
     auto* made = create_as<NVRHBA_FCPortSystemDevice>(true);
     made->GroupComponent = reinterpret_cast<CIM_ComputerSystem*>(of);
     made->PartComponent = port<NVRHBA_FCPort>(id);
+    return made;
+}
+
+/// What a record tells of; the record is of class T.
+template <class T>
+NVRHBA_RecordAppliesToElement* applies(const std::string& id)
+{
+    T* record = create_as<T>(true);
+    record->InstanceID.set(id.c_str());
+    auto* made = create_as<NVRHBA_RecordAppliesToElement>(true);
+    made->Antecedent = reinterpret_cast<CIM_RecordForLog*>(record);
     return made;
 }
 
@@ -269,6 +283,23 @@ TEST(AssociationMap, FindsEndsOfADerivedClassAndOfItsBase)
     EXPECT_EQ(map.find(usual.get()), 20);
     EXPECT_EQ(map.remove(usual.get()), 0);
     EXPECT_EQ(map.find(usual.get()), -1);
+}
+
+// Records of several classes have the key of their common superclass.
+TEST(AssociationMap, FindsEndsOfClassesThatShareTheirKeys)
+{
+    Instance_Map map(&NVRHBA_RecordAppliesToElement::meta);
+    for (int i = 0; i < 300; i++) {
+        const std::string id = std::to_string(i);
+        ASSERT_EQ(map.insert(i % 2 ? applies<NVRHBA_DiagnosticServiceRecord>(id)
+                                   : applies<NVRHBA_DiagnosticCompletionRecord>(id)),
+                  i);
+    }
+    for (int i = 0; i < 300; i++) {
+        // The other class's instance with the same key is the same to key_eq.
+        const Ref<Instance> key(applies<NVRHBA_DiagnosticServiceRecord>(std::to_string(i)));
+        EXPECT_EQ(map.find(key.get()), i);
+    }
 }
 
 TEST(AssociationMap, TwoNullEndsAgreeAndOneDoesNot)

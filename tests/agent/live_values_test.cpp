@@ -221,9 +221,18 @@ TEST_F(LiveValues, AFailingParameterListLeavesTheValuesAndSaysSo)
                               "ERROR: nvrcimGetDriverParamsGlobal: RM_GetDriverParamsGlobal call failed (b) (2)"}));
 }
 
-TEST_F(LiveValues, AListThatIsNeverLongEnoughIsAskedForTwice)
+TEST_F(LiveValues, ANeedOfAllMemoryIsNotAskedFor)
 {
     fault("call = \"RM_GetDriverParamsGlobal\", status = 191, value = 4294967295");
+    const uint64 before = nvrsim_calls("RM_GetDriverParamsGlobal");
+    EXPECT_EQ(global(), "30");
+    EXPECT_EQ(nvrsim_calls("RM_GetDriverParamsGlobal") - before, 1u);
+    EXPECT_THAT(words(), Contains("ERROR: nvrcimGetDriverParamsGlobal: Unable to allocate buffer"));
+}
+
+TEST_F(LiveValues, AListThatIsNeverLongEnoughIsAskedForTwice)
+{
+    fault("call = \"RM_GetDriverParamsGlobal\", status = 191, value = 60");
     const uint64 before = nvrsim_calls("RM_GetDriverParamsGlobal");
     EXPECT_EQ(global(), "30");
     EXPECT_EQ(nvrsim_calls("RM_GetDriverParamsGlobal") - before, 2u);

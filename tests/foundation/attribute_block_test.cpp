@@ -249,13 +249,19 @@ TEST(AskAgain, BelievesNoCount)
         return 0u;
     });
     EXPECT_EQ(records.size(), 2u) << "no more than there was room for";
-    asked = ask_again(records, 2, 100, [](Record*, uint32* count) {
-        if (*count == 2) {
-            *count = 0xFFFFFFFF;
+    for (const uint32 need : {101u, 0xFFFFFFFFu}) {
+        asked = ask_again(records, 2, 100, [need](Record*, uint32* count) {
+            *count = need;
             return 7u;
-        }
-        EXPECT_EQ(*count, 100u);
-        return 0u;
+        });
+        EXPECT_EQ(asked.status, 7u);
+        EXPECT_EQ(asked.calls, 1) << "a need beyond the limit is not asked for";
+        EXPECT_TRUE(records.empty());
+    }
+    asked = ask_again(records, 2, 100, [](Record*, uint32* count) {
+        const bool first = *count == 2;
+        *count = 100;
+        return first ? 7u : 0u;
     });
     EXPECT_EQ(records.size(), 100u);
     asked = ask_again(records, 2, 100, [](Record*, uint32* count) {

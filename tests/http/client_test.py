@@ -17,7 +17,7 @@ import unittest
 NVRCIM, NVRSIMCTL, SCENARIO = sys.argv.pop(1), sys.argv.pop(1), sys.argv.pop(1)
 NAMESPACE = "root/norvane"
 # The module keeps its settings in /etc when it goes.
-PRIVATE = ["sh", os.path.join(os.path.dirname(os.path.abspath(__file__)), "../support/private_etc.sh"), NVRCIM]
+PRIVATE = ["sh", os.path.join(os.path.dirname(os.path.abspath(__file__)), "../../scripts/private_etc.sh"), NVRCIM]
 
 
 def setUpModule():  # pylint: disable=invalid-name

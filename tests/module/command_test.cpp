@@ -129,6 +129,17 @@ TEST(Command, WritesTheGraphOfASmallHost)
     EXPECT_THAT(graph, HasSubstr("  port2 -> target3 [tailport=e, headport=w, color=\"#0072b2\"]\n"));
 }
 
+TEST(Command, DrawsTheGraphAsAPicture)
+{
+    for (const auto& [ending, start] : {std::pair<std::string, std::string>{".svg", "<?xml"}, {".png", "\x89PNG"}}) {
+        const std::string file = testing::TempDir() + "norvane_graph" + ending;
+        const Ended_Command run = nvrcim("graph " + file);
+        EXPECT_EQ(run.status, 0) << run.output;
+        EXPECT_EQ(read_file(file).substr(0, start.size()), start);
+        std::remove(file.c_str());
+    }
+}
+
 TEST(Command, SaysThatGraphvizIsMissing)
 {
     const Ended_Command run = nvrcim("graph picture.svg", "small", "PATH=/nowhere");

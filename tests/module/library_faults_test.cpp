@@ -13,8 +13,8 @@
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
-#include "tests/support/simulator.h"
 #include "tests/module/support/Test_Clock.h"
+#include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
 using namespace nvrtest;
@@ -30,6 +30,8 @@ constexpr char sound_host[] = "typical";
 constexpr char small_host[] = R"(
 [[adapter]]
 [[adapter]]
+[[adapter.port]]
+[[adapter.port.vport]]
 [[target]]
 luns = 2
 )";
@@ -104,6 +106,7 @@ const char* const faulty_calls[] = {
     "RM_DiagGetLoadListParams",
     "RM_IsLocalHBA",
     "RM_VPList",
+    "RM_VPGetAttributes",
     "RM_GetDumpDirectoryA",
     "RM_GetDumpRetentionCount",
 };

@@ -6,8 +6,8 @@
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Rig.h"
-#include "tests/support/simulator.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using testing::Contains;

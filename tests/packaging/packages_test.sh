@@ -36,7 +36,7 @@ dpkg-deb -I "$provider" postinst | grep -q 'register register || true' || fail "
 dpkg-deb -I "$provider" prerm | grep -q 'register unregister || true' || fail "prerm"
 
 # Nothing of the build tree may be needed: the programs find their own files.
-ports=$(sh "$here/../support/private_etc.sh" root/usr/bin/nvrcim --scenario root/usr/share/norvane-fc-provider/scenarios/typical.toml enum NVRHBA_FCPort)
+ports=$(sh "$here/../../scripts/private_etc.sh" root/usr/bin/nvrcim --scenario root/usr/share/norvane-fc-provider/scenarios/typical.toml enum NVRHBA_FCPort)
 [ "$(echo "$ports" | wc -l)" -eq 5 ] || fail "the installed nvrcim says: $ports"
 classes=$(root/usr/sbin/norvane-provider-register list | wc -l)
 [ "$classes" -eq 141 ] || fail "$classes classes are listed"

@@ -7,9 +7,9 @@
 #include <thread>
 #include <unistd.h>
 
-#include "tests/support/simulator.h"
 #include "tests/module/support/Test_Clock.h"
 #include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
 
 namespace nvrtest {
 
