@@ -26,22 +26,22 @@ bool ends_with(const std::string& text, const std::string& end)
 
 void Modules::add(const Registration& registration)
 {
-    std::lock_guard lock(m_mutex);
-    const bool by_class = m_broker.manner().factories_by_class;
-    Provider* provider = nullptr;
-    for (const Served_Class& served : m_served) {
-        bool same = same_name(served.registration.provider, registration.provider) &&
-                    served.registration.module == registration.module &&
-                    (!by_class || same_name(served.registration.class_name, registration.class_name));
-        if (same) provider = served.provider;
+    Provider* known = nullptr;
+    {
+        std::lock_guard lock(m_mutex);
+        const bool by_class = m_broker.manner().factories_by_class;
+        for (const Served_Class& served : m_served) {
+            bool same = same_name(served.registration.provider, registration.provider) &&
+                        served.registration.module == registration.module &&
+                        (!by_class || same_name(served.registration.class_name, registration.class_name));
+            if (same) known = served.provider;
+        }
+        if (!known) m_providers.push_back(std::make_unique<Provider>(m_broker, registration));
+        Provider* const provider = known ? known : m_providers.back().get();
+        m_served.push_back({registration, m_broker.schema().find(registration.class_name), provider});
     }
-    if (provider) {
-        provider->join(registration);
-    } else {
-        m_providers.push_back(std::make_unique<Provider>(m_broker, registration));
-        provider = m_providers.back().get();
-    }
-    m_served.push_back({registration, m_broker.schema().find(registration.class_name), provider});
+    // Without the lock: a provider holds its own while its module is called, which may ask for what is registered.
+    if (known) known->join(registration);
 }
 
 std::size_t Modules::add_module(const std::string& file, const std::string& name_space, std::string* error)
