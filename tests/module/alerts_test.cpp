@@ -317,35 +317,6 @@ TEST(AlertsOfOneServer, WithoutAContextForAThreadTheyCannotBeEnabled)
     });
 }
 
-// The leak sanitizer cannot stop threads that are still running at exit, and what they hold is no leak.
-static bool exits_with_threads = false;
-extern "C" __attribute__((visibility("default"))) int __lsan_is_turned_off();
-int __lsan_is_turned_off()
-{
-    return exits_with_threads;
-}
-
-// A server's process for the module may end without a disable or a clean-up.
-TEST(AlertsOfOneServer, AnExitWhileAlertsAreOnIsClean)
-{
-    Rig rig;
-    const pid_t child = fork();
-    if (child == 0) {
-        exits_with_threads = true;
-        auto* sink = new Sink;
-        subscribe(rig, *sink);
-        nvrsim_link(first_port, 0);
-        sink->wait_for(1);
-        for (int i = 0; i < 1000; i++) // and some under way
-            nvrsim_event(first_port, link_up, 0);
-        std::exit(0);
-    }
-    int status = -1;
-    ASSERT_EQ(waitpid(child, &status, 0), child);
-    EXPECT_TRUE(WIFEXITED(status)) << "ended by signal " << WTERMSIG(status);
-    EXPECT_EQ(WEXITSTATUS(status), 0);
-}
-
 TEST(AlertsOfOneServer, ABurstWithSubscriptionsComingAndGoing)
 {
     Rig rig;

@@ -1,4 +1,5 @@
 // Servers that never clean up: their processes exit while the agent lives and threads of the module run.
+#include <atomic>
 #include <chrono>
 #include <cstdlib>
 #include <functional>
@@ -10,6 +11,8 @@
 
 #include <gmock/gmock.h>
 
+#include "foundation/management_api.h"
+#include "simulator/nvrsim.h"
 #include "tests/module/support/Rig.h"
 #include "tests/module/support/Test_Clock.h"
 #include "tests/support/private_host.h"
@@ -212,6 +215,27 @@ TEST(Exit, WithFilesThatCannotBeWrittenIsClean)
     EXPECT_FALSE(exists(ended.guard));
     remove(conf_path);
     remove(dmp_path);
+}
+
+TEST(Exit, WhileAlertsAreOnIsClean)
+{
+    const Ended ended = exit_after([] {
+        constexpr char port[] = "10000000C9A00001";
+        static std::atomic<int> delivered{0};
+        Rig& rig = lasting_rig({});
+        int id = 0;
+        demand(rig.server()
+                   .subscribe(
+                       "root/norvane", "NVRHBA_AlertIndication", [](const host::Indication&) { delivered++; }, id)
+                   .ok());
+        rig.server().settle();
+        nvrsim_link(port, 0);
+        while (delivered == 0)
+            std::this_thread::sleep_for(std::chrono::milliseconds(1));
+        for (int i = 0; i < 1000; i++) // and some under way
+            nvrsim_event(port, HBA_EVENT_PORT_ONLINE, 0);
+    });
+    EXPECT_EQ(ended.status, 0);
 }
 
 // The request's threads meet the exit at any point, also within the logger and the agent's own end.
