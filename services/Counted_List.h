@@ -1,83 +1,60 @@
-/// A list as the library fills it: a count word, `head` bytes up to its records, and room for some of them.
+/// A list that the library is asked for: with room for one entry, and once more with room for as many as it then says.
 ///
 /// A value of one thread. The library's count is not believed beyond the room that it had.
 #pragma once
 
-#include <algorithm>
-#include <cstring>
 #include <new>
+#include <optional>
 #include <vector>
 
+#include "foundation/Library_List.h"
 #include "foundation/management_api.h"
-#include "runtime/Type.h"
 
 namespace cimple {
 
+template <class List>
 class Counted_List {
 public:
-    Counted_List(std::size_t head, std::size_t record) : m_head(head), m_record(record) {}
+    using Entry = typename Library_List<List>::Entry;
 
-    /// Asks with room for one record, and once more, with as much as the library then says, after status 7. False
-    /// without memory, which is also that for a need of more than 16 MiB.
+    /// Asks, and asks again after status 7. False without memory for the entries, when nothing else may be called.
     template <class Ask>
     bool fill(Ask ask)
     {
         if (!give(1)) return false;
-        status = ask(m_bytes.data());
+        status = ask(m_list->get());
         if (status != RM_STATUS_MORE_DATA) return true;
         if (!give(count())) return false;
-        status = ask(m_bytes.data());
+        status = ask(m_list->get());
         return true;
     }
 
     uint32 status = RM_STATUS_ERROR;
 
     /// As the library left it.
-    uint32 count() const
-    {
-        uint32 count = 0;
-        std::memcpy(&count, m_bytes.data(), sizeof count);
-        return count;
-    }
-    /// How many records were counted and had room.
-    uint32 size() const { return std::min(count(), m_room); }
-    /// One of them.
-    template <class Record>
-    Record record(uint32 index) const
-    {
-        Record one;
-        std::memcpy(&one, m_bytes.data() + m_head + std::size_t{index} * sizeof one, sizeof one);
-        return one;
-    }
+    uint32 count() const { return m_list->get()->count; }
+    /// How many entries were counted and had room.
+    uint32 size() const { return m_list->size(); }
+    const Entry& operator[](uint32 index) const { return (*m_list)[index]; }
     /// All of them. Throws std::bad_alloc.
-    template <class Record>
-    std::vector<Record> records() const
+    std::vector<Entry> entries() const
     {
-        std::vector<Record> all(size());
-        if (!all.empty()) std::memcpy(all.data(), m_bytes.data() + m_head, all.size() * sizeof(Record));
-        return all;
+        return size() ? std::vector<Entry>(&(*this)[0], &(*this)[0] + size()) : std::vector<Entry>();
     }
 
 private:
     bool give(uint32 room)
     {
-        constexpr uint64 most_bytes = 16 * 1024 * 1024;
-        const uint64 size = m_head + uint64(m_record) * room;
-        if (size > most_bytes) return false;
         try {
-            m_bytes.assign(size, 0);
+            m_list.emplace(room);
         } catch (const std::bad_alloc&) {
             return false;
         }
-        m_room = room;
-        std::memcpy(m_bytes.data(), &room, sizeof room);
+        m_list->get()->count = room;
         return true;
     }
 
-    const std::size_t m_head;
-    const std::size_t m_record;
-    uint32 m_room = 0;
-    std::vector<unsigned char> m_bytes;
+    std::optional<Library_List<List>> m_list;
 };
 
 } // namespace cimple

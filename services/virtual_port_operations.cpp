@@ -49,7 +49,7 @@ int NVR_MethodWrapper::ListVPorts(const HBA_WWN& port, VPort_List* list)
         NVR_LOG("Invalid input pointer");
         return status_null;
     }
-    Counted_List found(offsetof(RM_VPORTLIST, entry), sizeof(RM_VPORTENTRY));
+    Counted_List<RM_VPORTLIST> found;
     if (!found.fill([&](void* room) { return RM_VPList(port, room); })) {
         NVR_LOG("FMCMD_ListVPorts: Unable to allocate buffer");
         return status_failed;
@@ -59,7 +59,7 @@ int NVR_MethodWrapper::ListVPorts(const HBA_WWN& port, VPort_List* list)
         return status_failed;
     }
     list->count = found.count();
-    list->entries = found.records<RM_VPORTENTRY>();
+    list->entries = found.entries();
     NVR_LOG("Exit the ListVPorts method");
     return 0;
 }
@@ -88,7 +88,7 @@ int NVR_MethodWrapper::ListVPortAttributes(const HBA_WWN& port, const HBA_WWN& v
 int NVR_MethodWrapper::ListVPortTargets(const HBA_WWN& port, const HBA_WWN& vport)
 {
     if (!isLocal(port) || !isLocal(vport)) return status_failed;
-    Counted_List found(offsetof(RM_TARGETLIST, entry), sizeof(HBA_FCPSCSIENTRY));
+    Counted_List<RM_TARGETLIST> found;
     if (!found.fill([&](void* room) { return RM_VPListTargets(port, vport, room); })) {
         NVR_LOG("FMCMD_VportTargets: Unable to allocate buffer");
         return status_failed;
@@ -123,7 +123,7 @@ int NVR_MethodWrapper::ListVMfromVPort(const HBA_WWN& port, const RM_VPORTENTRY&
         std::fputs("This physical WWPN does not support virtual port mappings.\n", stdout);
         return 0;
     }
-    Counted_List found(offsetof(RM_VMLIST, entry), sizeof(RM_VMNAME));
+    Counted_List<RM_VMLIST> found;
     bool again = false;
     const bool asked = found.fill([&](void* room) {
         const uint32 answer = RM_GetVMFromVPort(vport.wwpn, room);
@@ -139,8 +139,8 @@ int NVR_MethodWrapper::ListVMfromVPort(const HBA_WWN& port, const RM_VPORTENTRY&
     }
     NVR_LOG("FMCMD_ListVMS: Status: %d", static_cast<int>(found.status));
     if (found.status != RM_STATUS_OK) return status_failed;
-    for (const RM_VMNAME& name : found.records<RM_VMNAME>())
-        machines->push_back(machineInfo(name));
+    for (uint32 i = 0; i < found.size(); i++)
+        machines->push_back(machineInfo(found[i]));
     NVR_LOG("Exit the ListVMs method");
     return 0;
 }

@@ -6,7 +6,6 @@
 #include "services/NVR_MethodWrapper.h"
 
 #include <algorithm>
-#include <cstddef>
 #include <cstring>
 
 #include "agent/Clock.h"
@@ -60,11 +59,11 @@ bool same(const HBA_WWN& a, const HBA_WWN& b)
 /// Does a virtual port of `port` bear one of the names as its WWPN? A new WWNN too is held against their WWPNs.
 bool hasVPortNamed(const HBA_WWN& port, const HBA_WWN& newWWPN, const HBA_WWN& newWWNN)
 {
-    Counted_List list(offsetof(RM_VPORTLIST, entry), sizeof(RM_VPORTENTRY));
+    Counted_List<RM_VPORTLIST> list;
     if (!list.fill([&](void* room) { return RM_VPList(port, room); })) return false;
     if (list.status != RM_STATUS_OK || list.count() == 0 || list.count() > RM_VPORT_MAX_ENTRIES) return false;
     for (uint32 i = 0; i < list.size(); i++) {
-        const HBA_WWN vport = list.record<RM_VPORTENTRY>(i).wwpn;
+        const HBA_WWN& vport = list[i].wwpn;
         if (same(vport, newWWPN) || same(vport, newWWNN)) return true;
     }
     return false;
