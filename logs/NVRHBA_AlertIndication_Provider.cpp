@@ -36,6 +36,16 @@ public:
     Spoken_Lock& operator=(const Spoken_Lock&) = delete;
 };
 
+/// This thread is within a handler: it holds m_IndicationProviderMutex, and is the worker that a clean-up would join.
+thread_local bool delivers = false;
+
+struct Delivery {
+    Delivery() { delivers = true; }
+    ~Delivery() { delivers = false; }
+    Delivery(const Delivery&) = delete;
+    Delivery& operator=(const Delivery&) = delete;
+};
+
 bool same(const Indication_Handler& a, const Indication_Handler& b)
 {
     return a.proc == b.proc && a.data == b.data;
@@ -63,6 +73,7 @@ Unload_Status NVRHBA_AlertIndication_Provider::unload()
 Enable_Indications_Status
 NVRHBA_AlertIndication_Provider::enable_indications(std::unique_ptr<Indication_Handler> handler)
 {
+    if (delivers) return ENABLE_INDICATIONS_FAILED; // it would wait for itself
     Auto_Mutex change(change_mutex);
     Auto_Mutex lock(m_IndicationProviderMutex);
     NVR_LOG("NVRHBA_AlertIndication_Provider::enable_indications()");
@@ -139,6 +150,7 @@ uint32 NVRHBA_AlertIndication_Provider::generateIndication(HBA_WWN portWWN, uint
     // A thread whose context could not be set up has no way to the server.
     if (handler && !Alert_Queue::instance().isCleanUp() && Thread_Context::top()) {
         NVR_LOG("Calling Indication handler to deliver Indication to the specified client");
+        const Delivery delivery;
         handler->handle(alert.release());
         NVR_LOG("Indication Delivered to the specified client");
     } else {
@@ -150,6 +162,7 @@ uint32 NVRHBA_AlertIndication_Provider::generateIndication(HBA_WWN portWWN, uint
 uint32 NVRHBA_AlertIndication_Provider::cleanUp()
 {
     NVR_LOG("NVRHBA_AlertIndication_Provider::cleanUp()");
+    if (delivers) return NVR_FAILURE; // it would wait for itself
     Auto_Mutex change(change_mutex);
     uint32 result;
     {

@@ -588,6 +588,25 @@ TEST_F(Alerts, WithoutAContextForTheWorkerAlertsStayOff)
     EXPECT_EQ(enable(), 0);
 }
 
+TEST_F(Alerts, ASubscriberThatDisablesOrEnablesFromWithinItsDeliveryIsRefused)
+{
+    int disabled = -1;
+    int enabled = -1;
+    client.during = [&] {
+        disabled = disable();
+        enabled = enable();
+    };
+    ASSERT_EQ(enable(), 0);
+    link("0", false);
+    client.wait_for(1);
+    EXPECT_EQ(disabled, DISABLE_INDICATIONS_FAILED);
+    EXPECT_EQ(enabled, ENABLE_INDICATIONS_FAILED);
+    link("0", true);
+    EXPECT_THAT(client.wait_for(2), SizeIs(2)) << "alerts are still on";
+    EXPECT_EQ(disable(), 0);
+    EXPECT_EQ(client.stops, 1);
+}
+
 TEST_F(Alerts, ADeliveryThatThrowsCostsOnlyItself)
 {
     bool throws = true;
