@@ -3,6 +3,7 @@
 
 #include <benchmark/benchmark.h>
 
+#include "bench/Heap_Window.h"
 #include "classes/NVRHBA_FCPort.h"
 #include "cmpi/Converter.h"
 #include "host/Host.h"
@@ -69,20 +70,31 @@ NVRHBA_FCPort* make_port()
     return port;
 }
 
+/// A new instance of the server's for the port, which the caller holds.
+void convert(const CMPIBroker* broker, const Instance* port, Made<CMPIObjectPath>& path, Made<CMPIInstance>& instance)
+{
+    make_cmpi_object_path(broker, port, name_space, path);
+    make_CMPI_instance(broker, port, name_space, path.get(), nullptr, instance);
+    if (!instance.get()) throw std::runtime_error("no instance came out");
+}
+
 void to_server(benchmark::State& state)
 {
     host::Host server(nvrtest::module_schema());
     const Instance* port = make_port();
+    const auto once = [&](const CMPIBroker* broker) {
+        Made<CMPIObjectPath> path;
+        Made<CMPIInstance> instance;
+        convert(broker, port, path, instance);
+    };
     while (state.KeepRunningBatch(batch))
         server.on_request_thread([&](const CMPIBroker* broker, const CMPIContext*) {
-            for (std::size_t i = 0; i < batch; i++) {
-                Made<CMPIObjectPath> path;
-                Made<CMPIInstance> instance;
-                make_cmpi_object_path(broker, port, name_space, path);
-                make_CMPI_instance(broker, port, name_space, path.get(), nullptr, instance);
-                if (!instance.get()) throw std::runtime_error("no instance came out");
-            }
+            for (std::size_t i = 0; i < batch; i++)
+                once(broker);
         });
+    server.on_request_thread([&](const CMPIBroker* broker, const CMPIContext*) {
+        state.counters["peak_kB"] = nvrbench::peak_kilobytes_of([&] { once(broker); });
+    });
     unref(port);
 }
 
@@ -90,19 +102,25 @@ void from_server(benchmark::State& state)
 {
     host::Host server(nvrtest::module_schema());
     const Instance* port = make_port();
-    while (state.KeepRunningBatch(batch))
+    const auto with_input = [&](auto work) {
         server.on_request_thread([&](const CMPIBroker* broker, const CMPIContext*) {
             Made<CMPIObjectPath> path;
             Made<CMPIInstance> instance;
-            make_cmpi_object_path(broker, port, name_space, path);
-            make_CMPI_instance(broker, port, name_space, path.get(), nullptr, instance);
-            for (std::size_t i = 0; i < batch; i++) {
+            convert(broker, port, path, instance);
+            work([&] {
                 Instance* out = nullptr;
                 make_cimple_instance(broker, &NVRHBA_FCPort::meta, path.get(), instance.get(), out);
                 if (!out) throw std::runtime_error("no instance came out");
                 unref(out);
-            }
+            });
         });
+    };
+    while (state.KeepRunningBatch(batch))
+        with_input([](auto once) {
+            for (std::size_t i = 0; i < batch; i++)
+                once();
+        });
+    with_input([&](auto once) { state.counters["peak_kB"] = nvrbench::peak_kilobytes_of(once); });
     unref(port);
 }
 

@@ -5,6 +5,7 @@
 #include <benchmark/benchmark.h>
 
 #include "bench/Bench_Host.h"
+#include "bench/Heap_Window.h"
 #include "tests/module/support/Rig.h"
 
 namespace {
@@ -23,6 +24,7 @@ void ask(benchmark::State& state, host::Host& server)
     }
     state.counters["per_instance"] = benchmark::Counter(
         static_cast<double>(ports), benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
+    state.counters["peak_kB"] = nvrbench::peak_kilobytes_of([&] { (void)server.enumerate(name_space, port_class); });
     state.counters["properties"] = static_cast<double>(properties);
 }
 
@@ -37,7 +39,7 @@ void enumerate_floor(benchmark::State& state)
 {
     void* library = dlopen(NVR_FLOOR, RTLD_NOW | RTLD_LOCAL);
     if (!library) throw std::runtime_error(dlerror());
-    const auto set_ports = reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_ports"));
+    const auto set_ports = reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_instances"));
     set_ports(static_cast<unsigned>(state.range(0)));
     {
         host::Host server(nvrtest::module_schema());

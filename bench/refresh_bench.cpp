@@ -7,6 +7,7 @@
 #include <benchmark/benchmark.h>
 
 #include "bench/Bench_Host.h"
+#include "bench/Heap_Window.h"
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Test_Clock.h"
 
@@ -56,12 +57,20 @@ void refresh(benchmark::State& state)
     (void)host.enumerate(witness);
     unsigned round = 0;
     std::uint64_t calls = nvrsim_calls(nullptr);
-    for (auto _ : state) {
+    const auto once = [&] {
         const std::string name = "host" + std::to_string(++round);
         rename_host(host.server(), name);
-        state.SetIterationTime(seconds_of_a_refresh(host, name));
-    }
+        return seconds_of_a_refresh(host, name);
+    };
+    for (auto _ : state)
+        state.SetIterationTime(once());
     calls = nvrsim_calls(nullptr) - calls;
+    {
+        const nvrbench::Heap_Window window;
+        (void)once();
+        state.counters["peak_kB"] = window.peak_kilobytes();
+        state.counters["kept_kB"] = window.held_kilobytes();
+    }
     state.counters["library_calls"] = static_cast<double>(calls) / static_cast<double>(state.iterations());
     state.counters["per_port"] =
         benchmark::Counter(static_cast<double>(state.range(0)),

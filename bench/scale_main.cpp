@@ -187,12 +187,11 @@ void measure_lookups(nvrbench::Bench_Host& host, const Point& point, Figures& fi
 
 void measure_floor(const Point& point, Figures& figures)
 {
-    void* library = dlopen(NVR_FLOOR_VOLUMES, RTLD_NOW | RTLD_LOCAL);
+    void* library = dlopen(NVR_FLOOR, RTLD_NOW | RTLD_LOCAL);
     if (!library) throw std::runtime_error(dlerror());
-    reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_volumes"))(point.paths());
+    reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_instances"))(point.paths());
     host::Host server(nvrtest::module_schema());
-    server.add(
-        {volume_class, "NVRHBA_StorageVolume_Provider", NVR_FLOOR_VOLUMES, host::instance_kind, {name_space}, false});
+    server.add({volume_class, "NVRHBA_StorageVolume_Provider", NVR_FLOOR, host::instance_kind, {name_space}, false});
     measure_enumerations(server, point, "_floor", figures);
 }
 
