@@ -4,6 +4,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <pthread.h>
+#include <thread>
 #include <unistd.h>
 
 #include "agent/Clock.h"
@@ -138,6 +139,15 @@ void SimulatedHost::settle()
 {
     while (agent().m_bDataFetchRunning || m_fetching + fetches(log->words()) > 0)
         usleep(1000);
+}
+
+void SimulatedHost::awaitWord(const std::string& word) const
+{
+    while (true) {
+        const std::vector<std::string> said = log->words();
+        if (std::find(said.begin(), said.end(), word) != said.end()) return;
+        std::this_thread::yield();
+    }
 }
 
 void SimulatedHost::refresh()

@@ -65,6 +65,9 @@ protected:
     /// The log's words so far, and forgets them.
     std::vector<std::string> words();
 
+    /// Waits, as a thread beside the one that does, until the log has this word.
+    void awaitWord(const std::string& word) const;
+
     /// The end of an agent takes all loggers off: puts the capture back, for the next one.
     void listenAgain();
 

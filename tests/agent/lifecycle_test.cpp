@@ -17,6 +17,9 @@ namespace {
 
 class Lifecycle : public SimulatedHost {};
 
+/// Said by a last release before it waits for a refresh.
+constexpr const char* joining = "PERF: Clearing the previous thread...with join";
+
 std::string guard_name()
 {
     return "/dev/shm/sem.NVR_RM_INIT_LIB_" + std::to_string(getpid());
@@ -142,21 +145,26 @@ TEST_F(Lifecycle, TheLastReleaseWaitsForARunningRefresh)
     ASSERT_EQ(load(), 0);
     agent().BuildCimpleInfo();
     unload();
-    EXPECT_THAT(words(), contains_in_order({"PERF: Clearing the previous thread...with join",
-                                            "PERF: DataFetch_Handler Thread END",
+    EXPECT_THAT(words(), contains_in_order({joining, "PERF: DataFetch_Handler Thread END",
                                             "Entering the function ~ProviderAgent()", "Norvane Provider Unloaded"}));
 }
 
 TEST_F(Lifecycle, ALoadDuringTheLastReleaseKeepsTheAgent)
 {
-    fault("call = \"HBA_GetAdapterAttributes\", delay_ms = 300");
+    std::atomic<bool> goes_on{false};
+    on_driver_log = [&](ProviderAgent&) {
+        while (!goes_on)
+            std::this_thread::yield();
+    };
     ASSERT_EQ(load(), 0);
     agent().BuildCimpleInfo();
     ProviderAgent* before = &agent();
     std::thread last([this] { unload(); });
-    usleep(100000);
-    ASSERT_EQ(load(), 0); // not held up by the release that waits
+    awaitWord(joining);
+    const int loaded = load(); // not held up by the release that waits
+    goes_on = true;
     last.join();
+    ASSERT_EQ(loaded, 0);
     EXPECT_EQ(&agent(), before);
     EXPECT_THAT(words(), Not(Contains("Entering the function ~ProviderAgent()")));
     EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
@@ -166,8 +174,8 @@ TEST_F(Lifecycle, ALoadDuringTheLastReleaseKeepsTheAgent)
 
 TEST_F(Lifecycle, AnUpCallThatLoadsAProviderDuringTheLastReleaseIsNotHeldUp)
 {
-    on_driver_log = [](ProviderAgent&) {
-        usleep(100000); // the last release waits for this thread by now
+    on_driver_log = [this](ProviderAgent&) {
+        awaitWord(joining); // the last release waits for this thread by now
         EXPECT_EQ(ProviderAgent::load(), 0);
         ProviderAgent::unload();
     };

@@ -140,13 +140,14 @@ TEST_F(Refresh, AnEnumerationDuringARefreshStartsNothing)
 TEST_F(Refresh, ARequestDuringTheAdapterPhaseIsServedBeforeTheThreadEnds)
 {
     plain(agent().m_NVRHBA_FCPort_map);
+    words();
     fault("call = \"HBA_GetAdapterAttributes\", delay_ms = 200, times = 1");
     agent().m_bAdapterRefreshPending.ask();
     agent().BuildCimpleInfo();
-    usleep(100000); // inside the library's call
+    awaitWord(building_adapters);
     agent().m_bAdapterRefreshPending.ask();
     settle();
-    EXPECT_EQ(count(words(), building_adapters), 1 + 2); // the first refresh, this one, and what was asked meanwhile
+    EXPECT_EQ(count(words(), building_adapters), 2); // this one, and what was asked meanwhile
     EXPECT_FALSE(agent().m_bAdapterRefreshPending);
 }
 
@@ -202,8 +203,11 @@ TEST_F(Refresh, AnExceptionInAnUpdateRaisesTheFlagsAndTheNextRefreshRecovers)
 
 TEST_F(Refresh, AThreadThatIsEndedInsideARefreshLeavesNobodyWaiting)
 {
-    on_driver_log = [](ProviderAgent&) {
-        usleep(50000); // the client holds the mutex of the data by now, and waits for the maps
+    on_driver_log = [](ProviderAgent& held) {
+        while (held.m_AdapterDataReadyMutex.try_lock() == 0) { // until the client has it, and waits for the maps
+            held.m_AdapterDataReadyMutex.unlock();
+            std::this_thread::yield();
+        }
         pthread_exit(nullptr);
     };
     Instances all;
