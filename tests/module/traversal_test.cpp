@@ -1,16 +1,17 @@
 // Traversals of every association class, from the instances that the class itself enumerates: which far ends and which
 // associations a client is told, under each combination of role, result role and result class.
 #include <algorithm>
-#include <fcntl.h>
 #include <memory>
+#include <set>
 #include <string>
-#include <unistd.h>
 #include <vector>
 
 #include <gmock/gmock.h>
 
 #include "tests/module/support/Expected.h"
 #include "tests/module/support/Instance_Text.h"
+#include "tests/module/support/Quiet_Output.h"
+#include "tests/module/support/Records.h"
 #include "tests/module/support/Rig.h"
 #include "tests/support/private_host.h"
 
@@ -20,21 +21,6 @@ using testing::IsEmpty;
 namespace {
 
 constexpr char smis_path[] = "/etc/nvr_smis.conf";
-
-/// The answer to a question that the bridge tells of on standard output, which here would be a hundred thousand lines.
-template <class Question>
-host::Answer quietly(const Question& question)
-{
-    std::fflush(stdout);
-    const int output = ::dup(STDOUT_FILENO), nowhere = ::open("/dev/null", O_WRONLY | O_CLOEXEC);
-    ::dup2(nowhere, STDOUT_FILENO);
-    const host::Answer answer = question();
-    std::fflush(stdout);
-    ::dup2(output, STDOUT_FILENO);
-    ::close(output);
-    ::close(nowhere);
-    return answer;
-}
 
 struct Filter {
     std::string result_class, role, result_role;
@@ -241,17 +227,14 @@ public:
 private:
     host::Answer associators(const host::Path& source, const Filter& filter)
     {
-        return quietly([&] {
-            return m_server.associators(source, m_association.name, filter.result_class, filter.role,
-                                        filter.result_role);
-        });
+        const Quiet_Output quiet;
+        return m_server.associators(source, m_association.name, filter.result_class, filter.role, filter.result_role);
     }
     host::Answer associator_names(const host::Path& source, const Filter& filter)
     {
-        return quietly([&] {
-            return m_server.associator_names(source, m_association.name, filter.result_class, filter.role,
-                                             filter.result_role);
-        });
+        const Quiet_Output quiet;
+        return m_server.associator_names(source, m_association.name, filter.result_class, filter.role,
+                                         filter.result_role);
     }
     void expect_same(const std::vector<host::Instance>& found, const std::vector<host::Instance>& wanted,
                      const std::string& what)
@@ -270,8 +253,11 @@ std::size_t check(Rig& rig, const std::string& name)
     const host::Schema& schema = rig.server().schema();
     Traversal_Check check(rig, association);
     EXPECT_GE(association.ends.size(), 2u) << name;
-    for (const host::Element_Record* end : association.ends)
-        check.nothing(nobody(schema, end->reference_class));
+    for (const host::Element_Record* end : association.ends) {
+        // Without keys it would agree with every object of a subclass.
+        const host::Path stranger = nobody(schema, end->reference_class);
+        if (!stranger.keys.empty()) check.nothing(stranger);
+    }
     if (association.instances.empty()) return 0;
 
     const host::Instance& first = association.instances.front();
@@ -304,7 +290,7 @@ std::size_t check(Rig& rig, const std::string& name)
 
 class Traversals : public Every_Manner {
 protected:
-    // What else makes instances: a web launcher, and a profile that other providers register.
+    // What else makes instances: a web launcher, a profile that other providers register, and the module's use.
     Traversals()
     {
         write_file(smis_path, "https://storage1.norvane.test:8443/launch\n");
@@ -315,6 +301,7 @@ protected:
         base.set("InstanceID", host::Value::string("other:1"));
         base.set("RegisteredName", host::Value::string("Base Server"));
         rig->server().add_instance(base);
+        leave_records(*rig);
     }
     ~Traversals() override { nvrtest::remove(smis_path); }
 
@@ -337,12 +324,14 @@ TEST_P(Traversals, BeginAtTheInstancesThatNeighboursMake)
 
 TEST_P(Traversals, OfEveryAssociationClassFindWhatItsInstancesSay)
 {
+    // Nothing makes instances of these: three have no builder, and the provider's log takes no record.
+    const std::set<std::string> empty = {"NVRHBA_ChassisContainsCard", "NVRHBA_HostedService",
+                                         "NVRHBA_RecordLogManagesRecord", "NVRHBA_VMSystemDevice"};
     std::size_t classes = 0;
     for (const auto& row : expected_rows("providers.txt")) {
         if (row.at(1) != "association") continue;
         classes++;
-        const bool is_empty = lines_of_class(typical + neighbours, row[0]).empty();
-        EXPECT_EQ(check(*rig, row[0]) == 0, is_empty) << row[0];
+        EXPECT_EQ(check(*rig, row[0]) == 0, empty.count(row[0]) == 1) << row[0];
     }
     EXPECT_EQ(classes, 91u);
     EXPECT_THAT(rig->server().report().violations, IsEmpty());
