@@ -6,6 +6,8 @@
 #include "classes/NVRHBA_StorageVolume.h"
 #include "classes/derivedObjects/Derived_Provider.h"
 #include "services/NVRHBA_BootBIOSService_Provider.h"
+#include "services/NVRHBA_DriverParamGlobal_Provider.h"
+#include "services/NVRHBA_DriverParams_Provider.h"
 #include "services/NVRHBA_DumpData_Provider.h"
 #include "services/NVRHBA_FCPort_Provider.h"
 #include "simulator/nvrsim.h"
@@ -133,15 +135,25 @@ TEST_F(Providers, RefusedLoadsAnswer30AndTheActiveOnesSayWhy)
     install({});
     NVRHBA_FCPort_Provider ports;
     NVRHBA_FCPortStatistics_Provider statistics;
+    NVRHBA_DriverParams_Provider params;
+    NVRHBA_DriverParamGlobal_Provider global_params;
     EXPECT_EQ(ports.load(), 30);
     EXPECT_EQ(statistics.load(), 30);
+    EXPECT_EQ(params.load(), 30);
+    EXPECT_EQ(global_params.load(), 30);
     words();
     EXPECT_TRUE(enumerate(ports).empty());
     EXPECT_TRUE(enumerate(statistics).empty());
+    EXPECT_TRUE(enumerate(params).empty());
+    EXPECT_TRUE(enumerate(global_params).empty());
     EXPECT_EQ(words(), (std::vector<std::string>{"RM Init failed for services/NVRHBA_FCPort_Provider.cpp",
-                                                 "RM Init failed for agent/NVRHBA_FCPortStatistics_Provider.cpp"}));
+                                                 "RM Init failed for agent/NVRHBA_FCPortStatistics_Provider.cpp",
+                                                 "RM Init failed for services/NVRHBA_DriverParams_Provider.cpp",
+                                                 "RM Init failed for services/NVRHBA_DriverParamGlobal_Provider.cpp"}));
     ports.unload();
     statistics.unload();
+    params.unload();
+    global_params.unload();
     EXPECT_THAT(words(), Contains("Norvane Provider Unloaded"));
 }
 
