@@ -316,7 +316,7 @@ private:
     static void markFetchThread();
 
     bool startFetchThread();
-    void raiseReadyFlags();
+    void raiseAdapterFlags();
     bool hasFetchThread();
     void joinFetchThread(); // holds no lock while it waits
     void fetchData();

@@ -13,14 +13,19 @@ namespace {
 
 constexpr uint32 usec_per_minute = 60000000;
 
+/// Under the flag's mutex.
+void raise(std::atomic<bool>& ready, Cond& condition)
+{
+    ready = true;
+    condition.broadcast();
+}
+
 /// Asks before it locks: who waits for the maps holds the mutex of the data, whose flag it has seen up.
 void raise(std::atomic<bool>& ready, Mutex& mutex, Cond& condition)
 {
     if (ready) return;
     Auto_Mutex lock(mutex);
-    if (ready) return;
-    ready = true;
-    condition.broadcast();
+    raise(ready, condition);
 }
 
 /// Counts a waiting thread, also one that is cancelled while it waits.
@@ -75,7 +80,13 @@ int ProviderAgent::BuildCimpleInfo()
         started = startFetchThread();
     }
     if (!started) {
-        raiseReadyFlags();
+        raiseAdapterFlags();
+        // The caller may hold m_DataMutex, which comes behind this one: who has it now and waits for the maps sees that
+        // no thread runs, and raises the flag itself.
+        if (m_SANMapsReadyMutex.try_lock() == 0) {
+            raise(m_bIsSANMapsReady, m_SANMapsReadyCond);
+            m_SANMapsReadyMutex.unlock();
+        }
         return 0;
     }
     NVR_LOG("PERF: ---Created DataFetch_Handler thread -- BuildCimpleInfo END---");
@@ -101,11 +112,10 @@ bool ProviderAgent::startFetchThread()
 }
 
 /// For what no thread will raise: so that no caller waits for ever. The maps are as the last refresh left them.
-void ProviderAgent::raiseReadyFlags()
+void ProviderAgent::raiseAdapterFlags()
 {
     raise(m_bIsAdapterDataReady, m_AdapterDataReadyMutex, m_AdapterDataReadyCond);
     raise(m_bIsAdapterMapsReady, m_AdapterMapsReadyMutex, m_AdapterMapsReadyCond);
-    raise(m_bIsSANMapsReady, m_SANMapsReadyMutex, m_SANMapsReadyCond);
 }
 
 bool ProviderAgent::hasFetchThread()
@@ -139,10 +149,8 @@ void ProviderAgent::waitForSANMaps()
     }
     if (served)
         m_SANMapsReadyCond.wait(m_SANMapsReadyMutex);
-    else {
-        m_bIsSANMapsReady = true;
-        m_SANMapsReadyCond.broadcast();
-    }
+    else
+        raise(m_bIsSANMapsReady, m_SANMapsReadyCond);
 }
 
 void* ProviderAgent::DataFetch_Handler(void* argument)
@@ -179,7 +187,8 @@ void ProviderAgent::fetchData()
 void ProviderAgent::abandonFetch()
 {
     // First the flags: once the thread counts as gone, a caller that holds their mutexes may join it.
-    raiseReadyFlags();
+    raiseAdapterFlags();
+    raise(m_bIsSANMapsReady, m_SANMapsReadyMutex, m_SANMapsReadyCond);
     Auto_Mutex lock(m_DataFetchMutex);
     m_bDataFetchRunning = false;
 }

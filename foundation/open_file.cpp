@@ -26,6 +26,18 @@ File stream_of(int fd, const char* mode)
     return file;
 }
 
+/// Writes all of it; false, with errno set, once something is refused.
+bool write_all(int fd, std::string_view bytes)
+{
+    while (!bytes.empty()) {
+        const ssize_t written = ::write(fd, bytes.data(), bytes.size());
+        if (written < 0 && errno == EINTR) continue;
+        if (written <= 0) return false;
+        bytes.remove_prefix(static_cast<std::size_t>(written));
+    }
+    return true;
+}
+
 bool is_regular(const struct stat& status)
 {
     if (!S_ISREG(status.st_mode)) errno = EINVAL;
@@ -38,6 +50,21 @@ int open_for_writing(const char* path)
     const int fd = ::open(path, O_WRONLY | always);
     if (fd >= 0 || errno != ENOENT) return fd;
     return ::open(path, O_WRONLY | O_CREAT | O_EXCL | always, 0666);
+}
+
+/// The descriptor of a regular file, emptied if it is to be written; or -1.
+int open_regular(const char* path, bool writes)
+{
+    // Even to open a device can do something, so what is known to be none of ours is not opened at all.
+    if (fault_of_file(path) == EINVAL) return -1;
+
+    struct stat status;
+    const int fd = writes ? open_for_writing(path) : ::open(path, O_RDONLY | always);
+    if (fd < 0) return -1;
+    // It may have been replaced meanwhile; and it is emptied only once it is known for what it is.
+    if (::fstat(fd, &status) == 0 && is_regular(status) && (!writes || ::ftruncate(fd, 0) == 0)) return fd;
+    close_keeping_errno(fd);
+    return -1;
 }
 
 } // namespace
@@ -61,32 +88,29 @@ bool write_text(const char* path, std::string_view text)
 {
     const int fd = ::open(path, O_WRONLY | O_CREAT | O_TRUNC | always, 0666);
     if (fd < 0) return false;
-    while (!text.empty()) {
-        const ssize_t written = ::write(fd, text.data(), text.size());
-        if (written < 0 && errno == EINTR) continue;
-        if (written <= 0) break;
-        text.remove_prefix(static_cast<std::size_t>(written));
-    }
+    write_all(fd, text);
     ::close(fd);
     return true;
 }
 
 File open_regular_file(const char* path, const char* mode)
 {
-    // Even to open a device can do something, so what is known to be none of ours is not opened at all.
-    if (fault_of_file(path) == EINVAL) return nullptr;
+    const int fd = open_regular(path, mode[0] == 'w');
+    return fd < 0 ? nullptr : stream_of(fd, mode);
+}
 
+bool write_regular_file(const char* path, std::string_view bytes)
+{
+    const int fd = open_regular(path, true);
+    if (fd < 0) return false;
+    const bool written = write_all(fd, bytes);
+    const bool emptied = !written && ::ftruncate(fd, 0) == 0;
+    if (::close(fd) == 0 && written) return true;
+    // A link is not ours to remove, unless a part would be read through it.
     struct stat status;
-    const bool writes = mode[0] == 'w';
-    const int fd = writes ? open_for_writing(path) : ::open(path, O_RDONLY | always);
-    if (fd < 0) return nullptr;
-    // It may have been replaced meanwhile; and it is emptied only once it is known for what it is.
-    const bool good = ::fstat(fd, &status) == 0 && is_regular(status) && (!writes || ::ftruncate(fd, 0) == 0);
-    if (!good) {
-        close_keeping_errno(fd);
-        return nullptr;
-    }
-    return stream_of(fd, mode);
+    const bool is_link = ::lstat(path, &status) == 0 && S_ISLNK(status.st_mode);
+    if (!is_link || !emptied) ::unlink(path);
+    return false;
 }
 
 } // namespace cimple

@@ -25,6 +25,10 @@ bool write_text(const char* path, std::string_view text);
 /// a link that leads nowhere is refused (EEXIST).
 File open_regular_file(const char* path, const char* mode);
 
+/// Writes the bytes, and nothing else, to such a file; false if that cannot be done. No part of them then stays: the
+/// file is removed, or left empty behind a link.
+bool write_regular_file(const char* path, std::string_view bytes);
+
 /// 0 if such a path leads to a regular file, else why it does not: the errno of the look, EINVAL for what is no file.
 int fault_of_file(const char* path);
 

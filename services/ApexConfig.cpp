@@ -62,7 +62,6 @@ private:
 
 constexpr std::size_t most_depth = 64;
 constexpr std::size_t most_parts = 1024 * 1024; // tags and attributes; a file of the most entries has fewer
-constexpr uint32 most_entries = CPQFC_QOS_MAX_ENTRIES;
 
 /// The parser calls itself for each level and keeps a record of each part: this walks the markup as it does, but
 /// without either, and finds what would exhaust stack or memory. Bad syntax ends the walk: that is left to the parser.
@@ -237,8 +236,7 @@ const Node& numberOfEntries(const Document& document)
 Tag_Table tableFor(long entries)
 {
     try {
-        if (entries < 0 || entries > long{most_entries}) throw std::bad_alloc();
-        return makeTagTable(static_cast<uint32>(entries));
+        return makeTagTable(entries);
     } catch (const std::bad_alloc&) {
         NVR_LOG("SetConfigTable::Memory Allocation Failed ");
         throw;

@@ -114,6 +114,8 @@ public:
     ~Fetched_File() { remove(); }
 
     const std::string& path() const { return m_path; }
+    /// There is nothing to remove.
+    void isNotThere() { m_fetched = false; }
     void remove()
     {
         if (!m_fetched) return;
@@ -204,9 +206,54 @@ uint32 missing(const std::string& path)
     return answer_not_reached;
 }
 
-bool isEmpty(const Property<String>& text)
+/// The same as `refusal` for the methods that take a name, with their words for one that is missing.
+uint32 refusalOfTable(ProviderAgent& agent, const Instance* self, const Instance* target, const Property<String>& name,
+                      const char* no_name)
 {
-    return text.null || !*text.value.c_str();
+    if (const uint32 refused = refusal(agent, self, target)) return refused;
+    if (!name.null && *name.value.c_str()) return ANSWER_DONE;
+    NVR_LOG("%s", no_name);
+    return ANSWER_NULL_ARGUMENT;
+}
+
+/// What reading and setting the flag differ in.
+struct Flag_Method {
+    const char* entry;
+    const char* not_opened;
+    const char* failure;
+    const char* done;
+};
+
+constexpr Flag_Method getting = {
+    "NVRHBA_FCTagService_Provider: Inside GetGlobalFlag",
+    "NVRHBA_FCTagService_Provider::Failed to Open Adapter, Skipping GetGlobalFlag Adapter Name:",
+    "NVRHBA_FCTagService_Provider::CPQFC_QoSGetGlobalFlag Failed with Error :%d",
+    "NVRHBA_FCTagService_Provider::GetGlobalFlag Successful"};
+constexpr Flag_Method setting = {
+    "NVRHBA_FCTagService_Provider: Inside SetGlobalFlag",
+    "ERROR:NVRHBA_FCTagService_Provider::Failed to Open Adapter, Skipping SetGlobalFlag Adapter Name:",
+    "NVRHBA_FCTagService_Provider::CPQFC_QoSSetGlobalFlag Failed with Error :%d",
+    "NVRHBA_FCTagService_Provider::SetGlobalFlag Successful"};
+
+/// `call` asks the library, with the handle of the target's adapter. Result the method's return value.
+template <class Call>
+uint32 useFlag(const Flag_Method& method, const Instance* self, const Instance* target, Call call)
+{
+    ProviderAgent& agent = *ProviderAgent::GetInstance();
+    const Agent_Wait wait(agent);
+    NVR_LOG("%s", method.entry);
+    if (const uint32 refused = refusal(agent, self, target)) return refused;
+    Tag_Adapter adapter;
+    if (const uint32 failed = adapter.open(agent, target, method.not_opened)) return failed;
+    NVR_LOG("NVRHBA_FCTagService_Provider::Successfully Opened Adaptor, Adapter Handle:%d",
+            static_cast<int>(adapter.handle()));
+    if (const uint32 status = call(adapter.handle())) {
+        NVR_LOG(method.failure, static_cast<int>(status));
+        return answer_refused;
+    }
+    adapter.close();
+    NVR_LOG("%s", method.done);
+    return ANSWER_DONE;
 }
 
 } // namespace
@@ -224,50 +271,19 @@ Invoke_Method_Status NVRHBA_FCTagService_Provider::GetGlobalFlag(const NVRHBA_FC
                                                                  NVRHBA_FCPort*& Target, Property<uint32>& State,
                                                                  Property<uint32>& return_value)
 {
-    ProviderAgent& agent = *ProviderAgent::GetInstance();
-    const Agent_Wait wait(agent);
-    NVR_LOG("NVRHBA_FCTagService_Provider: Inside GetGlobalFlag");
-    if (const uint32 refused = refusal(agent, self, Target)) return answer(return_value, refused);
-    Tag_Adapter adapter;
-    if (const uint32 failed = adapter.open(agent, Target,
-                                           "NVRHBA_FCTagService_Provider::Failed to Open Adapter, "
-                                           "Skipping GetGlobalFlag Adapter Name:"))
-        return answer(return_value, failed);
-    NVR_LOG("NVRHBA_FCTagService_Provider::Successfully Opened Adaptor, Adapter Handle:%d",
-            static_cast<int>(adapter.handle()));
     uint32 flag = 0;
-    if (const uint32 status = CPQFC_QoSGetGlobalFlag(adapter.handle(), &flag)) {
-        NVR_LOG("NVRHBA_FCTagService_Provider::CPQFC_QoSGetGlobalFlag Failed with Error :%d", static_cast<int>(status));
-        return answer(return_value, answer_refused);
-    }
-    adapter.close();
-    State.set(flag);
-    NVR_LOG("NVRHBA_FCTagService_Provider::GetGlobalFlag Successful");
-    return answer(return_value, ANSWER_DONE);
+    const uint32 value =
+        useFlag(getting, self, Target, [&](uint32 handle) { return CPQFC_QoSGetGlobalFlag(handle, &flag); });
+    if (value == ANSWER_DONE) State.set(flag);
+    return answer(return_value, value);
 }
 
 Invoke_Method_Status NVRHBA_FCTagService_Provider::SetGlobalFlag(const NVRHBA_FCTagService* self,
                                                                  NVRHBA_FCPort*& Target, Property<uint32>& State,
                                                                  Property<uint32>& return_value)
 {
-    ProviderAgent& agent = *ProviderAgent::GetInstance();
-    const Agent_Wait wait(agent);
-    NVR_LOG("NVRHBA_FCTagService_Provider: Inside SetGlobalFlag");
-    if (const uint32 refused = refusal(agent, self, Target)) return answer(return_value, refused);
-    Tag_Adapter adapter;
-    if (const uint32 failed = adapter.open(agent, Target,
-                                           "ERROR:NVRHBA_FCTagService_Provider::Failed to Open Adapter, "
-                                           "Skipping SetGlobalFlag Adapter Name:"))
-        return answer(return_value, failed);
-    NVR_LOG("NVRHBA_FCTagService_Provider::Successfully Opened Adaptor, Adapter Handle:%d",
-            static_cast<int>(adapter.handle()));
-    if (const uint32 status = CPQFC_QoSSetGlobalFlag(adapter.handle(), given(State))) {
-        NVR_LOG("NVRHBA_FCTagService_Provider::CPQFC_QoSSetGlobalFlag Failed with Error :%d", static_cast<int>(status));
-        return answer(return_value, answer_refused);
-    }
-    adapter.close();
-    NVR_LOG("NVRHBA_FCTagService_Provider::SetGlobalFlag Successful");
-    return answer(return_value, ANSWER_DONE);
+    return answer(return_value, useFlag(setting, self, Target,
+                                        [&](uint32 handle) { return CPQFC_QoSSetGlobalFlag(handle, given(State)); }));
 }
 
 Invoke_Method_Status NVRHBA_FCTagService_Provider::GetConfigTable(const NVRHBA_FCTagService* self,
@@ -276,11 +292,8 @@ Invoke_Method_Status NVRHBA_FCTagService_Provider::GetConfigTable(const NVRHBA_F
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     const Agent_Wait wait(agent);
-    if (const uint32 refused = refusal(agent, self, Target)) return answer(return_value, refused);
-    if (isEmpty(URI)) {
-        NVR_LOG("Null sized URI..returning");
-        return answer(return_value, ANSWER_NULL_ARGUMENT);
-    }
+    if (const uint32 refused = refusalOfTable(agent, self, Target, URI, "Null sized URI..returning"))
+        return answer(return_value, refused);
     char id[name_size];
     copyCut(id, deviceID(Target));
     NVR_LOG("NVRHBA_FCTagService_Provider::Successfully got DeviceID,%s", id);
@@ -311,14 +324,14 @@ Invoke_Method_Status NVRHBA_FCTagService_Provider::SetConfigTable(const NVRHBA_F
 {
     ProviderAgent& agent = *ProviderAgent::GetInstance();
     const Agent_Wait wait(agent);
-    if (const uint32 refused = refusal(agent, self, Target)) return answer(return_value, refused);
-    if (isEmpty(URI)) {
-        NVR_LOG("NVRHBA_FCTagService_Provider::Null sized URI");
-        return answer(return_value, ANSWER_NULL_ARGUMENT);
-    }
+    if (const uint32 refused = refusalOfTable(agent, self, Target, URI, "NVRHBA_FCTagService_Provider::Null sized URI"))
+        return answer(return_value, refused);
     Fetched_File file(URI.value);
     NVR_LOG("NVRHBA_FCTagService_Provider::filename is : %s", file.path().c_str());
-    if (const uint32 failed = missing(file.path())) return answer(return_value, failed);
+    if (const uint32 failed = missing(file.path())) {
+        file.isNotThere();
+        return answer(return_value, failed);
+    }
     Tag_Adapter adapter;
     if (const uint32 failed = adapter.open(agent, Target,
                                            "NVRHBA_FCTagService_Provider::Failed to Open Adapter, "

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstdio>
 #include <cstring>
 #include <string>
 #include <sys/stat.h>
@@ -222,17 +221,10 @@ uint32 chooseFile(const Options& options, const Array<String>& values, const cha
     return ANSWER_DONE;
 }
 
-/// Leaves no file behind if it fails, but for one that is none of ours.
 bool writeImage(const char* path, const Property<Array<uint8>>& image)
 {
-    File file = open_regular_file(path, "wb");
-    if (!file) return false;
-    const std::size_t size = image.null ? 0 : image.value.size();
-    const bool written = size == 0 || std::fwrite(image.value.data(), 1, size, file.get()) == size;
-    const bool closed = std::fclose(file.release()) == 0;
-    if (written && closed) return true;
-    ::unlink(path);
-    return false;
+    if (image.null) return write_regular_file(path, {});
+    return write_regular_file(path, {reinterpret_cast<const char*>(image.value.data()), image.value.size()});
 }
 
 /// As installFromURI.

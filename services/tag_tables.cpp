@@ -1,7 +1,6 @@
 #include "services/tag_tables.h"
 
 #include <cerrno>
-#include <cstring>
 #include <stdexcept>
 #include <unistd.h>
 
@@ -87,15 +86,7 @@ void WriteConfigTablesToFile(const std::string& path, const Tag_Table& table, co
 {
     NVR_LOG("NVRHBA_FCTagService_Provider::WriteConfigTablesToFile");
     const std::string text = apexConfigText(table, {now(), hostName(), adapter});
-    File file = open_regular_file(path.c_str(), "wb");
-    if (!file) {
-        NVR_LOG("NVRHBA_FCTagService_Provider::file.fail()");
-        return;
-    }
-    const bool written = std::fwrite(text.data(), 1, text.size(), file.get()) == text.size();
-    if (std::fclose(file.release()) == 0 && written) return;
-    NVR_LOG("NVRHBA_FCTagService_Provider::file.fail()");
-    ::unlink(path.c_str()); // nobody shall load a part of a table
+    if (!write_regular_file(path.c_str(), text)) NVR_LOG("NVRHBA_FCTagService_Provider::file.fail()");
 }
 
 uint32 loadConfigTable(const std::string& path, uint32 handle)

@@ -12,8 +12,8 @@ namespace cimple {
 /// Writes each entry to the log, byte by byte.
 void PrintQoSEntry(const Tag_Table& table);
 
-/// Replaces the content of the file, which must be a regular one if it is there. A file that cannot be opened, or not
-/// be written to its end, is logged; the latter is removed. Throws std::bad_alloc.
+/// Replaces the content of the file, which must be a regular one if it is there. A failure is logged, and leaves no
+/// part of a table that somebody could load. Throws std::bad_alloc.
 void WriteConfigTablesToFile(const std::string& path, const Tag_Table& table, const std::string& adapter);
 
 /// Reads the file and loads its table into the opened adapter. Result a return value of the service: 0; 1 if the

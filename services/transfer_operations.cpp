@@ -244,19 +244,17 @@ bool setUploadOptions(const Curl_Library& curl, const char* uri, std::FILE* file
            set(CURL_USERPWD, ":", credentials_failure) && set(CURL_HTTPAUTH, 1L, credentials_failure);
 }
 
-bool sendFile(const Curl_Library& curl, const char* uri, std::FILE* file)
+/// Finds the file's size, and leaves it at its start.
+long sizeOf(std::FILE* file)
 {
     std::fseek(file, 0, SEEK_END);
     const long size = std::ftell(file);
     std::rewind(file);
-    if (!curl.easy_setopt) {
-        NVR_LOG("unable to locate function curl_easy_setopt in curl so");
-        curl.easy_setopt.logError();
-        return false;
-    }
-    NVR_LOG("iFileSize size:: %d", static_cast<int>(size));
-    NVR_LOG("URI.value.c_str(): %s", uri);
-    if (!setUploadOptions(curl, uri, file, size)) return false;
+    return size;
+}
+
+bool performUpload(const Curl_Library& curl)
+{
     if (!curl.easy_perform) {
         NVR_LOG("dlsym, couldnot locate the symbol curl_easy_perform");
         curl.easy_perform.logError();
@@ -317,7 +315,17 @@ int NVR_MethodWrapper::uploadFileUsingCurl(const String& uri, const char* path)
     }
     file = open_regular_file(path, "rb");
     if (!file) return 1;
-    const bool sent = sendFile(curl, uri.c_str(), file.get());
+    const long size = sizeOf(file.get());
+    if (!curl.easy_setopt) {
+        NVR_LOG("unable to locate function curl_easy_setopt in curl so");
+        curl.easy_setopt.logError();
+        return -1;
+    }
+    NVR_LOG("iFileSize size:: %d", static_cast<int>(size));
+    NVR_LOG("URI.value.c_str(): %s", uri.c_str());
+    // What is refused here ends the transfer without the words of its end.
+    if (!setUploadOptions(curl, uri.c_str(), file.get(), size)) return -1;
+    const bool sent = performUpload(curl);
     endUpload(curl);
     return sent ? 0 : -1;
 }

@@ -1,7 +1,9 @@
 #include <atomic>
+#include <future>
 #include <thread>
 #include <unistd.h>
 
+#include "agent/Agent_Wait.h"
 #include "foundation/Management_Session.h"
 #include "inventory/NVR_Data.h"
 #include "simulator/nvrsim.h"
@@ -234,5 +236,37 @@ TEST_F(Lifecycle, AThreadThatCannotBeCreatedLeavesEmptyAnswersAndTheNextCallTrie
     agent().BuildCimpleInfo();
     settle();
     EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
+    unload();
+}
+
+// A service holds the adapters' locks and the data when it asks for a refresh at its end; a SAN enumeration beside it
+// holds the SAN maps' lock and waits for the data.
+TEST_F(Lifecycle, AThreadThatCannotBeCreatedKeepsTheOrderOfTheLocks)
+{
+    ASSERT_EQ(load(), 0);
+    agent().m_bRefreshSANData = false;
+    refresh();
+    ASSERT_FALSE(agent().m_bIsSANMapsReady);
+    std::promise<void> has_maps;
+    std::thread enumeration;
+    {
+        const Agent_Locks locks(agent(), cimple::Words::silent);
+        enumeration = std::thread([&] {
+            Auto_Mutex maps(agent().m_SANMapsReadyMutex);
+            has_maps.set_value();
+            Auto_Mutex data(agent().m_DataMutex);
+        });
+        has_maps.get_future().wait();
+        no_more_threads = true;
+        agent().m_bAdapterRefreshPending.ask();
+        EXPECT_EQ(agent().BuildCimpleInfo(), 0);
+        EXPECT_FALSE(agent().m_bDataFetchRunning);
+    }
+    enumeration.join();
+    // Once the lock is free, the flag goes up, and whoever waited would not wait on.
+    agent().BuildCimpleInfo();
+    EXPECT_TRUE(agent().m_bIsSANMapsReady);
+    no_more_threads = false;
+    settle();
     unload();
 }

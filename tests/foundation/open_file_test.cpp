@@ -115,3 +115,32 @@ TEST(OpenRegularFile, TellsWhyAPathIsNone)
         EXPECT_EQ(errno, ENAMETOOLONG);
     }
 }
+
+TEST(WriteRegularFile, WritesItsBytesAndNothingElse)
+{
+    for (const std::string& bytes : {std::string("a\0b", 3), std::string(), std::string(100000, 'x')}) {
+        ASSERT_TRUE(write_regular_file(path.c_str(), bytes));
+        EXPECT_EQ(read_file(path), bytes);
+    }
+    make_folder(other);
+    EXPECT_FALSE(write_regular_file(other.c_str(), "new"));
+    EXPECT_TRUE(exists(other));
+    EXPECT_FALSE(write_regular_file("/var/log/none/file", "new"));
+}
+
+TEST(WriteRegularFile, LeavesNoPartOnAFullDisk)
+{
+    make_folder("/var/log/disk");
+    const Small_Disk disk("/var/log/disk");
+    const std::string more(100000, 'x');
+    EXPECT_FALSE(write_regular_file("/var/log/disk/file", more));
+    EXPECT_FALSE(exists("/var/log/disk/file"));
+    // A link stays, and what it leads to is no part either.
+    write_file("/var/log/disk/file", "old");
+    link("/var/log/disk/file", path);
+    EXPECT_FALSE(write_regular_file(path.c_str(), more));
+    EXPECT_TRUE(exists(path));
+    EXPECT_EQ(read_file("/var/log/disk/file"), "");
+    EXPECT_TRUE(write_regular_file(path.c_str(), "new"));
+    EXPECT_EQ(read_file("/var/log/disk/file"), "new");
+}

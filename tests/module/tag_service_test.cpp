@@ -378,8 +378,8 @@ TEST_P(TagService, ATableThatCannotBeReadIsNotWritten)
 
 TEST_P(TagService, CountsThatLieReadNoFurtherThanTheTable)
 {
-    // More than there is memory for: the log tells, the client is not told.
-    for (const char* count : {"466034", "4294967295"}) {
+    // More than an adapter has, which no file is read with: the log tells, the client is not told.
+    for (const char* count : {"65537", "466033", "4294967295"}) {
         clear_faults();
         add_fault("call = \"CPQFC_QoSGetConfig\", status = 7, value = " + std::string(count));
         const Called called = service->call("GetConfigTable", with("tags.xml"));
@@ -672,7 +672,8 @@ TEST_F(TagServiceTransfer, AMalformedAddressIsNotFoundAndLeavesItsFile)
     const Called called = fetch("http://[:]:x/tags.xml");
     EXPECT_THAT(called, returned(4107));
     EXPECT_THAT(called.words, Contains("download failed 3"));
-    EXPECT_THAT(called.words, Contains("ERROR:" + provider + "::Configuration file not found"));
+    EXPECT_EQ(called.words[called.words.size() - 2], provider + "::filename is : http://[:]:x/tags.xml");
+    EXPECT_EQ(called.words.back(), "ERROR:" + provider + "::Configuration file not found");
     EXPECT_THAT(files(here), ElementsAre("tags.xml"));
 }
 

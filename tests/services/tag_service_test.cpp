@@ -7,6 +7,7 @@
 #include "classes/NVRHBA_FCPort.h"
 #include "classes/NVRHBA_FCTagService.h"
 #include "classes/NVRHBA_PortController.h"
+#include "services/ApexConfig.h"
 #include "services/NVRHBA_FCTagService_Provider.h"
 #include "services/tag_tables.h"
 #include "simulator/nvrsim.h"
@@ -211,6 +212,33 @@ TEST_F(TagMethodsOfALongName, CutItAndDoNotFindTheAdapter)
                   std::string(31, 'n'));
 }
 
+// Through a file and back, at the length of the longest.
+TEST(TagTables, OfAnyLengthThatIsWrittenAreRead)
+{
+    for (const sint64 entries : {1, 1000, 65536}) {
+        Tag_Table table = makeTagTable(entries);
+        table[table.size() - 1].tag = 77;
+        WriteConfigTablesToFile("/var/log/tags", table, "Norvane-FC2162-0");
+        const Tag_Table read = readApexConfig(read_file("/var/log/tags"));
+        ASSERT_EQ(read.size(), table.size());
+        EXPECT_EQ(read[read.size() - 1].tag, 77);
+    }
+}
+
+TEST(TagTables, OfWhichAPartIsWrittenAreNotLeftBehindALink)
+{
+    make_folder("/var/log/disk");
+    const Small_Disk disk("/var/log/disk");
+    write_file("/var/log/disk/tags", "");
+    nvrtest::link("/var/log/disk/tags", "/var/log/link");
+    Log_Capture log;
+    WriteConfigTablesToFile("/var/log/link", makeTagTable(1000), "Norvane-FC2162-0");
+    EXPECT_THAT(log.words(), ElementsAre("NVRHBA_FCTagService_Provider::WriteConfigTablesToFile",
+                                         "NVRHBA_FCTagService_Provider::file.fail()"));
+    EXPECT_TRUE(exists("/var/log/link"));
+    EXPECT_EQ(read_file("/var/log/disk/tags"), "");
+}
+
 TEST(TagTables, AreLoggedByteByByte)
 {
     Tag_Table table = makeTagTable(1);
@@ -225,11 +253,12 @@ TEST(TagTables, AreLoggedByteByByte)
                                          "tgt_wwpn:5", "tgt_wwpn:A1", "tgt_wwpn:0", "tgt_wwpn:FF", "tag:200"));
 }
 
-TEST(TagTables, AreNoLargerThanMemoryIsHad)
+TEST(TagTables, AreNoLargerThanThoseOfAnAdapter)
 {
-    EXPECT_EQ(makeTagTable(466033).size(), 466033u); // 16 MiB, less 24 bytes
-    EXPECT_THROW(makeTagTable(466034), std::bad_alloc);
-    EXPECT_THROW(makeTagTable(4294967295u), std::bad_alloc);
+    EXPECT_EQ(makeTagTable(0).size(), 0u);
+    EXPECT_EQ(makeTagTable(65536).size(), 65536u);
+    for (const sint64 entries : {sint64{65537}, sint64{4294967295}, sint64{4294967296}, sint64{-1}, INT64_MIN})
+        EXPECT_THROW(makeTagTable(entries), std::bad_alloc) << entries;
     Tag_Table table = makeTagTable(2);
     table.get()->count = 1;
     EXPECT_EQ(table.size(), 1u);

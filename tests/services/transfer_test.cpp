@@ -865,6 +865,29 @@ TEST_F(Upload, ARefusedOptionEndsIt)
     EXPECT_EQ(stand_in->performed, 0);
 }
 
+// What ends the transfer before its end is cleaned up in silence, whatever else the library lacks.
+TEST_F(Upload, ARefusedOptionIsTheOnlyFailureToldThoughCleanupIsMissingToo)
+{
+    use_stand_in("curl_easy_cleanup");
+    unended_handles = 1;
+    stand_in->failing_option = 14;
+    stand_in->failing_code = 42;
+    EXPECT_EQ(bring("file:///none"), -1);
+    EXPECT_EQ(words(), joined({request_words("file:///none"), {"Error Setting CURLOPT_INFILESIZE, errorcode = 42"}}));
+    EXPECT_EQ(stand_in->global_cleanups, 1);
+}
+
+TEST_F(Upload, ARefusedOptionIsTheOnlyFailureToldThoughTheGlobalCleanupIsMissingToo)
+{
+    use_stand_in("curl_global_cleanup");
+    uncleaned_globals = 1;
+    stand_in->failing_option = 46;
+    stand_in->failing_code = 42;
+    EXPECT_EQ(bring("file:///none"), -1);
+    EXPECT_EQ(words(), joined({file_words("file:///none"), {"Error Setting CURLOPT_UPLOAD, errorcode = 42"}}));
+    EXPECT_EQ(stand_in->handles_ended, 1);
+}
+
 TEST_F(Upload, ALibraryThatDoesNotCloseIsTold)
 {
     install_curl();
