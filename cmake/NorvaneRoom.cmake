@@ -15,10 +15,12 @@ function(norvane_test_headers)
   target_precompile_headers(norvane_test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
 endfunction()
 
-# norvane_test(NAME SOURCES... [LINK libs...] [TIMEOUT s]): a GoogleTest program; each test runs in a process of its own,
-# since much of what is tested lives once a process. Under a sanitizer it may take five times as long.
+# norvane_test(NAME SOURCES... [LINK libs...] [TIMEOUT s] [MANNERS name...]): a GoogleTest program; each test runs in a
+# process of its own, since much of what is tested lives once a process. Under a sanitizer it may take five times as long.
+# Its tests run once more in each of MANNERS, but for those that have a parameter (most often a manner) or start a server
+# that takes its manner as an argument, and those that read the module's file.
 function(norvane_test name)
-  cmake_parse_arguments(TEST "" "TIMEOUT" "SOURCES;LINK;ENVIRONMENT" ${ARGN})
+  cmake_parse_arguments(TEST "" "TIMEOUT" "SOURCES;LINK;ENVIRONMENT;MANNERS" ${ARGN})
   if(NOT TEST_TIMEOUT)
     set(TEST_TIMEOUT 60)
   endif()
@@ -32,4 +34,9 @@ function(norvane_test name)
   endif()
   gtest_discover_tests(${name} TEST_PREFIX "${name}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST
     PROPERTIES TIMEOUT ${TEST_TIMEOUT} ENVIRONMENT "${TEST_ENVIRONMENT}")
+  foreach(manner IN LISTS TEST_MANNERS)
+    gtest_discover_tests(${name} TEST_PREFIX "${name}.${manner}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST
+      TEST_FILTER "-*/*:*Command.*:*Actions.*:Exports.*:Factories.*:Registrations.*" TEST_LIST "${name}_${manner}"
+      PROPERTIES TIMEOUT ${TEST_TIMEOUT} ENVIRONMENT "NORVANE_MANNER=${manner}")
+  endforeach()
 endfunction()

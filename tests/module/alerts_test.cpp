@@ -273,7 +273,7 @@ TEST_P(Alerts, TenLivesLeaveNothingBehind)
 
 TEST(AlertsOfOneServer, APortThatCannotBeRegisteredIsTold)
 {
-    Rig rig;
+    Rig rig({host::Manner::strict(), "typical"}); // others refuse the subscription
     ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
     add_fault("call = \"HBA_RegisterForAdapterPortEvents\", from = 2, status = 1");
     Sink sink;

@@ -278,7 +278,7 @@ TEST(Life, OneSemaphoreOfTheSessionOutlivesTheUnload)
 
 TEST(Life, AStopWhileARefreshRunsWaitsForIt)
 {
-    Rig rig;
+    Rig rig({host::Manner::strict(), "typical"}); // others stop without a clean-up
     add_fault("call = \"HBA_GetNumberOfAdapters\", delay_ms = 300");
     // The profiles come without waiting, and the settings' own question starts the thread.
     std::thread asks([&] { (void)rig.enumerate("NVRHBA_ProviderConfigSetting"); });

@@ -1,6 +1,7 @@
 #include "tests/module/support/Rig.h"
 
 #include <chrono>
+#include <cstdlib>
 #include <fstream>
 #include <sched.h>
 #include <stdexcept>
@@ -196,6 +197,14 @@ std::size_t Rig::count_words(const std::string& word) const
 std::uint64_t left_beside_strings(const host::Report& report)
 {
     return report.left() - report.of(host::Object_Kind::string).left;
+}
+
+const host::Manner& manner_asked_for()
+{
+    const char* name = std::getenv("NORVANE_MANNER");
+    const host::Manner* manner = name ? host::Manner::find(name) : &host::Manner::strict();
+    if (!manner) throw std::runtime_error(std::string("no such manner: ") + name);
+    return *manner;
 }
 
 std::vector<const host::Manner*> every_manner()

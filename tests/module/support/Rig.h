@@ -29,8 +29,11 @@ constexpr char trace_path[] = "/var/log/norvane.trace";
 constexpr char rig_host_name[] = "storage1.norvane.test";
 constexpr char rig_host_address[] = "192.0.2.17";
 
+/// The manner of the tests that are the same in all: the one that NORVANE_MANNER names, `strict` without it.
+const host::Manner& manner_asked_for();
+
 struct Rig_Options {
-    host::Manner manner = host::Manner::strict();
+    host::Manner manner = manner_asked_for();
     /// As load_scenario takes it.
     std::string scenario = "typical";
     /// Content of the settings file; empty: there is none.
