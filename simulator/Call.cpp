@@ -4,7 +4,6 @@
 #include <chrono>
 #include <cstdio>
 #include <ctime>
-#include <thread>
 
 namespace nvrsim {
 
@@ -37,9 +36,10 @@ Call::Call(Call_Id id, const Subject& subject) : m_simulator(Simulator::instance
         hit = true;
     }
     if (m_fault.delay) {
-        m_lock.unlock();
-        std::this_thread::sleep_for(std::chrono::milliseconds(m_fault.delay));
-        m_lock.lock();
+        const auto is_over = [&, clearings = m_simulator.faultClearings] {
+            return m_simulator.faultClearings != clearings;
+        };
+        m_simulator.faultsCleared.wait_for(m_lock, std::chrono::milliseconds(m_fault.delay), is_over);
         resolve(subject); // the host may be another one now
     }
     if (m_port) m_wwpn = m_port->current.wwpn;

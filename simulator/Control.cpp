@@ -227,7 +227,7 @@ std::string run_command(const std::string& line)
     if (command == "clear-faults" || command == "clear-log" || command == "reset" || command == "load") {
         const std::string path = command == "load" ? rest() : std::string();
         std::lock_guard<std::mutex> lock(simulator.mutex);
-        if (command == "clear-faults") simulator.faults.clear();
+        if (command == "clear-faults") simulator.clear_faults();
         if (command == "clear-log") simulator.log.clear();
         const bool good = command == "reset"  ? simulator.reload()
                           : command == "load" ? simulator.load_file(path)

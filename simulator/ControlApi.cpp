@@ -96,7 +96,7 @@ NVRSIM_EXPORT void nvrsim_clear_faults(void)
 {
     Simulator& simulator = Simulator::instance();
     std::lock_guard<std::mutex> lock(simulator.mutex);
-    simulator.faults.clear();
+    simulator.clear_faults();
 }
 
 NVRSIM_EXPORT size_t nvrsim_faults(char* buffer, size_t size)

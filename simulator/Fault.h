@@ -27,7 +27,7 @@ struct Fault {
     uint64_t from = 1;               // first matching call that is hit
     uint64_t times = UINT64_MAX;     // calls hit from there
     std::optional<int64_t> status;   // what the call answers
-    uint32_t delay = 0;              // milliseconds before it does anything
+    uint32_t delay = 0;              // milliseconds before it does anything, unless faults are cleared meanwhile
     std::optional<uint64_t> value;   // stands in every count, size and number handed back
     Damage damage = Damage::none;
     uint32_t keep = 0;

@@ -55,10 +55,17 @@ Simulator::Simulator()
     if (path && *path && !load_file(path)) std::fprintf(stderr, "nvrsim: %s\n", error.c_str());
 }
 
+void Simulator::clear_faults()
+{
+    faults.clear();
+    ++faultClearings;
+    faultsCleared.notify_all();
+}
+
 void Simulator::clear()
 {
     host = Host();
-    faults.clear();
+    clear_faults();
     error.clear();
     handles.clear();
     std::memset(counters, 0, sizeof counters);

@@ -6,6 +6,7 @@
 #include "simulator/Calls.h"
 #include "simulator/Scenario.h"
 
+#include <condition_variable>
 #include <deque>
 #include <mutex>
 #include <string>
@@ -36,8 +37,10 @@ struct Simulator {
     std::mutex mutex;
     Host host;
     std::vector<Fault> faults;
-    std::string error;      // why the last load failed; empty: none
-    std::string sourceText; // of the scenario in force, for reset
+    uint64_t faultClearings = 0;
+    std::condition_variable faultsCleared; // wakes the calls that faults hold up
+    std::string error;                     // why the last load failed; empty: none
+    std::string sourceText;                // of the scenario in force, for reset
     std::string sourceName;
     bool haveSource = false;
 
@@ -53,6 +56,8 @@ struct Simulator {
     bool load_file(const std::string& path);
     bool load_text(const std::string& text, const std::string& name);
     bool reload();
+    /// The calls that they hold up go on.
+    void clear_faults();
 
     /// 0 when there are too many.
     uint32_t open(const std::string& adapterName, bool tags);

@@ -3,6 +3,7 @@
 
 #include <chrono>
 #include <memory>
+#include <thread>
 
 class Faults : public Simulated {
 protected:
@@ -83,6 +84,17 @@ TEST_F(Faults, DelayHoldsUpThatCallOnly)
     EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(500));
     EXPECT_EQ(0u, driver_type(port0));
     EXPECT_NE(std::string::npos, sim_text(nvrsim_faults).find("seen=2 hits=1")) << "the second was not held up";
+}
+
+TEST_F(Faults, ADelayIsOverWhenTheFaultsAreCleared)
+{
+    fault("call = 'RM_GetDriverType', delay_ms = 3600000");
+    std::thread caller([&] { EXPECT_EQ(0u, driver_type(port0)); });
+    while (nvrsim_calls("RM_GetDriverType") == 0)
+        std::this_thread::yield();
+    nvrsim_clear_faults();
+    caller.join();
+    EXPECT_EQ(0u, driver_type(port0));
 }
 
 TEST_F(Faults, GarbageIsTheSameEachTimeAndStaysInTheBuffer)
