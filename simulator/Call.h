@@ -45,6 +45,7 @@ public:
     Adapter* adapter() { return m_adapter; }
     Port* port() { return m_port; }
 
+    bool throws() const { return m_fault.throws; }
     bool is_absent() const { return m_fault.absent; }
     /// True if the call shall answer its fault's status and do nothing else.
     bool is_refused() const { return m_fault.status && !m_fault.writes(); }
@@ -101,12 +102,17 @@ private:
     uint32_t m_noise = 0x9E3779B9;
 };
 
-/// Runs `work(call)` as the body of an operation; `missing` answers for an absent library. Nothing is thrown.
+/// What comes out of a function whose fault says so; of no class that a caller could know.
+struct Library_Exception {};
+
+/// Runs `work(call)` as the body of an operation; `missing` answers for an absent library. Nothing is thrown but what a
+/// fault asks for.
 template <class Result, class Work>
 Result run(Call_Id id, const Subject& subject, Result missing, Work work)
 {
     try {
         Call call(id, subject);
+        if (call.throws()) throw Library_Exception();
         if (call.is_absent()) return missing;
         if (call.is_refused()) return static_cast<Result>(call.note(call.status()));
         auto result = static_cast<Result>(work(call));

@@ -32,6 +32,7 @@ struct Fault {
     Damage damage = Damage::none;
     uint32_t keep = 0;
     bool absent = false; // as if neither library nor symbol were there
+    bool throws = false; // an exception instead of an answer
     bool vanish = false; // before the call does anything, the adapter that it is about leaves the host
 
     uint64_t seen = 0; // matching calls so far

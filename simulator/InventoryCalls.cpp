@@ -115,6 +115,7 @@ void* nvrsim_RM_GetAttributeValue(void* block, uint16_t number, uint16_t* length
     subject.number = number;
     try {
         Call call(Call_Id::RM_GetAttributeValue, subject);
+        if (call.throws()) throw Library_Exception();
         if (call.is_absent()) return nullptr;
         uint32_t result = RM_STATUS_ERROR;
         uint16_t found = 0;

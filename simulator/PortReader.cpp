@@ -405,6 +405,7 @@ Fault read_fault(const std::string& file, const toml::table& table)
     fault.damage = static_cast<Damage>(damage);
     fields.number("keep", fault.keep);
     fields.boolean("absent", fault.absent);
+    fields.boolean("throws", fault.throws);
     fields.boolean("vanish", fault.vanish);
     fields.refuse_unknown();
     return fault;

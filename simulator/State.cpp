@@ -99,6 +99,7 @@ std::string describe_faults()
         if (fault.value) text << " value=" << *fault.value;
         if (fault.damage != Damage::none) text << " damage=" << to_text(fault.damage);
         if (fault.absent) text << " absent";
+        if (fault.throws) text << " throws";
         if (fault.vanish) text << " vanish";
         text << " from=" << fault.from;
         if (fault.times != UINT64_MAX) text << " times=" << fault.times;

@@ -162,7 +162,7 @@ int main(int argc, char** argv)
     std::string call, port, damage;
     int64_t status = 0;
     uint64_t from = 1, times = 0, value = 0, keep = 0, delay = 0, number = 0;
-    bool absent = false, vanish = false;
+    bool absent = false, throws = false, vanish = false;
     fault->add_option("call", call, "Function, for example RM_GetVPD; HBA_* for all that begin so")->required();
     fault->add_option("-p,--port", port, "Only for this port");
     auto* statusOption = fault->add_option("-r,--status", status, "What the function answers");
@@ -176,6 +176,7 @@ int main(int argc, char** argv)
         ->check(CLI::IsMember({"garbage", "truncated", "ones", "zeros", "null", "unterminated"}));
     auto* keepOption = fault->add_option("--keep", keep, "Bytes that a truncated block keeps");
     fault->add_flag("--absent", absent, "As if the function were missing from its library");
+    fault->add_flag("--throws", throws, "The function throws an exception instead of an answer");
     fault->add_flag("--vanish", vanish, "The call's adapter leaves the host before it does anything");
 
     app.add_subcommand("faults", "List faults with the calls they have seen and hit");
@@ -266,6 +267,7 @@ int main(int argc, char** argv)
             if (!damage.empty()) line += ", damage = " + in_quotes(damage);
             if (*keepOption) line += ", keep = " + std::to_string(keep);
             if (absent) line += ", absent = true";
+            if (throws) line += ", throws = true";
             if (vanish) line += ", vanish = true";
             std::cout << "fault " << ask(socketPath, line);
         } else if (*link) {

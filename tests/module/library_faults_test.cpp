@@ -123,6 +123,8 @@ std::vector<std::string> faults_of_one_call(std::size_t sample)
     faults.push_back("from = 2, status = 1");
     faults.push_back("from = 2, damage = \"garbage\"");
     faults.push_back("times = 1, status = 8");
+    faults.push_back("throws = true");
+    faults.push_back("from = 2, throws = true");
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
     std::vector<std::string> some;
     for (std::size_t i = sample % 6; i < faults.size(); i += 6)

@@ -85,11 +85,11 @@ TEST_F(Control, FaultIsInjectedListedAndCleared)
               run("faults").output);
     EXPECT_EQ(0, run("clear-faults").status);
     EXPECT_EQ("", run("faults").output);
-    EXPECT_EQ(0,
-              run("fault 'RM_*' --value 18446744073709551615 --damage truncated --keep 3 --delay 1 --absent --vanish")
-                  .status);
+    EXPECT_EQ(0, run("fault 'RM_*' --value 18446744073709551615 --damage truncated --keep 3 --delay 1 --absent "
+                     "--throws --vanish")
+                     .status);
     EXPECT_NE(std::string::npos,
-              run("faults").output.find("value=18446744073709551615 damage=truncated absent vanish"));
+              run("faults").output.find("value=18446744073709551615 damage=truncated absent throws vanish"));
 }
 
 TEST_F(Control, LinkAndEventsReachCallbacks)

@@ -217,6 +217,17 @@ TEST_F(Faults, AbsentFunctionAnswersAsIfItsSymbolWereMissing)
     EXPECT_EQ(1u, nvrsim_RM_GetVPD(wire(port0), name, &size));
 }
 
+TEST_F(Faults, AFunctionCanThrow)
+{
+    fault("call = '*', throws = true, from = 2, times = 3");
+    EXPECT_EQ(0u, driver_type(port0));
+    EXPECT_ANY_THROW(driver_type(port0));
+    EXPECT_ANY_THROW(nvrsim_HBA_GetNumberOfAdapters());
+    Block block(64);
+    EXPECT_ANY_THROW(block.text(1));
+    EXPECT_EQ(0u, driver_type(port0)) << "nothing stays locked";
+}
+
 TEST_F(Faults, AnAdapterCanVanishBetweenTwoCalls)
 {
     load("[[adapter]]\n[[adapter]]\n");
