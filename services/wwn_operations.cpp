@@ -103,22 +103,17 @@ uint32 refuseNames(const HBA_WWN& newWWPN, const HBA_WWN& newWWNN, Property<uint
     return ANSWER_DONE;
 }
 
-/// Calls, and calls again every second while the library is busy, for five minutes; the first time with a word. An
-/// exception ends it with `failed` in the log. Result the status of the last call that came back.
+/// Calls, and calls again every second while the library is busy, for five minutes; the first time with a word.
+/// `status` is that of the last call that came back, also if one throws.
 template <class Call>
-uint32 callWhileBusy(const char* busy, const char* failed, Call call)
+void callWhileBusy(const char* busy, uint32& status, Call call)
 {
-    uint32 status = RM_STATUS_ERROR;
-    const bool done = guarded([&] {
+    status = call();
+    for (int pass = 0; pass < busy_retries && status == RM_STATUS_WWN_BUSY; pass++) {
+        if (pass == 0) NVR_LOG("%s", busy);
         status = call();
-        for (int pass = 0; pass < busy_retries && status == RM_STATUS_WWN_BUSY; pass++) {
-            if (pass == 0) NVR_LOG("%s", busy);
-            status = call();
-            agent_sleep.load()(busy_interval);
-        }
-    });
-    if (!done) NVR_LOG("%s", failed);
-    return status;
+        agent_sleep.load()(busy_interval);
+    }
 }
 
 /// What an activation code means to the operator: lines of the log, up to the first null.
@@ -208,15 +203,17 @@ uint32 NVR_MethodWrapper::ChangeWWN(const HBA_WWN& port, const HBA_WWN& newWWPN,
                                     Property<uint16>& operationStatus)
 {
     uint32 refusal = ANSWER_DONE;
-    if (!guarded([&] { refusal = refuseNames(newWWPN, newWWNN, operationStatus); })) {
-        NVR_LOG("Error in RM_ChangeWWN");
-        return libraryAnswer(RM_STATUS_ERROR);
-    }
-    if (refusal != ANSWER_DONE) return refusal;
-    NVR_LOG("ChangeWWN operation initiated");
+    uint32 status = RM_STATUS_ERROR; // until the library has answered
     uint32 code = 0;
-    const uint32 status = callWhileBusy("Validating new WWNs...", "Error in RM_ChangeWWN",
-                                        [&] { return RM_ChangeWWN(port, newWWPN, newWWNN, type, &code); });
+    const bool done = guarded([&] {
+        refusal = refuseNames(newWWPN, newWWNN, operationStatus);
+        if (refusal != ANSWER_DONE) return;
+        NVR_LOG("ChangeWWN operation initiated");
+        callWhileBusy("Validating new WWNs...", status,
+                      [&] { return RM_ChangeWWN(port, newWWPN, newWWNN, type, &code); });
+    });
+    if (refusal != ANSWER_DONE) return refusal;
+    if (!done) NVR_LOG("Error in RM_ChangeWWN");
     if (status == RM_STATUS_OK) {
         NVR_LOG("New WWNs written successfully");
         tellActivation(changes, code, operationStatus);
@@ -232,9 +229,11 @@ uint32 NVR_MethodWrapper::ChangeWWN(const HBA_WWN& port, const HBA_WWN& newWWPN,
 uint32 NVR_MethodWrapper::RestoreWWN(const HBA_WWN& port, uint16 type, Property<uint16>& operationStatus)
 {
     NVR_LOG("RestoreWWN operation initiated.");
+    uint32 status = RM_STATUS_ERROR;
     uint32 code = 0;
-    const uint32 status =
-        callWhileBusy("Restoring WWNs...", "Error in RestoreWWN", [&] { return RM_RestoreWWN(port, type, &code); });
+    const bool done =
+        guarded([&] { callWhileBusy("Restoring WWNs...", status, [&] { return RM_RestoreWWN(port, type, &code); }); });
+    if (!done) NVR_LOG("Error in RestoreWWN");
     if (status == RM_STATUS_OK) tellActivation(restores, code, operationStatus);
     return ANSWER_DONE;
 }

@@ -1,70 +1,17 @@
-// World Wide Names of ports, changed, restored and read through the service.
-#include <cstdio>
-
+// World Wide Names of ports: what the service takes and refuses, and how it reads.
 #include <gmock/gmock.h>
 
-#include "tests/module/support/Service.h"
-#include "tests/module/support/Test_Clock.h"
+#include "tests/module/support/Wwn.h"
 #include "tests/support/simulator.h"
 
 using namespace nvrtest;
 using host::Value;
 using testing::Contains;
 using testing::IsEmpty;
-using testing::Not;
-using namespace std::chrono_literals;
 
 namespace {
 
-constexpr char service_class[] = "NVRHBA_FCHBAWWNService";
-constexpr char new_wwpn[] = "10000000C9A0F001";
-constexpr char new_wwnn[] = "20000000C9A0F001";
-constexpr unsigned untold = 65535;
 constexpr char no_port_words[] = "NVRHBA_FCHBAWWNService_Provider invald port ...return";
-
-/// What a method logs until its Target is accepted.
-Words opened(const std::string& method, const std::string& device_id = first_port)
-{
-    return joined({{"Entering " + method, gate}, known_port(), converted(device_id)});
-}
-
-/// The same for a change whose names are accepted too.
-Words names_accepted(const std::string& wwpn = new_wwpn, const std::string& wwnn = new_wwnn)
-{
-    return joined({opened("ChangeWWN"), converted(wwpn), converted(wwnn)});
-}
-
-class Wwn {
-public:
-    explicit Wwn(Rig& rig) : m_service(rig, service_class), m_port(port(rig)) {}
-
-    Called change(unsigned type, const std::string& wwpn = new_wwpn, const std::string& wwnn = new_wwnn)
-    {
-        return m_service.call(
-            "ChangeWWN",
-            {{"Target", m_port}, {"NewWWPN", Value::string(wwpn)}, {"NewWWNN", Value::string(wwnn)}, type_of(type)});
-    }
-    Called restore(unsigned type) { return m_service.call("RestoreWWN", {{"Target", m_port}, type_of(type)}); }
-    Called read(unsigned type) { return m_service.call("ReadWWN", {{"Target", m_port}, type_of(type)}); }
-    Called capability() { return m_service.call("GetWWNCapability", {{"Target", m_port}}); }
-    Service& service() { return m_service; }
-
-private:
-    static host::Named_Value type_of(unsigned type) { return {"Type", Value::uint16(static_cast<uint16_t>(type))}; }
-
-    Service m_service;
-    const Value m_port;
-};
-
-void expect_status(const Called& called, unsigned status)
-{
-    EXPECT_EQ(called.out("WWNOperationStatus"), Value::uint16(static_cast<uint16_t>(status)));
-}
-
-std::string fault(const std::string& call, const std::string& what)
-{
-    return "call = \"" + call + "\", " + what;
-}
 
 } // namespace
 
@@ -184,7 +131,7 @@ TEST_P(WwnService, TellsWhatCanBeChanged)
 TEST_P(WwnService, TakesMethodsAndArgumentsInAnyCase)
 {
     Rig rig({*GetParam()});
-    Service service(rig, service_class);
+    Service service(rig, wwn_service_class);
     for (const char* method : {"READWWN", "readwwn", "rEADwwn"}) {
         const Called read = service.call(method, {{"TARGET", port(rig)}, {"type", Value::uint16(2)}});
         EXPECT_THAT(read, returned(0)) << method;
@@ -202,7 +149,7 @@ TEST_P(WwnService, TakesMethodsAndArgumentsInAnyCase)
 TEST_P(WwnService, RefusesWhatItIsNotMeantFor)
 {
     Rig rig({*GetParam()});
-    Service service(rig, service_class);
+    Service service(rig, wwn_service_class);
     const struct {
         const char* what;
         Arguments target;
@@ -291,7 +238,7 @@ TEST(WwnServiceNames, MayComeInOddClothes)
 TEST(WwnServiceNames, OfATargetAreTakenInAnyCase)
 {
     Rig rig;
-    Service service(rig, service_class);
+    Service service(rig, wwn_service_class);
     const Called read = service.call(
         "ReadWWN", {{"Target", port_with_id(rig, Value::string("10000000c9a00002"))}, {"Type", Value::uint16(2)}});
     EXPECT_THAT(read, returned(0));
@@ -323,7 +270,7 @@ TEST(WwnServiceTypes, BeyondThoseOfTheMethodAreRefused)
 TEST(WwnServiceTypes, ThatAreMissingCountAsZero)
 {
     Rig rig;
-    Service service(rig, service_class);
+    Service service(rig, wwn_service_class);
     EXPECT_THAT(service.call("ReadWWN", {{"Target", port(rig)}}).words, Contains("Reading Volatile WWNs."));
     EXPECT_THAT(service.call("RestoreWWN", {{"Target", port(rig)}, {"Type", Value::null_of(CMPI_uint16)}}).words,
                 Contains("Restoring Factory Default World Wide Name..."));
@@ -400,6 +347,25 @@ TEST(WwnServiceReading, PassesEachStatusOfTheLibraryOn)
         }
 }
 
+// The server is told of the exception; nothing stays locked behind it.
+TEST(WwnServiceReading, FailsWhereTheLibraryThrowsOrLacksTheCall)
+{
+    Rig rig({host::Manner::strict(), "small"});
+    Wwn wwn(rig);
+    add_fault(fault("RM_ReadWWN", "throws = true"));
+    add_fault(fault("RM_GetWWNCapability", "throws = true"));
+    EXPECT_THAT(wwn.read(2).answer, failed_with(CMPI_RC_ERR_FAILED));
+    EXPECT_THAT(wwn.capability().answer, failed_with(CMPI_RC_ERR_FAILED));
+    clear_faults();
+    add_fault(fault("RM_ReadWWN", "absent = true"));
+    add_fault(fault("RM_GetWWNCapability", "absent = true"));
+    EXPECT_THAT(wwn.read(2), returned(40001));
+    EXPECT_THAT(wwn.capability(), returned(40001));
+    clear_faults();
+    EXPECT_THAT(wwn.read(2), returned(0));
+    EXPECT_THAT(wwn.capability(), returned(0));
+}
+
 TEST(WwnServiceCapability, IsToldBitByBit)
 {
     Rig rig;
@@ -442,362 +408,6 @@ TEST(WwnServiceCapability, IsNotToldWhenTheLibraryFails)
         words.push_back("GetWWNCapability: RM_ReadWWNCapability call failed with error: " + std::to_string(status));
         EXPECT_EQ(called.words, words);
     }
-}
-
-TEST(WwnServiceChange, TellsEachActivationCode)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    const std::string reboot = "Reboot required to activate the new setting";
-    const std::string reset = "Reset required to activate the new setting";
-    const std::string until = "Volatile names will be active until system power-down or HBA power-cycle";
-    const struct {
-        unsigned code;
-        Words words;
-        unsigned status;
-    } rows[] = {
-        {5, {reboot, until}, 5}, {6, {reboot}, 6}, {7, {reset, until}, 7}, {8, {reset}, 8},  {0, {}, untold},
-        {1, {}, untold},         {4, {}, untold},  {9, {}, untold},        {97, {}, untold}, {65541, {}, untold},
-    };
-    for (const auto& row : rows) {
-        clear_faults();
-        add_fault(fault("RM_ChangeWWN", "value = " + std::to_string(row.code)));
-        const Called called = wwn.change(0);
-        EXPECT_THAT(called, returned(0)) << row.code;
-        expect_status(called, row.status);
-        EXPECT_EQ(called.words,
-                  joined({names_accepted(),
-                          {"Writing Volatile World Wide Name.", "ChangeWWN operation initiated",
-                           "New WWNs written successfully"},
-                          row.words,
-                          {"ChangeWWN operation completed. Please restart the CIMOM to use Norvane CIM provider",
-                           gate_refreshing}}))
-            << row.code;
-    }
-}
-
-TEST(WwnServiceChange, PassesEachStatusOfTheLibraryOn)
-{
-    Rig rig({host::Manner::strict(), "small"});
-    Wwn wwn(rig);
-    const auto before = slept();
-    rig.settle();
-    const std::size_t refreshes = rig.refreshes();
-    for (unsigned status = 1; status <= 260; status++) {
-        if (status == 97) continue; // busy: a test of its own
-        clear_faults();
-        add_fault(fault("RM_ChangeWWN", "status = " + std::to_string(status)));
-        const Called called = wwn.change(1);
-        EXPECT_THAT(called, returned(40000 + status));
-        expect_status(called, untold);
-        Words words =
-            joined({names_accepted(), {"Writing Non-Volatile World Wide Name.", "ChangeWWN operation initiated"}});
-        if (status == 92) words.push_back("WWN Management is not available on this HBA");
-        if (status == 89) words.push_back("WWN NOT SUPPORTED");
-        words.push_back("ChanngeWWN: RM_ChangeWWN call failed with error: " + std::to_string(status));
-        EXPECT_EQ(called.words, words);
-    }
-    EXPECT_EQ(rig.refreshes(), refreshes); // what failed changed nothing
-    EXPECT_EQ(slept() - before, 0us);
-}
-
-TEST(WwnServiceChange, WaitsForABusyLibrary)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    const auto before = slept();
-    add_fault(fault("RM_ChangeWWN", "status = 97, times = 3"));
-    const Called called = wwn.change(1);
-    EXPECT_THAT(called, returned(0));
-    expect_status(called, 8);
-    EXPECT_EQ(
-        called.words,
-        joined({names_accepted(),
-                {"Writing Non-Volatile World Wide Name.", "ChangeWWN operation initiated", "Validating new WWNs...",
-                 "New WWNs written successfully", "Reset required to activate the new setting",
-                 "ChangeWWN operation completed. Please restart the CIMOM to use Norvane CIM provider",
-                 gate_refreshing}}));
-    EXPECT_EQ(calls("RM_ChangeWWN"), 4u);
-    EXPECT_EQ(slept() - before, 3s); // one behind each further call, also the last
-}
-
-TEST(WwnServiceChange, GivesABusyLibraryUpAfterFiveMinutes)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    const auto before = slept();
-    add_fault(fault("RM_ChangeWWN", "status = 97"));
-    const Called called = wwn.change(0);
-    EXPECT_THAT(called, returned(40097));
-    expect_status(called, untold);
-    EXPECT_EQ(called.words,
-              joined({names_accepted(),
-                      {"Writing Volatile World Wide Name.", "ChangeWWN operation initiated", "Validating new WWNs...",
-                       "ChanngeWWN: RM_ChangeWWN call failed with error: 97"}}));
-    EXPECT_EQ(calls("RM_ChangeWWN"), 301u);
-    EXPECT_EQ(slept() - before, 5min);
-}
-
-TEST(WwnServiceChange, TakesTheLastAnswerOfALibraryThatWasBusy)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    const auto before = slept();
-    add_fault(fault("RM_ChangeWWN", "status = 97, times = 2"));
-    add_fault(fault("RM_ChangeWWN", "status = 92"));
-    const Called called = wwn.change(0);
-    EXPECT_THAT(called, returned(40092));
-    EXPECT_EQ(calls("RM_ChangeWWN"), 3u);
-    EXPECT_EQ(slept() - before, 2s);
-}
-
-TEST(WwnServiceChange, AsksTheLibraryWhetherTheNamesAreNames)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    add_fault(fault("RM_ValidateWwn", "status = 5, times = 1"));
-    const Called port_name = wwn.change(1);
-    EXPECT_THAT(port_name, returned(40005));
-    EXPECT_EQ(
-        port_name.words,
-        joined({names_accepted(), {"Writing Non-Volatile World Wide Name.", "The supplied 'New WWPN' is not valid"}}));
-    expect_status(port_name, untold);
-    EXPECT_EQ(calls("RM_ValidateWwn"), 1u);
-
-    const Called node_name = wwn.change(1, new_wwpn, "0000000000000000");
-    EXPECT_THAT(node_name, returned(40005));
-    EXPECT_EQ(node_name.words,
-              joined({names_accepted(new_wwpn, "0000000000000000"),
-                      {"Writing Non-Volatile World Wide Name.", "The supplied 'New WWNN' is not valid"}}));
-    EXPECT_EQ(calls("RM_GetNumberOfLocalAdapters"), 0u);
-    EXPECT_EQ(calls("RM_ChangeWWN"), 0u);
-
-    // Any other answer is no refusal.
-    clear_faults();
-    add_fault(fault("RM_ValidateWwn", "status = 4"));
-    EXPECT_THAT(wwn.change(1, new_wwpn, "20000000C9A0F001"), returned(0));
-}
-
-namespace {
-
-/// A host of two adapters with a port each; the second has these virtual ports.
-std::string host_with_vports(unsigned count)
-{
-    std::string text = "# a host\n[[adapter]]\n[[adapter.port]]\n[[adapter]]\n[[adapter.port]]\n";
-    char name[32];
-    for (unsigned i = 0; i < count; i++) {
-        std::snprintf(name, sizeof name, "%016llX", 0x2B010000C9A00000ull + i);
-        text += "[[adapter.port.vport]]\nwwpn = \"" + std::string(name) + "\"\nwwnn = \"2C010000C9A0FFFF\"\n";
-    }
-    return text;
-}
-
-constexpr char first_vport[] = "2B010000C9A00000";
-
-void expect_duplicate(const Called& called)
-{
-    EXPECT_THAT(called, returned(91));
-    expect_status(called, 1);
-    EXPECT_EQ(called.words.back(), "ChangeWWN: Duplication of vport WWPN detected.");
-    EXPECT_EQ(calls("RM_ChangeWWN"), 0u);
-}
-
-} // namespace
-
-TEST(WwnServiceDuplicates, AreNamesThatAVirtualPortOfAnyLocalPortHas)
-{
-    Rig rig({host::Manner::strict(), host_with_vports(3)});
-    Wwn wwn(rig);
-    const std::uint64_t listed = calls("RM_VPList");
-    const Called port_name = wwn.change(1, first_vport, new_wwnn);
-    expect_duplicate(port_name);
-    EXPECT_EQ(port_name.words,
-              joined({names_accepted(first_vport),
-                      {"Writing Non-Volatile World Wide Name.", "ChangeWWN: Duplication of vport WWPN detected."}}));
-    // One port without any, and one that is asked again with more room.
-    EXPECT_EQ(calls("RM_VPList"), listed + 3);
-    expect_duplicate(wwn.change(1, new_wwpn, "2B010000C9A00002"));
-    expect_duplicate(wwn.change(0, "2B010000C9A00001", "2B010000C9A00001"));
-    // A virtual port's node name is not looked at.
-    EXPECT_THAT(wwn.change(1, "2C010000C9A0FFFF", "2C010000C9A0FFFF"), returned(0));
-    EXPECT_EQ(calls("RM_ChangeWWN"), 1u);
-}
-
-TEST(WwnServiceDuplicates, AreSearchedToTheEndOfTheLocalPorts)
-{
-    Rig rig; // the first port has the virtual ones
-    Wwn wwn(rig);
-    const std::string name = rig.enumerate("NVRHBA_VirtualFCPort").instances.at(0).get("DeviceID").as_text();
-    ASSERT_EQ(name.size(), 16u);
-    const std::uint64_t listed = calls("RM_VPList"), records = calls("RM_GetLocalHBAInfo");
-    expect_duplicate(wwn.change(1, name, new_wwnn));
-    EXPECT_EQ(calls("RM_GetLocalHBAInfo"), records + 4);
-    EXPECT_EQ(calls("RM_VPList"), listed + 5);
-}
-
-TEST(WwnServiceDuplicates, AreSearchedOnceForRecordsOfOneName)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    add_fault(fault("RM_GetLocalHBAInfo", "damage = \"zeros\""));
-    const std::uint64_t listed = calls("RM_VPList"), records = calls("RM_GetLocalHBAInfo");
-    EXPECT_THAT(wwn.change(1), returned(0));
-    EXPECT_EQ(calls("RM_GetLocalHBAInfo"), records + 4);
-    rig.settle();
-    clear_faults();
-    // The refresh that followed lists them too; without it there is one call for the four records.
-    add_fault(fault("RM_GetLocalHBAInfo", "damage = \"zeros\""));
-    add_fault(fault("RM_ChangeWWN", "status = 1"));
-    const std::uint64_t before = calls("RM_VPList");
-    EXPECT_THAT(wwn.change(1), returned(40001));
-    EXPECT_EQ(calls("RM_VPList"), before + 1);
-    EXPECT_GE(before, listed + 1);
-}
-
-TEST(WwnServiceDuplicates, AreNotSearchedInRecordsThatFail)
-{
-    Rig rig({host::Manner::strict(), host_with_vports(3)});
-    Wwn wwn(rig);
-    add_fault(fault("RM_GetLocalHBAInfo", "status = 1, from = 2, times = 1"));
-    EXPECT_THAT(wwn.change(1, first_vport, new_wwnn), returned(0));
-    clear_faults();
-    add_fault(fault("RM_GetLocalHBAInfo", "status = 1, times = 1"));
-    EXPECT_THAT(wwn.change(1, first_vport, new_wwnn), returned(91));
-}
-
-TEST(WwnServiceDuplicates, AreNotSearchedWithoutRecordsOrLists)
-{
-    Rig rig({host::Manner::strict(), host_with_vports(3)});
-    Wwn wwn(rig);
-    for (const char* how :
-         {"call = \"RM_GetNumberOfLocalAdapters\", absent = true", "call = \"RM_GetNumberOfLocalAdapters\", value = 0",
-          "call = \"RM_GetLocalHBAInfo\", absent = true", "call = \"RM_VPList\", absent = true",
-          "call = \"RM_VPList\", status = 2", "call = \"RM_VPList\", value = 0",
-          "call = \"RM_VPList\", status = 7, value = 4294967295",
-          "call = \"RM_VPList\", status = 7, value = 3000000"}) {
-        clear_faults();
-        add_fault(how);
-        EXPECT_THAT(wwn.change(1, first_vport, new_wwnn), returned(0)) << how;
-    }
-}
-
-TEST(WwnServiceDuplicates, AreLookedForInAsManyRecordsAsAHostCanHave)
-{
-    Rig rig({host::Manner::strict(), "small"});
-    Wwn wwn(rig);
-    add_fault(fault("RM_GetNumberOfLocalAdapters", "value = 4294967295"));
-    const std::uint64_t records = calls("RM_GetLocalHBAInfo");
-    EXPECT_THAT(wwn.change(1), returned(0));
-    EXPECT_EQ(calls("RM_GetLocalHBAInfo"), records + 1024);
-}
-
-TEST(WwnServiceDuplicates, AreSearchedInUpTo1023VirtualPorts)
-{
-    {
-        Rig rig({host::Manner::strict(), host_with_vports(1023)});
-        expect_duplicate(Wwn(rig).change(1, "2B010000C9A003FE", new_wwnn));
-    }
-    Rig rig({host::Manner::strict(), host_with_vports(1024)});
-    Wwn wwn(rig);
-    EXPECT_THAT(wwn.change(1, first_vport, new_wwnn), returned(0));
-}
-
-// More than there was room for is counted, but no walk goes beyond the buffer.
-TEST(WwnServiceDuplicates, AreNotReadBehindTheList)
-{
-    Rig rig({host::Manner::strict(), host_with_vports(1)});
-    Wwn wwn(rig);
-    add_fault(fault("RM_VPList", "value = 1023"));
-    EXPECT_THAT(wwn.change(1), returned(0));
-    expect_duplicate([&] {
-        clear_faults();
-        add_fault(fault("RM_VPList", "value = 1023"));
-        add_fault(fault("RM_ChangeWWN", "status = 1"));
-        Called called = wwn.change(1, first_vport, new_wwnn);
-        EXPECT_EQ(calls("RM_ChangeWWN"), 1u); // of the first change
-        load_scenario(host_with_vports(1));
-        return called;
-    }());
-}
-
-TEST(WwnServiceRestore, TellsEachActivationCode)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    const std::string done = "WWNs restored successfully";
-    const std::string reboot = "Reboot required to activate the new setting";
-    const std::string until = "Volatile names will be active until system power-down or HBA power-cycle";
-    const struct {
-        unsigned code;
-        Words words;
-        unsigned status;
-    } rows[] = {
-        {1, {"WWNs already active. No Restore needed"}, 1},
-        {5, {done, reboot, until}, 5},
-        {6, {done, reboot}, 6},
-        {7, {done, "Reset the HBA to activate the new setting", until}, 7},
-        {8, {done, "Please reset the HBA to activate the new setting"}, 8},
-        {0, {}, untold},
-        {2, {}, untold},
-        {9, {}, untold},
-        {65537, {}, untold},
-    };
-    for (const auto& row : rows) {
-        clear_faults();
-        add_fault(fault("RM_RestoreWWN", "value = " + std::to_string(row.code)));
-        const Called called = wwn.restore(1);
-        EXPECT_THAT(called, returned(0)) << row.code;
-        expect_status(called, row.status);
-        EXPECT_EQ(called.words,
-                  joined({opened("RestoreWWN"),
-                          {"Restoring Non-volatile World Wide Name...", "RestoreWWN operation initiated."},
-                          row.words,
-                          {gate_refreshing}}))
-            << row.code;
-    }
-}
-
-TEST(WwnServiceRestore, TakesEveryRefusalOfTheLibraryForDone)
-{
-    Rig rig({host::Manner::strict(), "small"});
-    Wwn wwn(rig);
-    const auto before = slept();
-    for (unsigned status = 1; status <= 260; status++) {
-        if (status == 97) continue;
-        clear_faults();
-        add_fault(fault("RM_RestoreWWN", "status = " + std::to_string(status)));
-        const Called called = wwn.restore(0);
-        EXPECT_THAT(called, returned(0));
-        expect_status(called, untold);
-        EXPECT_EQ(called.words, joined({opened("RestoreWWN"),
-                                        {"Restoring Factory Default World Wide Name...",
-                                         "RestoreWWN operation initiated.", gate_refreshing}}))
-            << status;
-    }
-    EXPECT_EQ(slept() - before, 0us);
-}
-
-TEST(WwnServiceRestore, WaitsForABusyLibraryAndGivesItUp)
-{
-    Rig rig;
-    Wwn wwn(rig);
-    const auto before = slept();
-    add_fault(fault("RM_RestoreWWN", "status = 97, times = 1"));
-    const Called patient = wwn.restore(0);
-    EXPECT_THAT(patient, returned(0));
-    expect_status(patient, 1);
-    EXPECT_EQ(patient.words,
-              joined({opened("RestoreWWN"),
-                      {"Restoring Factory Default World Wide Name...", "RestoreWWN operation initiated.",
-                       "Restoring WWNs...", "WWNs already active. No Restore needed", gate_refreshing}}));
-    EXPECT_EQ(slept() - before, 1s);
-    add_fault(fault("RM_RestoreWWN", "status = 97"));
-    const Called given_up = wwn.restore(0);
-    EXPECT_THAT(given_up, returned(0));
-    expect_status(given_up, untold);
-    EXPECT_EQ(given_up.words.back(), gate_refreshing);
-    EXPECT_EQ(calls("RM_RestoreWWN"), 2u + 301u);
-    EXPECT_EQ(slept() - before, 301s);
 }
 
 // An adapter that goes away is what a refresh shows; changed names themselves wait for their activation.
@@ -847,7 +457,7 @@ TEST(WwnServiceTargets, OfAHostWithoutLibrariesAreUnknown)
     Rig rig({host::Manner::strict(), "typical", {}, {"HBAAPI", "tssdm"}});
     host::Path path;
     path.name_space = "root/norvane";
-    path.class_name = service_class;
+    path.class_name = wwn_service_class;
     const host::Answer answer = rig.server().call(path, "GetWWNCapability");
     ASSERT_TRUE(answer.ok());
     EXPECT_EQ(answer.value, Value::uint32(32968));
