@@ -287,6 +287,13 @@ std::vector<const Class_Record*> Schema::family(const Class_Record& root) const
     return all;
 }
 
+std::string Schema::qualifier_type(const std::string& name) const
+{
+    for (const mof::Qualifier_Declaration& declaration : m_repository->qualifiers())
+        if (same_name(declaration.name, name)) return mof::type_name(declaration.type);
+    return "";
+}
+
 Value Schema::property_qualifier(const std::string& class_name, const std::string& property,
                                  const std::string& qualifier) const
 {

@@ -95,6 +95,8 @@ public:
     /// All classes, in the order of their declaration.
     const std::vector<const Class_Record*>& classes() const { return m_order; }
 
+    /// The type that a qualifier is declared with ("uint32", also of its array), or "" if it is not declared.
+    std::string qualifier_type(const std::string& name) const;
     /// The qualifier of a property, or a null value.
     Value property_qualifier(const std::string& class_name, const std::string& property,
                              const std::string& qualifier) const;

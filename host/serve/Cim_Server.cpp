@@ -3,6 +3,8 @@
 #include "host/serve/Xml_Writer.h"
 
 #include <algorithm>
+#include <cctype>
+#include <iterator>
 
 namespace host {
 namespace {
@@ -38,6 +40,29 @@ std::string unescaped(const std::string& text)
         }
     }
     return result;
+}
+
+/// What DSP0200 has answered by HTTP where the head and the body of a request do not agree.
+void check_head(const Request_Head& head, const Message& message)
+{
+    if (!head.method.empty() && !same_name(unescaped(head.method), message.method()))
+        throw Http_Fault{400, "header-mismatch", "CIMMethod is not the method of the message"};
+    // A method's object may name a class or an instance behind the namespace.
+    const std::string named = lower_case(unescaped(head.object)), name_space = lower_case(message.name_space());
+    const bool begins_with = named.compare(0, name_space.size(), name_space) == 0;
+    const bool ends_there = named.size() == name_space.size() || named[name_space.size()] == ':';
+    if (!named.empty() && !(begins_with && ends_there))
+        throw Http_Fault{400, "header-mismatch", "CIMObject is not the namespace of the message"};
+}
+
+/// What a server that has only this version, and one operation a message, cannot do at all.
+void check_abilities(const Request_Head& head)
+{
+    if (!head.operation.empty() && !same_name(head.operation, "MethodCall"))
+        throw Http_Fault{501, "unsupported-operation", "CIMOperation is not MethodCall"};
+    if (!head.version.empty() && head.version.compare(0, 2, "1.") != 0)
+        throw Http_Fault{501, "unsupported-protocol-version", "CIMProtocolVersion is not 1"};
+    if (!head.batch.empty()) throw Http_Fault{501, "multiple-requests-unsupported", "one request a message, please"};
 }
 
 std::string head(const Message& message)
@@ -105,25 +130,41 @@ struct Cim_Server::Content {
 struct Cim_Server::Operation {
     const char* name;
     Content (Cim_Server::*run)(const Message&);
+    std::vector<std::string> parameters;
 };
 
 const Cim_Server::Operation Cim_Server::operations[] = {
-    {"GetClass", &Cim_Server::get_class},
-    {"EnumerateClasses", &Cim_Server::enumerate_classes},
-    {"EnumerateClassNames", &Cim_Server::enumerate_class_names},
-    {"EnumerateInstances", &Cim_Server::enumerate_instances},
-    {"EnumerateInstanceNames", &Cim_Server::enumerate_instance_names},
-    {"GetInstance", &Cim_Server::get_instance},
-    {"CreateInstance", &Cim_Server::create_instance},
-    {"ModifyInstance", &Cim_Server::modify_instance},
-    {"DeleteInstance", &Cim_Server::delete_instance},
-    {"GetProperty", &Cim_Server::get_property},
-    {"SetProperty", &Cim_Server::set_property},
-    {"Associators", &Cim_Server::associators},
-    {"AssociatorNames", &Cim_Server::associator_names},
-    {"References", &Cim_Server::references},
-    {"ReferenceNames", &Cim_Server::reference_names},
-    {"ExecQuery", &Cim_Server::exec_query},
+    {"GetClass",
+     &Cim_Server::get_class,
+     {"ClassName", "LocalOnly", "IncludeQualifiers", "IncludeClassOrigin", "PropertyList"}},
+    {"EnumerateClasses",
+     &Cim_Server::enumerate_classes,
+     {"ClassName", "DeepInheritance", "LocalOnly", "IncludeQualifiers", "IncludeClassOrigin"}},
+    {"EnumerateClassNames", &Cim_Server::enumerate_class_names, {"ClassName", "DeepInheritance"}},
+    {"EnumerateInstances",
+     &Cim_Server::enumerate_instances,
+     {"ClassName", "LocalOnly", "DeepInheritance", "IncludeQualifiers", "IncludeClassOrigin", "PropertyList"}},
+    {"EnumerateInstanceNames", &Cim_Server::enumerate_instance_names, {"ClassName"}},
+    {"GetInstance",
+     &Cim_Server::get_instance,
+     {"InstanceName", "LocalOnly", "IncludeQualifiers", "IncludeClassOrigin", "PropertyList"}},
+    {"CreateInstance", &Cim_Server::create_instance, {"NewInstance"}},
+    {"ModifyInstance", &Cim_Server::modify_instance, {"ModifiedInstance", "IncludeQualifiers", "PropertyList"}},
+    {"DeleteInstance", &Cim_Server::delete_instance, {"InstanceName"}},
+    {"GetProperty", &Cim_Server::get_property, {"InstanceName", "PropertyName"}},
+    {"SetProperty", &Cim_Server::set_property, {"InstanceName", "PropertyName", "NewValue"}},
+    {"Associators",
+     &Cim_Server::associators,
+     {"ObjectName", "AssocClass", "ResultClass", "Role", "ResultRole", "IncludeQualifiers", "IncludeClassOrigin",
+      "PropertyList"}},
+    {"AssociatorNames",
+     &Cim_Server::associator_names,
+     {"ObjectName", "AssocClass", "ResultClass", "Role", "ResultRole"}},
+    {"References",
+     &Cim_Server::references,
+     {"ObjectName", "ResultClass", "Role", "IncludeQualifiers", "IncludeClassOrigin", "PropertyList"}},
+    {"ReferenceNames", &Cim_Server::reference_names, {"ObjectName", "ResultClass", "Role"}},
+    {"ExecQuery", &Cim_Server::exec_query, {"QueryLanguage", "Query"}},
 };
 
 Cim_Server::Cim_Server(Host& host, std::string address)
@@ -131,11 +172,12 @@ Cim_Server::Cim_Server(Host& host, std::string address)
 {
 }
 
-Reply Cim_Server::answer(std::string_view body, const std::string& method, const std::string& object)
+Reply Cim_Server::answer(std::string_view body, const Request_Head& request)
 {
     try {
-        const Message message(body, m_host.schema());
-        check_headers(message, method, object);
+        check_abilities(request);
+        const Message message(body, m_host.schema(), request.host.empty() ? m_address : request.host);
+        check_head(request, message);
         Content content;
         try {
             content = message.is_intrinsic() ? run(message) : invoke(message);
@@ -165,17 +207,6 @@ Reply Cim_Server::answer(std::string_view body, const std::string& method, const
     }
 }
 
-void Cim_Server::check_headers(const Message& message, const std::string& method, const std::string& object) const
-{
-    if (!method.empty() && !same_name(unescaped(method), message.method()))
-        throw Http_Fault{400, "header-mismatch", "CIMMethod is not the method of the message"};
-    // A method's object may name an instance behind the namespace.
-    const std::string named = unescaped(object);
-    if (!object.empty() &&
-        lower_case(named).compare(0, message.name_space().size(), lower_case(message.name_space())) != 0)
-        throw Http_Fault{400, "header-mismatch", "CIMObject is not the namespace of the message"};
-}
-
 void Cim_Server::check_name_space(const std::string& name_space) const
 {
     for (const Registration& each : m_host.registrations())
@@ -184,9 +215,8 @@ void Cim_Server::check_name_space(const std::string& name_space) const
     throw Cim_Fault{invalid_name_space, "there is no namespace " + name_space};
 }
 
-const Class_Record& Cim_Server::class_of(const Message& message, const std::string& name) const
+const Class_Record& Cim_Server::class_of(const std::string& name) const
 {
-    check_name_space(message.name_space());
     if (name.empty()) throw Cim_Fault{invalid_parameter, "no class is named"};
     const Class_Record* record = m_host.schema().find(name);
     if (!record) throw Cim_Fault{invalid_class, "there is no class " + name};
@@ -195,15 +225,22 @@ const Class_Record& Cim_Server::class_of(const Message& message, const std::stri
 
 Cim_Server::Content Cim_Server::run(const Message& message)
 {
-    for (const Operation& operation : operations)
-        if (same_name(operation.name, message.method())) return (this->*operation.run)(message);
+    for (const Operation& operation : operations) {
+        if (!same_name(operation.name, message.method())) continue;
+        check_name_space(message.name_space());
+        message.check_parameters(operation.parameters);
+        for (const char* flag : {"LocalOnly", "DeepInheritance", "IncludeQualifiers", "IncludeClassOrigin"})
+            message.flag(flag, false); // also where it changes nothing
+        return (this->*operation.run)(message);
+    }
     throw Cim_Fault{not_supported, "there is no operation " + message.method()};
 }
 
 Cim_Server::Content Cim_Server::invoke(const Message& message)
 {
+    check_name_space(message.name_space());
     const Path target = message.target();
-    const Class_Record& record = class_of(message, target.class_name);
+    const Class_Record& record = class_of(target.class_name);
     const Method_Record* method = record.method(message.method());
     if (!method) throw Cim_Fault{method_not_found, record.name + " has no method " + message.method()};
     const Answer answer = m_host.call(target, method->name, message.arguments(*method));
@@ -211,7 +248,7 @@ Cim_Server::Content Cim_Server::invoke(const Message& message)
     std::string text;
     if (!answer.value.is_null()) {
         text += "<RETURNVALUE";
-        write_attribute(text, "PARAMTYPE", type_name(answer.value.type()));
+        write_attribute(text, "PARAMTYPE", xml_type(answer.value.type()));
         text += '>';
         write_value(text, answer.value, m_host.schema());
         text += "</RETURNVALUE>";
@@ -227,17 +264,16 @@ Cim_Server::Content Cim_Server::get_class(const Message& message)
     options.qualifiers = message.flag("IncludeQualifiers", true);
     options.local_only = message.flag("LocalOnly", true);
     std::string text = "<IRETURNVALUE>";
-    write_class(text, class_of(message, message.class_name("ClassName")), options);
+    write_class(text, class_of(message.class_name("ClassName")), m_host.schema(), options);
     return Content::of(text + "</IRETURNVALUE>");
 }
 
 /// The direct subclasses of a class, or all below it; those without a superclass where no class is named.
 std::vector<const Class_Record*> Cim_Server::classes_asked(const Message& message) const
 {
-    check_name_space(message.name_space());
     const bool deep = message.flag("DeepInheritance", false);
     const std::string name = message.class_name("ClassName");
-    const Class_Record* root = name.empty() ? nullptr : &class_of(message, name);
+    const Class_Record* root = name.empty() ? nullptr : &class_of(name);
     std::vector<const Class_Record*> found;
     for (const Class_Record* record : m_host.schema().classes())
         if (deep ? record != root && (!root || record->is_a(root->name)) : record->super == root)
@@ -251,8 +287,8 @@ Cim_Server::Content Cim_Server::enumerate_classes(const Message& message)
     options.qualifiers = message.flag("IncludeQualifiers", true);
     options.local_only = message.flag("LocalOnly", true);
     auto classes = classes_asked(message);
-    return Content::list(classes.size(), [classes, options](std::string& out, std::size_t i) {
-        write_class(out, *classes[i], options);
+    return Content::list(classes.size(), [this, classes, options](std::string& out, std::size_t i) {
+        write_class(out, *classes[i], m_host.schema(), options);
     });
 }
 
@@ -266,15 +302,32 @@ Cim_Server::Content Cim_Server::enumerate_class_names(const Message& message)
     });
 }
 
+/// What of a list of properties a class itself has, and no subclass brings.
+static Property_List those_of(const Class_Record& record, const Property_List& asked)
+{
+    std::vector<std::string> names;
+    if (!asked)
+        for (const Element_Record& property : record.properties)
+            names.push_back(property.name);
+    else
+        std::copy_if(asked->begin(), asked->end(), std::back_inserter(names),
+                     [&](const std::string& name) { return record.property(name) != nullptr; });
+    return names;
+}
+
 Cim_Server::Content Cim_Server::enumerate_instances(const Message& message)
 {
-    const Write_Options options = options_of(message);
+    Write_Options options = options_of(message);
     const std::string name = message.class_name("ClassName");
+    const bool deep = message.flag("DeepInheritance", true);
     Answer answer;
-    if (m_subscriptions.serves(name))
+    if (m_subscriptions.serves(name)) {
         answer.instances = m_subscriptions.instances(name);
-    else
-        answer = m_host.enumerate(message.name_space(), class_of(message, name).name, options.properties);
+    } else {
+        const Class_Record& record = class_of(name);
+        if (!deep) options.properties = those_of(record, options.properties);
+        answer = m_host.enumerate(message.name_space(), record.name, options.properties);
+    }
     refuse_unless_ok(answer.status);
     auto instances = std::make_shared<std::vector<Instance>>(std::move(answer.instances));
     return Content::list(instances->size(), [this, instances, options](std::string& out, std::size_t i) {
@@ -293,7 +346,7 @@ Cim_Server::Content Cim_Server::enumerate_instance_names(const Message& message)
         for (const Instance& each : m_subscriptions.instances(name))
             answer.paths.push_back(each.path);
     } else {
-        answer = m_host.names(message.name_space(), class_of(message, name).name);
+        answer = m_host.names(message.name_space(), class_of(name).name);
     }
     refuse_unless_ok(answer.status);
     auto paths = std::make_shared<std::vector<Path>>(std::move(answer.paths));
@@ -309,7 +362,7 @@ Cim_Server::Content Cim_Server::get_instance(const Message& message)
     if (m_subscriptions.serves(path.class_name)) {
         if (const auto found = m_subscriptions.find(path)) answer.instances.push_back(*found);
     } else {
-        class_of(message, path.class_name);
+        class_of(path.class_name);
         answer = m_host.get(path, options.properties);
     }
     refuse_unless_ok(answer.status);
@@ -326,7 +379,7 @@ Cim_Server::Content Cim_Server::create_instance(const Message& message)
     if (m_subscriptions.serves(instance.path.class_name)) {
         path = m_subscriptions.create(std::move(instance));
     } else {
-        class_of(message, instance.path.class_name);
+        class_of(instance.path.class_name);
         const Answer answer = m_host.create(instance);
         refuse_unless_ok(answer.status);
         if (answer.paths.empty()) throw Cim_Fault{failed, "the provider names no path"};
@@ -342,7 +395,7 @@ Cim_Server::Content Cim_Server::modify_instance(const Message& message)
     const Instance instance = message.instance("ModifiedInstance");
     if (m_subscriptions.serves(instance.path.class_name))
         throw Cim_Fault{not_supported, "take the subscription back and make a new one"};
-    class_of(message, instance.path.class_name);
+    class_of(instance.path.class_name);
     refuse_unless_ok(m_host.modify(instance, message.property_list()).status);
     return {};
 }
@@ -354,7 +407,7 @@ Cim_Server::Content Cim_Server::delete_instance(const Message& message)
         m_subscriptions.remove(path);
         return {};
     }
-    class_of(message, path.class_name);
+    class_of(path.class_name);
     refuse_unless_ok(m_host.remove(path).status);
     return {};
 }
@@ -363,7 +416,7 @@ Cim_Server::Content Cim_Server::get_property(const Message& message)
 {
     const Path path = message.instance_name("InstanceName");
     const std::string name = message.text("PropertyName");
-    if (!class_of(message, path.class_name).property(name))
+    if (!class_of(path.class_name).property(name))
         throw Cim_Fault{no_such_property, path.class_name + " has no property " + name};
     const Answer answer = m_host.get_property(path, name);
     refuse_unless_ok(answer.status);
@@ -377,7 +430,7 @@ Cim_Server::Content Cim_Server::set_property(const Message& message)
 {
     const Path path = message.instance_name("InstanceName");
     const std::string name = message.text("PropertyName");
-    const Element_Record* property = class_of(message, path.class_name).property(name);
+    const Element_Record* property = class_of(path.class_name).property(name);
     if (!property) throw Cim_Fault{no_such_property, path.class_name + " has no property " + name};
     refuse_unless_ok(m_host.set_property(path, property->name, message.value("NewValue", *property)).status);
     return {};
@@ -387,22 +440,22 @@ Cim_Server::Content Cim_Server::with_paths(Answer answer, const Message& message
 {
     refuse_unless_ok(answer.status);
     auto instances = std::make_shared<std::vector<Instance>>(std::move(answer.instances));
-    return Content::list(instances->size(),
-                         [this, instances, options = options_of(message)](std::string& out, std::size_t i) {
-                             out += "<VALUE.OBJECTWITHPATH>";
-                             write_instance_path(out, (*instances)[i].path, m_address);
-                             write_instance(out, (*instances)[i], m_host.schema(), options);
-                             out += "</VALUE.OBJECTWITHPATH>";
-                         });
+    return Content::list(instances->size(), [this, instances, options = options_of(message),
+                                             server = message.server()](std::string& out, std::size_t i) {
+        out += "<VALUE.OBJECTWITHPATH>";
+        write_instance_path(out, (*instances)[i].path, server);
+        write_instance(out, (*instances)[i], m_host.schema(), options);
+        out += "</VALUE.OBJECTWITHPATH>";
+    });
 }
 
-Cim_Server::Content Cim_Server::only_paths(Answer answer)
+Cim_Server::Content Cim_Server::only_paths(Answer answer, const Message& message)
 {
     refuse_unless_ok(answer.status);
     auto paths = std::make_shared<std::vector<Path>>(std::move(answer.paths));
-    return Content::list(paths->size(), [this, paths](std::string& out, std::size_t i) {
+    return Content::list(paths->size(), [paths, server = message.server()](std::string& out, std::size_t i) {
         out += "<OBJECTPATH>";
-        write_instance_path(out, (*paths)[i], m_address);
+        write_instance_path(out, (*paths)[i], server);
         out += "</OBJECTPATH>";
     });
 }
@@ -418,7 +471,7 @@ static Path instance_of(const Message& message)
 Cim_Server::Content Cim_Server::associators(const Message& message)
 {
     const Path path = instance_of(message);
-    class_of(message, path.class_name);
+    class_of(path.class_name);
     return with_paths(m_host.associators(path, message.class_name("AssocClass"), message.class_name("ResultClass"),
                                          message.text("Role"), message.text("ResultRole"), message.property_list()),
                       message);
@@ -427,15 +480,16 @@ Cim_Server::Content Cim_Server::associators(const Message& message)
 Cim_Server::Content Cim_Server::associator_names(const Message& message)
 {
     const Path path = instance_of(message);
-    class_of(message, path.class_name);
+    class_of(path.class_name);
     return only_paths(m_host.associator_names(path, message.class_name("AssocClass"), message.class_name("ResultClass"),
-                                              message.text("Role"), message.text("ResultRole")));
+                                              message.text("Role"), message.text("ResultRole")),
+                      message);
 }
 
 Cim_Server::Content Cim_Server::references(const Message& message)
 {
     const Path path = instance_of(message);
-    class_of(message, path.class_name);
+    class_of(path.class_name);
     return with_paths(
         m_host.references(path, message.class_name("ResultClass"), message.text("Role"), message.property_list()),
         message);
@@ -444,13 +498,12 @@ Cim_Server::Content Cim_Server::references(const Message& message)
 Cim_Server::Content Cim_Server::reference_names(const Message& message)
 {
     const Path path = instance_of(message);
-    class_of(message, path.class_name);
-    return only_paths(m_host.reference_names(path, message.class_name("ResultClass"), message.text("Role")));
+    class_of(path.class_name);
+    return only_paths(m_host.reference_names(path, message.class_name("ResultClass"), message.text("Role")), message);
 }
 
 Cim_Server::Content Cim_Server::exec_query(const Message& message)
 {
-    check_name_space(message.name_space());
     throw Cim_Fault{not_supported, "queries are not served: " + message.text("Query")};
 }
 

@@ -12,8 +12,19 @@
 #include <memory>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace host {
+
+/// What the HTTP headers of a request say; "" where one is missing.
+struct Request_Head {
+    std::string operation; ///< CIMOperation
+    std::string method;    ///< CIMMethod
+    std::string object;    ///< CIMObject
+    std::string version;   ///< CIMProtocolVersion
+    std::string batch;     ///< CIMBatch
+    std::string host;      ///< Host: how the client names this server
+};
 
 struct Reply {
     unsigned status = 200;                    ///< of HTTP
@@ -23,19 +34,19 @@ struct Reply {
 
 class Cim_Server {
 public:
-    /// `address` is this server's own, as paths name it ("localhost:5988"). Both outlive the object.
+    /// `address` is what paths name this server for clients that do not name it themselves ("localhost:5988"). The host
+    /// outlives the object.
     Cim_Server(Host& host, std::string address);
 
-    /// `method` and `object` are the CIMMethod and CIMObject headers ("" for none); they must agree with the body.
-    Reply answer(std::string_view body, const std::string& method, const std::string& object);
+    /// What the head says must agree with the body.
+    Reply answer(std::string_view body, const Request_Head& head);
 
 private:
     struct Content;
     struct Operation;
 
-    void check_headers(const Message& message, const std::string& method, const std::string& object) const;
     void check_name_space(const std::string& name_space) const;
-    const Class_Record& class_of(const Message& message, const std::string& name) const;
+    const Class_Record& class_of(const std::string& name) const;
     Content run(const Message& message);
     Content invoke(const Message& message);
 
@@ -57,7 +68,7 @@ private:
     Content exec_query(const Message& message);
 
     Content with_paths(Answer answer, const Message& message);
-    Content only_paths(Answer answer);
+    Content only_paths(Answer answer, const Message& message);
     std::vector<const Class_Record*> classes_asked(const Message& message) const;
 
     static const Operation operations[];

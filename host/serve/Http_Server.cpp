@@ -1,5 +1,8 @@
 #include "host/serve/Http_Server.h"
 
+#include "host/serve/Deadlines.h"
+
+#include <algorithm>
 #include <arpa/inet.h>
 #include <cstring>
 #include <microhttpd.h>
@@ -8,6 +11,8 @@
 
 namespace host {
 namespace {
+
+constexpr std::size_t dropped_bytes = 256 * 1024 * 1024;
 
 /// One request while it comes in.
 struct Incoming {
@@ -32,8 +37,8 @@ ssize_t read_pieces(void* context, std::uint64_t, char* to, std::size_t room)
             out.sent = 0;
             if (!out.pieces(out.buffer)) return MHD_CONTENT_READER_END_OF_STREAM;
         }
-    } catch (const std::exception&) {
-        return MHD_CONTENT_READER_END_WITH_ERROR;
+    } catch (...) {
+        return MHD_CONTENT_READER_END_WITH_ERROR; // out of memory: the connection is closed
     }
     const std::size_t size = std::min(room, out.buffer.size() - out.sent);
     std::memcpy(to, out.buffer.data() + out.sent, size);
@@ -102,19 +107,35 @@ MHD_Result send(MHD_Connection* connection, Reply reply)
     return result;
 }
 
+int socket_of(MHD_Connection* connection)
+{
+    const MHD_ConnectionInfo* info = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD);
+    return info ? info->connect_fd : -1;
+}
+
+Request_Head head_of(MHD_Connection* connection)
+{
+    return {header(connection, "CIMOperation"),       header(connection, "CIMMethod"), header(connection, "CIMObject"),
+            header(connection, "CIMProtocolVersion"), header(connection, "CIMBatch"),  header(connection, "Host")};
+}
+
 } // namespace
 
 struct Http_Server::Parts {
     Cim_Server& server;
     Http_Options options;
     MHD_Daemon* daemon = nullptr;
+    Deadlines deadlines = {};
 
     /// What is wrong with a request before its body is read, or 0.
     unsigned objection(MHD_Connection* connection, const char* method) const
     {
         if (std::strcmp(method, "POST") != 0 && std::strcmp(method, "M-POST") != 0) return MHD_HTTP_METHOD_NOT_ALLOWED;
+        // Somewhat too much is taken and dropped: who still sends does not read an answer.
         const std::string length = header(connection, "Content-Length");
-        if (length.size() > 18 || (!length.empty() && std::strtoull(length.c_str(), nullptr, 10) > options.most_bytes))
+        const bool sends_at_once = header(connection, "Expect").empty();
+        const std::size_t most = sends_at_once ? std::max(options.most_bytes, dropped_bytes) : options.most_bytes;
+        if (length.size() > 18 || (!length.empty() && std::strtoull(length.c_str(), nullptr, 10) > most))
             return MHD_HTTP_CONTENT_TOO_LARGE;
         const std::string type = lower_case(header(connection, "Content-Type"));
         const bool is_xml = type.empty() || type.find("xml") != std::string::npos;
@@ -145,8 +166,20 @@ struct Http_Server::Parts {
         }
         if (incoming->refused) return MHD_YES;
         if (incoming->too_large) return refuse(connection, MHD_HTTP_CONTENT_TOO_LARGE, "The request is too large.\n");
-        return send(connection,
-                    server.answer(incoming->body, header(connection, "CIMMethod"), header(connection, "CIMObject")));
+        deadlines.take_off(socket_of(connection));
+        Reply reply = server.answer(incoming->body, head_of(connection));
+        deadlines.set(socket_of(connection), std::chrono::seconds(options.answer_seconds));
+        return send(connection, std::move(reply));
+    }
+
+    /// A connection has come or goes.
+    static void connected(void* context, MHD_Connection* connection, void**, MHD_ConnectionNotificationCode code)
+    {
+        auto& parts = *static_cast<Parts*>(context);
+        if (code == MHD_CONNECTION_NOTIFY_STARTED)
+            parts.deadlines.set(socket_of(connection), std::chrono::seconds(parts.options.request_seconds));
+        else
+            parts.deadlines.take_off(socket_of(connection));
     }
 
     static MHD_Result taken(void* context, MHD_Connection* connection, const char*, const char* method, const char*,
@@ -154,15 +187,18 @@ struct Http_Server::Parts {
     {
         try {
             return static_cast<Parts*>(context)->take(connection, method, data, size, state);
-        } catch (const std::exception&) {
-            return MHD_NO; // out of memory: the connection is closed
+        } catch (...) {
+            return MHD_NO; // as above
         }
     }
 
-    static void ended(void*, MHD_Connection*, void** state, MHD_RequestTerminationCode)
+    static void ended(void* context, MHD_Connection* connection, void** state, MHD_RequestTerminationCode)
     {
         delete static_cast<Incoming*>(*state);
         *state = nullptr;
+        // The next request on the connection has its own time.
+        auto& parts = *static_cast<Parts*>(context);
+        parts.deadlines.set(socket_of(connection), std::chrono::seconds(parts.options.request_seconds));
     }
 };
 
@@ -186,7 +222,8 @@ Http_Server::Http_Server(Cim_Server& server, const Http_Options& options) : m_pa
     }
     m_parts->daemon =
         MHD_start_daemon(flags, options.port, nullptr, nullptr, &Parts::taken, m_parts.get(), MHD_OPTION_SOCK_ADDR,
-                         address, MHD_OPTION_NOTIFY_COMPLETED, &Parts::ended, nullptr, MHD_OPTION_CONNECTION_LIMIT,
+                         address, MHD_OPTION_NOTIFY_COMPLETED, &Parts::ended, m_parts.get(),
+                         MHD_OPTION_NOTIFY_CONNECTION, &Parts::connected, m_parts.get(), MHD_OPTION_CONNECTION_LIMIT,
                          options.most_connections, MHD_OPTION_CONNECTION_TIMEOUT, options.idle_seconds, MHD_OPTION_END);
     if (!m_parts->daemon)
         throw std::runtime_error("cannot listen on " + options.address + " port " + std::to_string(options.port) +

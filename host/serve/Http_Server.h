@@ -1,7 +1,7 @@
 /// The HTTP side of the host: CIM-XML requests (DMTF DSP0200) to a Cim_Server, by GNU libmicrohttpd.
 ///
 /// For trying and testing: no encryption, no user names. Size and time of a request and the number of connections are
-/// bounded, so that a client that sends nothing, or too much, harms nobody else. Answers go out in chunks.
+/// bounded, so that a client that sends nothing, too slowly or too much harms nobody else. Answers go out in chunks.
 #pragma once
 
 #include "host/serve/Cim_Server.h"
@@ -17,6 +17,8 @@ struct Http_Options {
     std::uint16_t port = 5988;                 ///< 0 for any that is free
     std::size_t most_bytes = 16 * 1024 * 1024; ///< of a request's body
     unsigned idle_seconds = 30;                ///< until a silent connection is closed
+    unsigned request_seconds = 60;             ///< for a whole request to come in, however it trickles
+    unsigned answer_seconds = 600;             ///< for an answer to be taken
     unsigned most_connections = 256;
 };
 

@@ -1,15 +1,25 @@
 #include "host/serve/Message.h"
 
+#include "host/serve/Xml_Reader.h"
 #include "host/serve/Xml_Values.h"
+
+#include <algorithm>
 
 namespace host {
 namespace {
 
 constexpr int invalid_parameter = 4;
+constexpr std::size_t most_listed = 4096; ///< properties that a client asks for
 
 [[noreturn]] void refuse(const char* cim_error, const std::string& text)
 {
     throw Http_Fault{400, cim_error, text};
+}
+
+/// A parameter of another form than its operation declares.
+[[noreturn]] void refuse_form(const char* name, const char* wanted)
+{
+    throw Cim_Fault{invalid_parameter, std::string(name) + " holds no " + wanted};
 }
 
 pugi::xml_node child_or_refuse(const pugi::xml_node& node, const char* name)
@@ -21,21 +31,16 @@ pugi::xml_node child_or_refuse(const pugi::xml_node& node, const char* name)
 
 void check_version(const char* what, const char* version, const char* cim_error)
 {
-    if (version[0] != what[0] || version[1] != '.') refuse(cim_error, std::string("version ") + version);
+    if (version[0] != what[0] || version[1] != '.') throw Http_Fault{501, cim_error, std::string("version ") + version};
 }
 
 } // namespace
 
-Message::Message(std::string_view body, const Schema& schema)
-    : m_schema(schema), m_document(std::make_unique<pugi::xml_document>())
+Message::Message(std::string_view body, const Schema& schema, std::string server)
+    : m_schema(schema), m_document(std::make_unique<pugi::xml_document>()), m_server(std::move(server))
 {
-    if (!is_xml_text(body))
-        refuse("request-not-well-formed", "the request is not UTF-8, or has characters that XML has not");
-    const pugi::xml_parse_result result =
-        m_document->load_buffer(body.data(), body.size(), pugi::parse_default, pugi::encoding_utf8);
-    if (!result)
-        refuse("request-not-well-formed",
-               std::string(result.description()) + " at byte " + std::to_string(result.offset));
+    const std::string wrong = read_xml(body, *m_document);
+    if (!wrong.empty()) refuse("request-not-well-formed", wrong);
     const pugi::xml_node cim = m_document->child("CIM");
     if (!cim) refuse("request-not-valid", "no CIM element");
     check_version("2", cim.attribute("CIMVERSION").as_string(), "unsupported-cim-version");
@@ -67,12 +72,27 @@ pugi::xml_node Message::parameter(const char* name) const
 bool Message::has(const char* name) const
 {
     const pugi::xml_node found = parameter(name);
-    return found && found.first_child();
+    return bool(first_element(found));
+}
+
+void Message::check_parameters(const std::vector<std::string>& known) const
+{
+    std::vector<std::string> seen;
+    for (const pugi::xml_node& each : m_call.children("IPARAMVALUE")) {
+        const std::string name = lower_case(each.attribute("NAME").as_string());
+        const auto is_it = [&](const std::string& other) { return same_name(name, other); };
+        if (std::none_of(known.begin(), known.end(), is_it))
+            throw Cim_Fault{invalid_parameter, m_method + " has no parameter " + name};
+        if (std::any_of(seen.begin(), seen.end(), is_it)) throw Cim_Fault{invalid_parameter, name + " is there twice"};
+        seen.push_back(name);
+    }
 }
 
 std::string Message::text(const char* name) const
 {
-    return parameter(name).child_value("VALUE");
+    const pugi::xml_node value = parameter(name).child("VALUE");
+    if (!value && has(name)) refuse_form(name, "VALUE");
+    return text_of(value);
 }
 
 bool Message::flag(const char* name, bool otherwise) const
@@ -86,7 +106,9 @@ bool Message::flag(const char* name, bool otherwise) const
 
 std::string Message::class_name(const char* name) const
 {
-    return parameter(name).child("CLASSNAME").attribute("NAME").as_string();
+    const pugi::xml_node value = parameter(name).child("CLASSNAME");
+    if (!value && has(name)) refuse_form(name, "CLASSNAME");
+    return value.attribute("NAME").as_string();
 }
 
 Path Message::instance_name(const char* name) const
@@ -98,21 +120,23 @@ Path Message::instance_name(const char* name) const
 
 Path Message::object_name(const char* name) const
 {
-    const std::string class_only = class_name(name);
-    if (class_only.empty()) return instance_name(name);
+    const pugi::xml_node class_only = parameter(name).child("CLASSNAME");
+    if (!class_only) return instance_name(name);
     Path path;
     path.name_space = m_name_space;
-    path.class_name = class_only;
+    path.class_name = class_only.attribute("NAME").as_string();
     return path;
 }
 
 Property_List Message::property_list() const
 {
+    if (!has("PropertyList")) return std::nullopt;
     const pugi::xml_node array = parameter("PropertyList").child("VALUE.ARRAY");
-    if (!array) return std::nullopt;
+    if (!array) refuse_form("PropertyList", "VALUE.ARRAY");
     std::vector<std::string> names;
     for (const pugi::xml_node& value : array.children("VALUE"))
-        names.push_back(value.child_value());
+        names.push_back(text_of(value));
+    if (names.size() > most_listed) throw Cim_Fault{invalid_parameter, "PropertyList has too many names"};
     return names;
 }
 
@@ -151,33 +175,11 @@ std::vector<Named_Value> Message::arguments(const Method_Record& method) const
         const std::string name = node.attribute("NAME").as_string();
         const Element_Record* parameter = method.find_parameter(name);
         if (!parameter) throw Cim_Fault{invalid_parameter, method.name + " has no parameter " + name};
+        for (const Named_Value& earlier : arguments)
+            if (same_name(earlier.name, name)) throw Cim_Fault{invalid_parameter, name + " is there twice"};
         arguments.push_back({parameter->name, values.value(node, *parameter)});
     }
     return arguments;
-}
-
-bool is_xml_text(std::string_view text)
-{
-    for (std::size_t i = 0; i < text.size();) {
-        const unsigned char lead = static_cast<unsigned char>(text[i]);
-        if (lead < 0x80) {
-            if (lead < 0x20 && lead != '\t' && lead != '\n' && lead != '\r') return false;
-            ++i;
-            continue;
-        }
-        const std::size_t length = lead >= 0xF0 ? 4 : lead >= 0xE0 ? 3 : 2;
-        if (lead < 0xC2 || lead > 0xF4 || text.size() - i < length) return false;
-        unsigned long code = lead & (0x7Fu >> length);
-        for (std::size_t k = 1; k < length; ++k) {
-            const unsigned char next = static_cast<unsigned char>(text[i + k]);
-            if ((next & 0xC0) != 0x80) return false;
-            code = code << 6 | (next & 0x3F);
-        }
-        const unsigned long least[] = {0, 0, 0x80, 0x800, 0x10000};
-        if (code < least[length] || code > 0x10FFFF || (code >= 0xD800 && code < 0xE000)) return false;
-        i += length;
-    }
-    return true;
 }
 
 } // namespace host

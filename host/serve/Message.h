@@ -31,8 +31,10 @@ struct Cim_Fault {
 
 class Message {
 public:
-    /// Reads the body of a request. Throws Http_Fault.
-    Message(std::string_view body, const Schema& schema);
+    /// Reads the body of a request, which came to the server of this name. Throws Http_Fault.
+    Message(std::string_view body, const Schema& schema, std::string server = "");
+
+    const std::string& server() const { return m_server; }
 
     const std::string& id() const { return m_id; }
     /// The operation is one of CIM's own; otherwise it is a method of a class.
@@ -43,6 +45,8 @@ public:
     // Parameters of an intrinsic operation. A missing one gives the default; one of the wrong form throws Cim_Fault.
 
     bool has(const char* name) const;
+    /// Throws Cim_Fault if there is one that the operation does not know, or one twice.
+    void check_parameters(const std::vector<std::string>& known) const;
     std::string text(const char* name) const;
     bool flag(const char* name, bool otherwise) const;
     /// A class's name.
@@ -71,10 +75,7 @@ private:
     std::unique_ptr<pugi::xml_document> m_document;
     pugi::xml_node m_call;
     bool m_intrinsic = false;
-    std::string m_id, m_method, m_name_space;
+    std::string m_server, m_id, m_method, m_name_space;
 };
-
-/// True if `text` is UTF-8 without the characters that no XML can carry.
-bool is_xml_text(std::string_view text);
 
 } // namespace host

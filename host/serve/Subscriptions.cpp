@@ -10,8 +10,9 @@
 namespace host {
 namespace {
 
-constexpr int invalid_parameter = 4, invalid_class = 5, not_found = 6, already_exists = 11;
-constexpr std::size_t most_waiting = 10000;
+constexpr int failed = 1, invalid_parameter = 4, invalid_class = 5, not_found = 6, already_exists = 11,
+              unknown_language = 14;
+constexpr std::size_t most_waiting = 10000, most_kept = 1000, most_name_spaces = 16;
 constexpr long delivery_seconds = 10;
 
 constexpr const char* filter_class = "CIM_IndicationFilter";
@@ -28,16 +29,13 @@ bool is_destination(const std::string& class_name)
 /// Whatever names the same instance: clients and servers spell namespaces and hosts of such references as they like.
 bool is_same(const Path& a, const Path& b)
 {
-    Path left = a, right = b;
-    left.name_space = right.name_space = "";
-    for (Path* path : {&left, &right})
-        for (Named_Value& key : path->keys)
-            if (const Path* reference = key.value.as_path()) {
-                Path bare = *reference;
-                bare.name_space = bare.host = "";
-                key.value = Value::reference(bare);
-            }
-    return left == right;
+    if (!same_name(a.class_name, b.class_name) || a.keys.size() != b.keys.size()) return false;
+    return std::all_of(a.keys.begin(), a.keys.end(), [&](const Named_Value& key) {
+        const Value* other = b.find(key.name);
+        if (!other) return false;
+        const Path *left = key.value.as_path(), *right = other->as_path();
+        return left && right ? is_same(*left, *right) : key.value == *other;
+    });
 }
 
 /// The class behind FROM in a query of WQL or CQL.
@@ -47,6 +45,14 @@ std::string class_in(const std::string& query)
     for (std::string word; words >> word;)
         if (same_name(word, "from") && words >> word) return word;
     return "";
+}
+
+/// An address that a delivery can go to, and nothing that could end its line in a request.
+bool is_address(const std::string& url)
+{
+    const std::string start = lower_case(url.substr(0, 8));
+    const bool is_known = start.compare(0, 7, "http://") == 0 || start == "https://";
+    return is_known && std::all_of(url.begin(), url.end(), [](unsigned char c) { return c > ' ' && c != 0x7F; });
 }
 
 std::size_t drop(char*, std::size_t size, std::size_t count, void*)
@@ -64,6 +70,7 @@ void post(const std::string& url, const std::string& body)
         headers = curl_slist_append(headers, line);
     curl_easy_setopt(handle, CURLOPT_URL, url.c_str());
     curl_easy_setopt(handle, CURLOPT_PROTOCOLS_STR, "http,https");
+    curl_easy_setopt(handle, CURLOPT_NOPROXY, "*");
     curl_easy_setopt(handle, CURLOPT_HTTPHEADER, headers);
     curl_easy_setopt(handle, CURLOPT_POSTFIELDSIZE, static_cast<long>(body.size()));
     curl_easy_setopt(handle, CURLOPT_POSTFIELDS, body.data());
@@ -87,7 +94,7 @@ Subscriptions::Subscriptions(Host& host) : m_host(host)
 Subscriptions::~Subscriptions()
 {
     for (const Entry& entry : m_entries)
-        if (entry.id) m_host.unsubscribe(entry.id);
+        end(entry.ids);
     {
         std::lock_guard<std::mutex> hold(m_queue_mutex);
         m_stopped = true;
@@ -138,38 +145,81 @@ Path Subscriptions::create(Instance instance)
         }
         instance.path.set(key, instance.get(key));
     }
-    if (find(instance.path)) throw Cim_Fault{already_exists, "there is such an instance already"};
-    // The providers are asked without the lock: they may deliver at once.
-    const int id = is_subscription ? activate(instance) : 0;
-    std::lock_guard<std::mutex> hold(m_mutex);
-    m_entries.push_back({instance, id});
+    if (is_destination(instance.path.class_name) && !is_address(instance.get("Destination").as_text()))
+        throw Cim_Fault{invalid_parameter, "Destination is no address of http or https"};
+    const auto is_it = [&](const Entry& entry) { return is_same(entry.instance.path, instance.path); };
+    {
+        std::lock_guard<std::mutex> hold(m_mutex);
+        if (std::any_of(m_entries.begin(), m_entries.end(), is_it))
+            throw Cim_Fault{already_exists, "there is such an instance already"};
+        if (m_entries.size() >= most_kept) throw Cim_Fault{failed, "there are too many already"};
+        m_entries.push_back({instance});
+    }
+    if (!is_subscription) return instance.path;
+    // The providers are asked without the lock: they may deliver at once. The entry keeps its place meanwhile, and
+    // holds its filter and destination.
+    std::vector<int> ids;
+    try {
+        ids = activate(instance);
+    } catch (...) {
+        std::lock_guard<std::mutex> hold(m_mutex);
+        m_entries.erase(std::remove_if(m_entries.begin(), m_entries.end(), is_it), m_entries.end());
+        throw;
+    }
+    {
+        std::lock_guard<std::mutex> hold(m_mutex);
+        const auto at = std::find_if(m_entries.begin(), m_entries.end(), is_it);
+        if (at != m_entries.end()) at->ids.swap(ids);
+    }
+    end(ids); // another client has taken it back already
     return instance.path;
 }
 
-int Subscriptions::activate(const Instance& subscription)
+void Subscriptions::end(const std::vector<int>& ids)
+{
+    for (const int id : ids)
+        m_host.unsubscribe(id);
+}
+
+std::vector<int> Subscriptions::activate(const Instance& subscription)
 {
     const Path* filter_path = subscription.get("Filter").as_path();
     const Path* handler_path = subscription.get("Handler").as_path();
     const std::optional<Instance> filter = filter_path ? find(*filter_path) : std::nullopt;
     const std::optional<Instance> handler = handler_path ? find(*handler_path) : std::nullopt;
-    if (!filter || !handler) throw Cim_Fault{not_found, "the filter or the destination does not exist"};
+    if (!filter || !same_name(filter->path.class_name, filter_class) || !handler ||
+        !is_destination(handler->path.class_name))
+        throw Cim_Fault{not_found, "the filter or the destination does not exist"};
     const std::string query = filter->get("Query").as_text(), url = handler->get("Destination").as_text();
-    const std::string class_name = class_in(query);
+    const std::string class_name = class_in(query), language = filter->get("QueryLanguage").as_text();
+    const char* const languages[] = {"", "WQL", "CQL", "DMTF:CQL"};
+    if (std::none_of(std::begin(languages), std::end(languages),
+                     [&](const char* known) { return same_name(language, known); }))
+        throw Cim_Fault{unknown_language, "no queries of " + language};
     if (!m_host.schema().find(class_name)) throw Cim_Fault{invalid_class, "the filter names no class: " + query};
-    std::string name_space = filter->get("SourceNamespace").as_text();
-    const std::vector<Value>& name_spaces = filter->get("SourceNamespaces").elements();
-    if (name_space.empty() && !name_spaces.empty()) name_space = name_spaces[0].as_text();
-    if (name_space.empty()) name_space = "root/norvane";
-    int id = 0;
-    const Status status = m_host.subscribe(
-        name_space, class_name, [this, url](const Indication& indication) { queue(url, indication); }, id, query);
-    if (!status.ok()) throw Cim_Fault{status.code <= 17 ? status.code : 1, status.message};
-    return id;
+    std::vector<std::string> name_spaces;
+    for (const Value& each : filter->get("SourceNamespaces").elements())
+        name_spaces.push_back(each.as_text());
+    if (name_spaces.size() > most_name_spaces) throw Cim_Fault{invalid_parameter, "SourceNamespaces has too many"};
+    if (name_spaces.empty()) name_spaces.push_back(filter->get("SourceNamespace").as_text());
+    std::vector<int> ids;
+    for (const std::string& name_space : name_spaces) {
+        int id = 0;
+        const Status status = m_host.subscribe(
+            name_space.empty() ? "root/norvane" : name_space, class_name,
+            [this, url](const Indication& indication) { queue(url, indication); }, id, query);
+        if (!status.ok()) {
+            end(ids);
+            throw Cim_Fault{status.code > 0 && status.code <= 17 ? status.code : failed, status.message};
+        }
+        ids.push_back(id);
+    }
+    return ids;
 }
 
 void Subscriptions::remove(const Path& path)
 {
-    int id = 0;
+    std::vector<int> ids;
     {
         std::lock_guard<std::mutex> hold(m_mutex);
         const auto at = std::find_if(m_entries.begin(), m_entries.end(),
@@ -178,11 +228,11 @@ void Subscriptions::remove(const Path& path)
         for (const Entry& entry : m_entries)
             for (const char* end : {"Filter", "Handler"})
                 if (const Path* reference = entry.instance.get(end).as_path(); reference && is_same(*reference, path))
-                    throw Cim_Fault{1, "a subscription uses it"};
-        id = at->id;
+                    throw Cim_Fault{failed, "a subscription uses it"};
+        ids.swap(at->ids);
         m_entries.erase(at);
     }
-    if (id) m_host.unsubscribe(id);
+    end(ids);
 }
 
 void Subscriptions::queue(const std::string& url, const Indication& indication)

@@ -1,9 +1,9 @@
 /// Indication subscriptions of clients: filters, listener destinations and the subscriptions that tie them, as a CIM
 /// server keeps them for its clients (DMTF DSP1054); and the delivery to the listeners' HTTP addresses (DSP0200).
 ///
-/// Kept in memory, for as long as the server runs. Any thread. Deliveries have a thread of their own, so that a slow
-/// listener holds up neither the module nor a client; when too many wait, the oldest is dropped. Operations that fail
-/// throw Cim_Fault.
+/// Kept in memory, for as long as the server runs; their number is bounded. Any thread. Deliveries have a thread of
+/// their own, so that a slow listener holds up neither the module nor a client; when too many wait, the oldest is
+/// dropped. Operations that fail throw Cim_Fault.
 #pragma once
 
 #include "host/Host.h"
@@ -39,13 +39,14 @@ public:
 private:
     struct Entry {
         Instance instance;
-        int id = 0; ///< of an active subscription at the host
+        std::vector<int> ids = {}; ///< of an active subscription at the host, one a namespace
     };
     struct Delivery {
         std::string url, body;
     };
 
-    int activate(const Instance& subscription);
+    std::vector<int> activate(const Instance& subscription);
+    void end(const std::vector<int>& ids);
     void queue(const std::string& url, const Indication& indication);
     void deliver_all();
 

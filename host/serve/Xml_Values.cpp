@@ -2,11 +2,14 @@
 
 #include "host/ScalarText.h"
 #include "host/serve/Message.h"
+#include "host/serve/Xml_Reader.h"
 
 namespace host {
 namespace {
 
 constexpr int deepest = 8;
+// Of what the schema does not bound: each new name is compared with those before it.
+constexpr std::size_t most_keys = 64, most_undeclared = 1024;
 
 [[noreturn]] void refuse(const std::string& text)
 {
@@ -65,12 +68,12 @@ Xml_Values Xml_Values::deeper() const
 
 Path Xml_Values::reference(const pugi::xml_node& value_reference) const
 {
-    pugi::xml_node node = value_reference.first_child();
+    pugi::xml_node node = first_element(value_reference);
     const std::string form = node.name();
     std::string name_space = m_name_space, host;
     if (form == "INSTANCEPATH" || form == "CLASSPATH") {
         const pugi::xml_node path = node.child("NAMESPACEPATH");
-        host = path.child_value("HOST");
+        host = text_of(path.child("HOST"));
         name_space = read_name_space(path.child("LOCALNAMESPACEPATH"));
     } else if (form == "LOCALINSTANCEPATH" || form == "LOCALCLASSPATH") {
         name_space = read_name_space(node.child("LOCALNAMESPACEPATH"));
@@ -93,19 +96,22 @@ Path Xml_Values::reference(const pugi::xml_node& value_reference) const
 
 Value Xml_Values::key(const pugi::xml_node& node, const std::string& name, const Class_Record* of_class) const
 {
-    if (const pugi::xml_node reference_node = node.child("VALUE.REFERENCE"))
+    const Element_Record* element = of_class ? of_class->property(name) : nullptr;
+    if (const pugi::xml_node reference_node = node.child("VALUE.REFERENCE")) {
+        if (element && element->type != CMPI_ref) refuse("the key " + name + " is no reference");
         return Value::reference(reference(reference_node));
+    }
     const pugi::xml_node value = node.child("KEYVALUE");
     if (!value) refuse("the key " + name + " has no value");
     CMPIType type = CMPI_string;
-    if (const Element_Record* element = of_class ? of_class->property(name) : nullptr)
+    if (element)
         type = element->type;
     else if (same_name(value.attribute("VALUETYPE").as_string(), "boolean"))
         type = CMPI_boolean;
     else if (same_name(value.attribute("VALUETYPE").as_string(), "numeric"))
         type = CMPI_sint64;
     Value result;
-    const std::string wrong = read_scalar(value.child_value(), type, result);
+    const std::string wrong = read_scalar(text_of(value), type, result);
     if (!wrong.empty()) refuse("the key " + name + ": " + wrong);
     return result;
 }
@@ -118,7 +124,10 @@ Path Xml_Values::instance_name(const pugi::xml_node& node) const
     const Class_Record* of_class = m_schema.find(path.class_name);
     for (const pugi::xml_node& binding : node.children("KEYBINDING")) {
         const std::string name = binding.attribute("NAME").as_string();
-        if (of_class && !of_class->property(name)) refuse(of_class->name + " has no key " + name);
+        const Element_Record* element = of_class ? of_class->property(name) : nullptr;
+        if (of_class && !(element && element->key)) refuse(of_class->name + " has no key " + name);
+        if (path.find(name)) refuse("the key " + name + " is there twice");
+        if (path.keys.size() >= most_keys) refuse("too many keys");
         path.set(name, key(binding, name, of_class));
     }
     // A single key may stand without its name.
@@ -133,13 +142,12 @@ Path Xml_Values::instance_name(const pugi::xml_node& node) const
 
 Value Xml_Values::scalar(const pugi::xml_node& node, const Element_Record& element) const
 {
-    const std::string text = node.child_value();
+    const std::string text = text_of(node);
     const CMPIType type = static_cast<CMPIType>(element.type & ~CMPI_ARRAY);
     if (element.embedded) {
         pugi::xml_document document;
-        if (!document.load_buffer(text.data(), text.size(), pugi::parse_default, pugi::encoding_utf8) ||
-            !document.child("INSTANCE"))
-            refuse(element.name + " holds no instance");
+        if (const std::string wrong = read_xml(text, document); !wrong.empty()) refuse(element.name + ": " + wrong);
+        if (!document.child("INSTANCE")) refuse(element.name + " holds no instance");
         return Value::instance(deeper().instance(document.child("INSTANCE")));
     }
     if (type == CMPI_char16) return character(text, element.name);
@@ -160,6 +168,7 @@ Value Xml_Values::value(const pugi::xml_node& parent, const Element_Record& elem
         if (!array) return Value::null_of(element.type);
         std::vector<Value> elements;
         for (const pugi::xml_node& node : array.children()) {
+            if (node.type() != pugi::node_element) continue;
             const std::string form = node.name();
             if (form == "VALUE.NULL")
                 elements.push_back(Value::null_of(type));
@@ -192,6 +201,8 @@ Instance Xml_Values::instance(const pugi::xml_node& node) const
         const std::string name = child.attribute("NAME").as_string();
         const Element_Record* declared = of_class ? of_class->property(name) : nullptr;
         if (of_class && !declared) refuse(of_class->name + " has no property " + name);
+        if (result.find(name)) refuse("the property " + name + " is there twice");
+        if (result.properties.size() >= most_undeclared) refuse("too many properties");
         const Element_Record element = declared ? *declared : undeclared(child);
         result.set(element.name, value(child, element));
         if (element.key && !result.get(element.name).is_null()) result.path.set(element.name, result.get(element.name));
@@ -202,7 +213,9 @@ Instance Xml_Values::instance(const pugi::xml_node& node) const
 Instance Xml_Values::named_instance(const pugi::xml_node& node) const
 {
     Instance result = instance(node.child("INSTANCE"));
-    result.path = instance_name(node.child("INSTANCENAME"));
+    const Path named = instance_name(node.child("INSTANCENAME"));
+    if (!same_name(named.class_name, result.path.class_name)) refuse("an instance of another class than its name's");
+    result.path = named;
     return result;
 }
 

@@ -1,21 +1,13 @@
 #include "host/serve/Xml_Writer.h"
 
 #include "host/ScalarText.h"
-#include "host/serve/Message.h"
+#include "host/serve/Xml_Reader.h"
 #include "mof/Model.h"
 
 #include <algorithm>
 
 namespace host {
 namespace {
-
-/// "string", "uint32", "reference": types as attributes have them.
-std::string xml_type(CMPIType type)
-{
-    type = static_cast<CMPIType>(type & ~CMPI_ARRAY);
-    if (type == CMPI_instance || type == CMPI_chars || type == CMPI_null) return "string";
-    return type == CMPI_ref ? "reference" : type_name(type);
-}
 
 bool is_wanted(const Write_Options& options, const std::string& name)
 {
@@ -140,13 +132,15 @@ const char* literal_type(const mof::Value& value)
     }
 }
 
-void write_qualifiers(std::string& out, const mof::Qualifiers& qualifiers, const Write_Options& options)
+void write_qualifiers(std::string& out, const mof::Qualifiers& qualifiers, const Schema& schema,
+                      const Write_Options& options)
 {
     if (!options.qualifiers) return;
     for (const mof::Qualifier& qualifier : qualifiers) {
         out += "<QUALIFIER";
         write_attribute(out, "NAME", qualifier.name);
-        write_attribute(out, "TYPE", literal_type(qualifier.value));
+        const std::string declared = schema.qualifier_type(qualifier.name);
+        write_attribute(out, "TYPE", declared.empty() ? literal_type(qualifier.value) : declared);
         out += '>';
         write_literals(out, qualifier.value);
         out += "</QUALIFIER>";
@@ -168,7 +162,7 @@ void open_element(std::string& out, const std::string& tag, const mof::Typed_Ele
     out += '>';
 }
 
-void write_feature(std::string& out, const mof::Feature& feature, const Write_Options& options)
+void write_feature(std::string& out, const mof::Feature& feature, const Schema& schema, const Write_Options& options)
 {
     const bool is_array = feature.subscript != 0;
     const std::string tag = feature.kind == mof::Feature::Kind::method      ? "METHOD"
@@ -176,20 +170,27 @@ void write_feature(std::string& out, const mof::Feature& feature, const Write_Op
                             : is_array                                      ? "PROPERTY.ARRAY"
                                                                             : "PROPERTY";
     open_element(out, tag, feature, options.class_origin ? feature.origin : "");
-    write_qualifiers(out, feature.qualifiers, options);
+    write_qualifiers(out, feature.qualifiers, schema, options);
     if (feature.has_default && feature.kind == mof::Feature::Kind::property) write_literals(out, feature.default_value);
     for (const mof::Parameter& parameter : feature.parameters) {
         std::string kind = parameter.type == mof::Type::reference ? "PARAMETER.REFERENCE" : "PARAMETER";
         if (parameter.subscript)
             kind = parameter.type == mof::Type::reference ? "PARAMETER.REFARRAY" : "PARAMETER.ARRAY";
         open_element(out, kind, parameter, "");
-        write_qualifiers(out, parameter.qualifiers, options);
+        write_qualifiers(out, parameter.qualifiers, schema, options);
         out += "</" + kind + ">";
     }
     out += "</" + tag + ">";
 }
 
 } // namespace
+
+std::string xml_type(CMPIType type)
+{
+    type = static_cast<CMPIType>(type & ~CMPI_ARRAY);
+    if (type == CMPI_instance || type == CMPI_chars || type == CMPI_null) return "string";
+    return type == CMPI_ref ? "reference" : type_name(type);
+}
 
 void write_text(std::string& out, const std::string& text)
 {
@@ -307,21 +308,21 @@ void write_instance(std::string& out, const Instance& instance, const Schema& sc
     out += "</INSTANCE>";
 }
 
-void write_class(std::string& out, const Class_Record& record, const Write_Options& options)
+void write_class(std::string& out, const Class_Record& record, const Schema& schema, const Write_Options& options)
 {
     out += "<CLASS";
     write_attribute(out, "NAME", record.name);
     if (record.super) write_attribute(out, "SUPERCLASS", record.super->name);
     out += '>';
     if (record.declaration) {
-        write_qualifiers(out, record.declaration->qualifiers, options);
+        write_qualifiers(out, record.declaration->qualifiers, schema, options);
         // The order of the DTD: properties and references first, methods behind them.
         for (const bool methods : {false, true})
             for (const auto& feature : record.declaration->features) {
                 if ((feature->kind == mof::Feature::Kind::method) != methods) continue;
                 if (options.local_only && !same_name(feature->origin, record.name)) continue;
                 if (!methods && !is_wanted(options, feature->name)) continue;
-                write_feature(out, *feature, options);
+                write_feature(out, *feature, schema, options);
             }
     }
     out += "</CLASS>";

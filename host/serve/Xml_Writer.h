@@ -14,6 +14,9 @@ void write_text(std::string& out, const std::string& text);
 /// ` NAME="value"`
 void write_attribute(std::string& out, const char* name, const std::string& value);
 
+/// "string", "uint32", "reference": a type as attributes have it, also of an array's elements.
+std::string xml_type(CMPIType type);
+
 /// INSTANCENAME
 void write_instance_name(std::string& out, const Path& path);
 /// INSTANCEPATH; `host` stands for a path that names none.
@@ -32,7 +35,7 @@ struct Write_Options {
 /// INSTANCE
 void write_instance(std::string& out, const Instance& instance, const Schema& schema, const Write_Options& options);
 /// CLASS
-void write_class(std::string& out, const Class_Record& record, const Write_Options& options);
+void write_class(std::string& out, const Class_Record& record, const Schema& schema, const Write_Options& options);
 
 /// VALUE, VALUE.ARRAY, VALUE.REFERENCE or VALUE.REFARRAY; nothing for null.
 void write_value(std::string& out, const Value& value, const Schema& schema);
