@@ -56,7 +56,7 @@ void ProviderAgent::construct(int errno_found)
 ProviderAgent::~ProviderAgent()
 {
     if (guarded([this] { destruct(); })) return;
-    letGoAtExit();
+    guarded([] { saveAtEnd(); });
     NVR_LOG("Error in ProviderAgent unload. Just continue");
     CLogger::instance()->detachAll(); // the loggers go with the members
 }
@@ -83,8 +83,7 @@ void ProviderAgent::destruct()
     ClearMaps();
     forgetBaseServerProfile();
 
-    letGoAtExit();
-    CLogger::instance()->saveSettings();
+    saveAtEnd();
     NVR_LOG("Norvane Provider Unloaded");
     unloadLibraries();
     CLogger::instance()->detachAll();

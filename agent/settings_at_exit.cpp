@@ -3,6 +3,7 @@
 #include <atomic>
 #include <cstdlib>
 #include <unistd.h>
+#include <utility>
 
 #include "agent/guarded.h"
 #include "foundation/CLogger.h"
@@ -14,7 +15,7 @@ namespace cimple {
 
 namespace {
 
-Mutex mutex(false); // held for moments only
+Mutex mutex(false); // held while the two files are written, and for moments
 NvrConfigFile* living = nullptr;
 std::atomic<pid_t> owner{0};
 bool registered = false;
@@ -26,7 +27,7 @@ void save()
         guarded([] {
             Management_Session::forgetName();
             CLogger::instance()->saveSettingsAtExit();
-            living->save();
+            living->saveForGood();
         });
     mutex.unlock();
 }
@@ -41,10 +42,13 @@ void saveAtExit(NvrConfigFile& config)
     if (!registered) registered = std::atexit(save) == 0;
 }
 
-void letGoAtExit()
+void saveAtEnd()
 {
     const Auto_Mutex lock(mutex);
-    living = nullptr;
+    if (NvrConfigFile* config = std::exchange(living, nullptr)) {
+        CLogger::instance()->saveSettings();
+        config->saveForGood();
+    }
 }
 
 } // namespace cimple

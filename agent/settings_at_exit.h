@@ -10,9 +10,11 @@ namespace cimple {
 
 class NvrConfigFile;
 
-/// Once both settings files are read: an exit from now on writes them. `config` stays until letGoAtExit.
+/// Once both settings files are read: an exit from now on writes them. `config` stays until saveAtEnd.
 void saveAtExit(NvrConfigFile& config);
-/// Before the agent writes them itself. Waits for an exit that is writing them. May be called in vain.
-void letGoAtExit();
+/// The agent's end writes them itself, both in one hold, so that an exit meanwhile finds them either not yet written or
+/// whole; it waits for an exit that is writing them, and leaves alone what that one wrote. May be called in vain, and
+/// again after it threw.
+void saveAtEnd();
 
 } // namespace cimple

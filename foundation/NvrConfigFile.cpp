@@ -63,7 +63,7 @@ bool read_timeout(const char* value, std::atomic<uint32>& minutes)
 
 NvrConfigFile::~NvrConfigFile()
 {
-    save();
+    saveForGood();
 }
 
 void NvrConfigFile::load(const char* path)
@@ -114,6 +114,13 @@ void NvrConfigFile::save()
                   getRefreshAdapterData() ? "TRUE" : "FALSE", key_refresh_san_data,
                   getRefreshSANData() ? "TRUE" : "FALSE");
     write_text(m_path.c_str(), text);
+}
+
+void NvrConfigFile::saveForGood()
+{
+    if (m_saved_for_good) return;
+    m_saved_for_good = true;
+    save();
 }
 
 uint32 NvrConfigFile::getCacheTimeout() const

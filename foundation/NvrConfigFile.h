@@ -15,7 +15,7 @@ namespace cimple {
 class NvrConfigFile {
 public:
     NvrConfigFile() = default;
-    /// Saves.
+    /// Saves, unless that was done for good.
     ~NvrConfigFile();
     NvrConfigFile(const NvrConfigFile&) = delete;
     NvrConfigFile& operator=(const NvrConfigFile&) = delete;
@@ -25,6 +25,8 @@ public:
     void load(const char* path);
     /// Writes the file anew at the stored path, if it can be opened.
     void save();
+    /// The same once: the object leaves the file alone afterwards. Not to be called by two threads at once.
+    void saveForGood();
 
     /// Minutes, 1 to 30.
     uint32 getCacheTimeout() const;
@@ -41,6 +43,7 @@ private:
     std::atomic<bool> m_refreshSANData{true};
     std::atomic<uint32> m_cacheTimeout{10};
     String m_path;
+    bool m_saved_for_good = false;
 };
 
 /// The agent's settings file.

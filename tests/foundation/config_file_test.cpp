@@ -186,6 +186,22 @@ TEST_F(ConfigFile, IsSavedInSixLines)
     EXPECT_EQ(read_file(path), written(7, "TRUE", "FALSE"));
 }
 
+TEST(ConfigFileEnd, LeavesAFileAloneThatWasSavedForGood)
+{
+    {
+        NvrConfigFile config;
+        errno = 0;
+        config.load(provider_config_path);
+        EXPECT_EQ(config.setCacheTimeout(30), 0);
+        config.saveForGood();
+        EXPECT_EQ(read_file(path), written(30, "FALSE", "TRUE"));
+        write_file(path, "another's");
+        config.saveForGood();
+    }
+    EXPECT_EQ(read_file(path), "another's");
+    remove(path);
+}
+
 TEST(ConfigFileEnd, SavesAlsoWhereNoFileWas)
 {
     {

@@ -170,6 +170,82 @@ TEST(Exit, AfterTheLastCleanUpWritesNothingMore)
     EXPECT_FALSE(exists(dmp_path));
 }
 
+TEST(Exit, WhileTheAgentLetsGoOfItsLibrariesFindsBothFilesWritten)
+{
+    const Ended ended = exit_after([] {
+        Rig& rig = lasting_rig({host::Manner::strict(), "small"});
+        set_minutes(rig, 17);
+        rig.settle();
+        remove(conf_path);
+        remove(dmp_path);
+        // The last that the agent's end does.
+        add_fault("call = \"HBA_FreeLibrary\", delay_ms = 600000");
+        std::thread([&] { rig.stop(); }).detach();
+        wait_for_call("HBA_FreeLibrary");
+    });
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(read_file(conf_path), six_lines);
+    EXPECT_EQ(read_file(dmp_path), std::string("2,5,1\n") + trace_path);
+    EXPECT_FALSE(exists(ended.guard));
+}
+
+// Each finds the other's work not begun or done, so that no file is ever cut short.
+TEST(Exit, AtAnyMomentOfTheAgentsEndLeavesWholeFiles)
+{
+    for (int round = 0; round < 20; round++) {
+        const Ended ended = exit_after([round] {
+            Rig& rig = lasting_rig({host::Manner::strict(), "small"});
+            set_minutes(rig, 17);
+            rig.settle();
+            remove(conf_path);
+            remove(dmp_path);
+            std::thread([&] { rig.stop(); }).detach();
+            while (rig.count_words("Entering the function ~ProviderAgent()") == 0)
+                std::this_thread::yield();
+            std::this_thread::sleep_for(std::chrono::microseconds(round * 50));
+        });
+        ASSERT_EQ(ended.status, 0) << round;
+        ASSERT_EQ(read_file(conf_path), six_lines) << round;
+        ASSERT_EQ(read_file(dmp_path), std::string("2,5,1\n") + trace_path) << round;
+    }
+}
+
+TEST(Exit, AtAnyMomentOfAChangeOfTheLogLeavesOneOfItsStates)
+{
+    const std::string paths[] = {"/var/log/one.trace", "/var/log/another.trace"};
+    for (int round = 0; round < 20; round++) {
+        const Ended ended = exit_after([&, round] {
+            Rig& rig = lasting_rig(in_sfcb);
+            host::Path log;
+            log.name_space = "root/norvane";
+            log.class_name = "NVRHBA_RecordLog";
+            log.set("InstanceID", host::Value::string("NVRHBA:ProviderLog:" + std::string(rig_host_name)));
+            static std::atomic<int> changes{0};
+            std::thread([&rig, log, paths] {
+                for (unsigned i = 0;; i++) {
+                    const host::Answer set = rig.server().call(log, "SetLogParams",
+                                                               {{"LogLevel", host::Value::uint16(5)},
+                                                                {"LogMode", host::Value::uint16(i % 2 ? 2 : 4)},
+                                                                {"TracePath", host::Value::string(paths[i % 2])}});
+                    if (set.ok() && set.value.as_uint() == 0) changes++;
+                }
+            }).detach();
+            while (changes < 2)
+                std::this_thread::yield();
+            std::this_thread::sleep_for(std::chrono::microseconds(round * 30));
+        });
+        ASSERT_EQ(ended.status, 0) << round;
+        // The path is set a moment before the mode.
+        std::vector<std::string> states;
+        for (const char* mode : {"2,5,1\n", "4,5,1\n"})
+            for (const std::string& path : paths)
+                states.push_back(mode + path);
+        ASSERT_THAT(states, Contains(read_file(dmp_path))) << round;
+    }
+    for (const std::string& path : paths)
+        remove(path);
+}
+
 TEST(Exit, OfAProcessThatNeverLoadedWritesNothing)
 {
     const Ended ended = exit_after([] {
