@@ -1,5 +1,7 @@
 #include "agent/Instance_Map.h"
 
+#include <utility>
+
 namespace cimple {
 
 int Instance_Map::find(const Instance* key) const
@@ -77,6 +79,12 @@ void Instance_Map::clear()
         unref(instance);
     m_instances.clear();
     m_index.clear();
+}
+
+void Instance_Map::swap(Instance_Map& other) noexcept
+{
+    m_instances.swap(other.m_instances);
+    std::swap(m_index, other.m_index);
 }
 
 int Instance_Map::for_each(const Enum_Handler& handler) const

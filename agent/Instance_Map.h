@@ -45,6 +45,8 @@ public:
     /// Gives the element at `index` up without destroying it; an index past the end does nothing.
     void remove_at(std::size_t index);
     void clear();
+    /// Exchanges the elements with those of another map of the same class.
+    void swap(Instance_Map& other) noexcept;
 
     /// Hands a clone of each element to `handler`, whatever it answers. Result 0.
     int for_each(const Enum_Handler& handler) const;

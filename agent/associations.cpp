@@ -138,10 +138,6 @@ Ref<Instance> makeAssociation(ProviderAgent& agent, Link link, const Instance* f
 {
     const Link_Row& row = link_row(link);
     if (row.trace) NVR_LOG(row.trace, text);
-    if (!first || !second) {
-        NVR_LOG("%s", row.missing ? row.missing : "Could not create the instance of the Association class");
-        return Ref<Instance>();
-    }
     Ref<Instance> association(create(row.map(agent).meta_class(), true));
     if (row.name_space) association->__name_space = row.name_space;
     set_end(association.get(), row.first, first);
@@ -149,10 +145,21 @@ Ref<Instance> makeAssociation(ProviderAgent& agent, Link link, const Instance* f
     return association;
 }
 
+Ref<Instance> makeAssociationOrLog(ProviderAgent& agent, Link link, const Instance* first, const Instance* second,
+                                   const char* text)
+{
+    const Link_Row& row = link_row(link);
+    const char* missing = row.missing ? row.missing : "Could not create the instance of the Association class";
+    if (first && second) return madeOrLog(missing, [&] { return makeAssociation(agent, link, first, second, text); });
+    if (row.trace) NVR_LOG(row.trace, text);
+    logCreationFailed(missing);
+    return Ref<Instance>();
+}
+
 Instance* associate(ProviderAgent& agent, Link link, const Instance* first, const Instance* second, const char* text)
 {
     const Link_Row& row = link_row(link);
-    Ref<Instance> association = makeAssociation(agent, link, first, second, text);
+    Ref<Instance> association = makeAssociationOrLog(agent, link, first, second, text);
     return association ? insertOrLog(row.map(agent), std::move(association), row.failure) : nullptr;
 }
 

@@ -102,17 +102,20 @@ struct Link_Row {
     const char* second;
     const char* trace;      // logged before, with the caller's text; null: nothing
     const char* failure;    // logged for a known key; null: "Insert Failed : m_<Class>_map"
-    const char* missing;    // logged for a null end; null: the common words
+    const char* missing;    // logged for a null end, and without memory; null: the common words
     const char* name_space; // null: none
 };
 
 const Link_Row& link_row(Link link);
 
 /// Logs the row's trace, makes the association of clones of both ends, and inserts it. Result the association, the
-/// map's own; or null, logged, for a null end or known keys.
+/// map's own; or null, logged, for a null end, known keys, or no memory.
 Instance* associate(ProviderAgent& agent, Link link, const Instance* first, const Instance* second,
                     const char* text = "");
 /// The same without the insert: the caller's own.
+Ref<Instance> makeAssociationOrLog(ProviderAgent& agent, Link link, const Instance* first, const Instance* second,
+                                   const char* text = "");
+/// The same for ends that are there; std::bad_alloc passes through.
 Ref<Instance> makeAssociation(ProviderAgent& agent, Link link, const Instance* first, const Instance* second,
                               const char* text = "");
 

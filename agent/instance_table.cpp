@@ -48,11 +48,12 @@ void logInsertFailed(const Instance_Map& map, const char* failure)
 
 Instance* insertOrLog(Instance_Map& map, Ref<Instance> instance, const char* failure)
 {
-    if (map.insert(instance.get()) < 0) {
-        logInsertFailed(map, failure);
-        return nullptr;
+    try {
+        if (map.insert(instance.get()) >= 0) return instance.release();
+    } catch (const std::bad_alloc&) {
     }
-    return instance.release();
+    logInsertFailed(map, failure);
+    return nullptr;
 }
 
 Instance* insert(Instance_Map& map, Ref<Instance> instance, const char* failure)

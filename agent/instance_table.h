@@ -2,7 +2,7 @@
 /// `set(group->NameFormat, "WWN")`, one row a property.
 ///
 /// make gives the namespace and the schema's defaults; set stores the value and clears the null byte; nothing else
-/// happens between the rows. Pure functions; std::bad_alloc passes through.
+/// happens between the rows. Pure functions; std::bad_alloc passes through those that do not say otherwise.
 #pragma once
 
 #include <initializer_list>
@@ -27,16 +27,22 @@ Ref<T> make(const Text& name_space = norvane_name_space)
     return instance;
 }
 
-/// The same for a builder that answers with words: null without memory, after `failure` was logged.
+/// What `maker` makes, a Ref; null without memory for it, after `failure` was logged.
+template <class Maker>
+auto madeOrLog(const char* failure, Maker maker) -> decltype(maker())
+{
+    try {
+        return maker();
+    } catch (const std::bad_alloc&) {
+        logCreationFailed(failure);
+        return {};
+    }
+}
+/// The same of an instance without anything but defaults.
 template <class T>
 Ref<T> makeOrLog(const char* failure)
 {
-    try {
-        return make<T>();
-    } catch (const std::bad_alloc&) {
-        logCreationFailed(failure);
-        return Ref<T>();
-    }
+    return madeOrLog(failure, [] { return make<T>(); });
 }
 
 inline void set(Property<String>& property, const char* value)
@@ -92,11 +98,11 @@ String string_property(const Instance* instance, const char* name);
 /// Thrown by `insert` to end the whole update that builds the instance.
 struct Update_Ended {};
 
-/// Moves `instance` into `map`. A known key logs `failure` (null: "Insert Failed : m_<Class>_map") and frees the
-/// instance. Result the instance, now the map's; or null.
+/// Moves `instance` into `map`. A known key, or no memory for one more, logs `failure` (null: "Insert Failed :
+/// m_<Class>_map") and frees the instance. Result the instance, now the map's; or null.
 Instance* insertOrLog(Instance_Map& map, Ref<Instance> instance, const char* failure = nullptr);
 
-/// The same for an instance without which the whole update ends: a known key throws Update_Ended.
+/// The same for an instance without which the whole update ends: where it is refused, Update_Ended is thrown.
 Instance* insert(Instance_Map& map, Ref<Instance> instance, const char* failure = nullptr);
 template <class T>
 T* insert(Map<T>& map, Ref<T> instance, const char* failure = nullptr)

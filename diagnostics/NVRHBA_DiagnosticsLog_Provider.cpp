@@ -17,27 +17,19 @@ namespace {
 
 enum Answer : uint32 { ANSWER_OK = 0, ANSWER_FAILED = 4, ANSWER_INVALID = 5 };
 
-/// Moves the elements that `stays` names, from the last to the first. False, after `failure` was logged, for a key that
-/// `to` has already.
-template <class T, class Stays>
-bool moveBackward(const Map<T>& from, Map<T>& to, const char* failure, Stays stays)
-{
-    for (std::size_t i = from.size(); i-- > 0;) {
-        if (!stays(*from[i])) continue;
-        ref(from[i]);
-        if (!insertOrLog(to, Ref<Instance>(from[i]), failure)) return false;
-    }
-    return true;
-}
-
-/// Builds the map anew without the elements of which `belongs` is true. Backward twice keeps the order of the others.
+/// Builds the map anew without the elements of which `belongs` is true; the others keep their order. False, after
+/// `failure` was logged, for a map that cannot be built: it stays as it stands.
 template <class T, class Belongs>
 bool takeOut(Map<T>& map, const char* failure, Belongs belongs)
 {
     Map<T> others;
-    if (!moveBackward(map, others, failure, [&](const T& element) { return !belongs(element); })) return false;
-    map.clear();
-    return moveBackward(others, map, failure, [](const T&) { return true; });
+    for (std::size_t i = 0; i < map.size(); i++) {
+        if (belongs(*map[i])) continue;
+        ref(map[i]);
+        if (!insertOrLog(others, Ref<Instance>(map[i]), failure)) return false;
+    }
+    map.swap(others);
+    return true;
 }
 
 bool clearRecords(ProviderAgent& agent, const String& test)

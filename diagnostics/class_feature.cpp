@@ -193,13 +193,8 @@ public:
     bool insertAll()
     {
         std::size_t done = 0;
-        try {
-            while (done < m_list.size() && insertNext(m_list[done]))
-                done++;
-        } catch (const std::bad_alloc&) {
-            takeOut(done);
-            throw;
-        }
+        while (done < m_list.size() && insertNext(m_list[done]))
+            done++;
         if (done == m_list.size()) return true;
         takeOut(done);
         return false;
@@ -390,8 +385,8 @@ uint32 NVR_Diagnostics::GetDiagnosticVersion(const char* deviceId, uint32* versi
     HBA_WWN port = {};
     constexpr const char* words = "NVRHBA_DiagTestFunc::Id2HBAName failed";
     if (!library_name(port, deviceId, words, words)) return status_no_version;
-    AttributeBlock attributes(attributes_size);
-    if (!attributes.valid() || attributes.fill(RM_GetHBAAttributes, port) != RM_STATUS_OK) return status_no_version;
+    Local_Attribute_Block<attributes_size> attributes;
+    if (attributes.fill(RM_GetHBAAttributes, port) != RM_STATUS_OK) return status_no_version;
     return attributes.number(RM_ATTR_DIAG_VERSION, "_DiagVersion", *version) ? 0 : status_no_version;
 }
 

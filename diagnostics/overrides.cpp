@@ -189,13 +189,13 @@ Setting* NVR_Diagnostics::getNVRHBA_FCHBADiagnosticSettingDataInstance(ProviderA
     }
     if (setting && !names(*given, *setting)) return nullptr;
     NVR_LOG("Using the overrided values if valid, else default settings values are used");
-    if (!setting) return nullptr;
     const Diagnostic_Test* test = find_diagnostic_test(given->InstanceID.value);
     if (!test) return setting;
     if (!test->takesOverrides()) {
         NVR_LOG("No Override Setting Supported for test : %s", test->name);
         return setting;
     }
+    if (!setting) return nullptr;
     if (test->takesPattern()) overridePatternSettings(*setting, *given);
     if (test->takesTarget()) overrideTarget(*setting, *given);
     set(setting->OverridedSettingData, 1);

@@ -88,8 +88,8 @@ uint32 pollForResult(Diagnostic_Run& run, const Test_Number& test, const Poll_St
 /// disabled; `tail` ends the words for that.
 bool portIsReady(Diagnostic_Run& run, const char* tail, uint32& status)
 {
-    AttributeBlock attributes(attributes_size);
-    status = attributes.valid() ? attributes.fill(RM_GetPortAttributes, run.port) : uint32{RM_STATUS_ERROR};
+    Local_Attribute_Block<attributes_size> attributes;
+    status = attributes.fill(RM_GetPortAttributes, run.port);
     if (status != RM_STATUS_OK) {
         NVR_LOG("RM_GetPortAttributes command failed. Exited with error code : %d", static_cast<int>(status));
         return false;
@@ -132,8 +132,8 @@ bool seesNoTarget(const HBA_WWN& port, uint32& status)
 /// given the benefit of the doubt.
 bool plugIsMissing(const HBA_WWN& port)
 {
-    AttributeBlock attributes(attributes_size);
-    uint32 status = attributes.valid() ? attributes.fill(RM_GetPortAttributes, port) : uint32{RM_STATUS_ERROR};
+    Local_Attribute_Block<attributes_size> attributes;
+    uint32 status = attributes.fill(RM_GetPortAttributes, port);
     if (status != RM_STATUS_OK) return false;
     return !(linkAllowsLoopback(attributes) && seesNoTarget(port, status)) && status == RM_STATUS_OK;
 }

@@ -43,8 +43,7 @@ T* find_last(const Map<T>& map, Property<String> T::*property, const String& val
 
 Ref<NVRHBA_ConcreteJob> makeJob(const Job_Arguments& arguments)
 {
-    auto job = makeOrLog<NVRHBA_ConcreteJob>("Unable to create NVRHBA_ConcreteJob");
-    if (!job) return job;
+    auto job = make<NVRHBA_ConcreteJob>();
     const bool isCompleted = arguments.code == JOB_COMPLETED;
     set(job->InstanceID,
         text("%s:%d:%lu", arguments.testName.c_str(), ++job_counter, static_cast<unsigned long>(arguments.testId)));
@@ -85,8 +84,7 @@ void setResult(Record& record, const Record_Arguments& arguments)
 
 Ref<NVRHBA_DiagnosticServiceRecord> makeServiceRecord(const Record_Arguments& arguments)
 {
-    auto record = makeOrLog<NVRHBA_DiagnosticServiceRecord>("Failed to create DiagnosticServiceRecord");
-    if (!record) return record;
+    auto record = make<NVRHBA_DiagnosticServiceRecord>();
     set(record->InstanceID, text("%s:Service Record", arguments.jobId.c_str()));
     set(record->Description, "This class holds the results(service) of the test");
     set(record->ElementName, text("%s Service Record", arguments.testName.c_str()));
@@ -96,8 +94,7 @@ Ref<NVRHBA_DiagnosticServiceRecord> makeServiceRecord(const Record_Arguments& ar
 
 Ref<NVRHBA_DiagnosticCompletionRecord> makeCompletionRecord(const Record_Arguments& arguments)
 {
-    auto record = makeOrLog<NVRHBA_DiagnosticCompletionRecord>("Failed to create NVRHBA_DiagnosticCompletionRecord");
-    if (!record) return record;
+    auto record = make<NVRHBA_DiagnosticCompletionRecord>();
     set(record->InstanceID, arguments.jobId);
     set(record->Description, "This class holds the result of the test");
     set(record->ElementName, text("%s Completion Record", arguments.testName.c_str()));
@@ -108,8 +105,7 @@ Ref<NVRHBA_DiagnosticCompletionRecord> makeCompletionRecord(const Record_Argumen
 
 Ref<NVRHBA_DiagnosticSettingDataRecord> makeSettingDataRecord(const Record_Arguments& arguments)
 {
-    auto record = makeOrLog<NVRHBA_DiagnosticSettingDataRecord>("Failed to create NVRHBA_DiagnosticSettingDataRecord");
-    if (!record) return record;
+    auto record = make<NVRHBA_DiagnosticSettingDataRecord>();
     set(record->InstanceID, text("%s:SettingData Record", arguments.jobId.c_str()));
     set(record->Caption, arguments.jobId);
     set(record->Description, "This class holds the overrided setting data of the test");
@@ -128,7 +124,7 @@ void putIntoLog(ProviderAgent& agent, const Record_Arguments& arguments, const I
 void tieToPort(ProviderAgent& agent, const Record_Arguments& arguments, const Instance* record)
 {
     if (!arguments.controller) return;
-    Ref<Instance> association = makeAssociation(agent, Link::RecordAppliesToElement, record, arguments.controller);
+    Ref<Instance> association = makeAssociationOrLog(agent, Link::RecordAppliesToElement, record, arguments.controller);
     if (!association) return;
     NVR_LOG("PortController : %s", arguments.controller->DeviceID.value.c_str());
     insertOrLog(agent.m_NVRHBA_RecordAppliesToElement_map, std::move(association),
@@ -137,12 +133,14 @@ void tieToPort(ProviderAgent& agent, const Record_Arguments& arguments, const In
 
 void leaveSettings(ProviderAgent& agent, const Record_Arguments& arguments, const Instance* serviceRecord)
 {
-    auto made = makeSettingDataRecord(arguments);
+    auto made = madeOrLog("Failed to create NVRHBA_DiagnosticSettingDataRecord",
+                          [&] { return makeSettingDataRecord(arguments); });
     if (!made) return;
     const Instance* record = insertOrLog(agent.m_NVRHBA_DiagnosticSettingDataRecord_map, Ref<Instance>(made.release()),
                                          "Insert in NVRHBA_DiagnosticSettingDataRecord Failed");
     if (!record) return;
-    Ref<Instance> association = makeAssociation(agent, Link::CorrespondingSettingDataRecord, serviceRecord, record);
+    Ref<Instance> association =
+        makeAssociationOrLog(agent, Link::CorrespondingSettingDataRecord, serviceRecord, record);
     // The words are those of another association.
     if (association)
         insertOrLog(agent.m_NVRHBA_CorrespondingSettingDataRecord_map, std::move(association),
@@ -156,7 +154,7 @@ NVRHBA_ConcreteJob* NVR_Diagnostics::CreateConcreteJobInstantiateNonBlocking(Pro
                                                                              const Job_Arguments& arguments)
 {
     NVR_LOG("NVR_Diagnostics::CreateConcreteJobInstantiateNonBlocking()");
-    auto made = makeJob(arguments);
+    auto made = madeOrLog("Unable to create NVRHBA_ConcreteJob", [&] { return makeJob(arguments); });
     if (!made) return nullptr;
     auto* job = static_cast<NVRHBA_ConcreteJob*>(insertOrLog(
         agent.m_NVRHBA_ConcreteJob_map, Ref<Instance>(made.release()), "Insert Failed: NVRHBA_ConcreteJob"));
@@ -164,7 +162,7 @@ NVRHBA_ConcreteJob* NVR_Diagnostics::CreateConcreteJobInstantiateNonBlocking(Pro
 
     const Instance* test =
         find_last(agent.m_NVRHBA_FCHBADiagnosticTest_map, &NVRHBA_FCHBADiagnosticTest::Name, arguments.testName);
-    Ref<Instance> owning = makeAssociation(agent, Link::OwningJobElement, test, job);
+    Ref<Instance> owning = makeAssociationOrLog(agent, Link::OwningJobElement, test, job);
     if (!owning) return job;
     insertOrLog(agent.m_NVRHBA_OwningJobElement_map, std::move(owning), link_row(Link::OwningJobElement).failure);
     associate(agent, Link::AffectedJobElement, arguments.controller, job);
@@ -195,7 +193,7 @@ void NVR_Diagnostics::CreateDiagnosticServiceRecord(ProviderAgent& agent, const 
 {
     NVR_LOG("NVR_Diagnostics::CreateDiagnosticServiceRecord");
     if (!arguments.controller) NVR_LOG("Invalid managed element");
-    auto made = makeServiceRecord(arguments);
+    auto made = madeOrLog("Failed to create DiagnosticServiceRecord", [&] { return makeServiceRecord(arguments); });
     if (!made) return;
     const Instance* record = insertOrLog(agent.m_NVRHBA_DiagnosticServiceRecord_map, Ref<Instance>(made.release()),
                                          "Insert Failed, DiagnosticServiceRecord");
@@ -209,7 +207,8 @@ void NVR_Diagnostics::CreateDiagnosticCompletionRecord(ProviderAgent& agent, con
 {
     NVR_LOG("NVR_Diagnostics::CreateDiagnosticCompletionRecord");
     if (!arguments.controller) NVR_LOG("Invalid managed element");
-    auto made = makeCompletionRecord(arguments);
+    auto made = madeOrLog("Failed to create NVRHBA_DiagnosticCompletionRecord",
+                          [&] { return makeCompletionRecord(arguments); });
     if (!made) return;
     const Instance* record = insertOrLog(agent.m_NVRHBA_DiagnosticCompletionRecord_map, Ref<Instance>(made.release()),
                                          "Insert in DiagnosticCompletionRecord Failed");

@@ -16,26 +16,26 @@ void AttributeBlock::Free::operator()(unsigned char* bytes) const
 }
 
 AttributeBlock::AttributeBlock(uint32 capacity)
-    : m_capacity(capacity), m_bytes(static_cast<unsigned char*>(std::calloc(capacity, 1)))
+    : m_capacity(capacity), m_owned(static_cast<unsigned char*>(std::calloc(capacity, 1))), m_bytes(m_owned.get())
 {
 }
 
 uint32 AttributeBlock::fill(Forward<uint32(HBA_WWN, void*, uint32*)>& operation, const HBA_WWN& wwn)
 {
     uint32 size = m_capacity;
-    return operation(wwn, m_bytes.get(), &size);
+    return operation(wwn, m_bytes, &size);
 }
 
 const unsigned char* AttributeBlock::find(uint16 number, std::size_t& room, uint16& length, uint32& status)
 {
     length = 0;
     status = RM_STATUS_ERROR;
-    const void* value = RM_GetAttributeValue(m_bytes.get(), number, &length, &status);
+    const void* value = RM_GetAttributeValue(m_bytes, number, &length, &status);
     // An address that lies elsewhere counts as none, which null does as well.
-    const auto offset = reinterpret_cast<std::uintptr_t>(value) - reinterpret_cast<std::uintptr_t>(m_bytes.get());
+    const auto offset = reinterpret_cast<std::uintptr_t>(value) - reinterpret_cast<std::uintptr_t>(m_bytes);
     if (offset >= m_capacity) return nullptr;
     room = m_capacity - offset;
-    return m_bytes.get() + offset;
+    return m_bytes + offset;
 }
 
 bool AttributeBlock::number(uint16 number, uint32& value, uint32& status)

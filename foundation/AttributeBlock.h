@@ -1,7 +1,7 @@
 /// A block of numbered attributes as the management library fills it, and the one reader over it.
 ///
-/// Owns its zeroed buffer. The library is not trusted: a value counts only as far as it lies inside the buffer. Threads
-/// as with any plain object.
+/// Its buffer is zeroed at the start. The library is not trusted: a value counts only as far as it lies inside the
+/// buffer. Threads as with any plain object.
 #pragma once
 
 #include <cstddef>
@@ -14,7 +14,7 @@ namespace cimple {
 
 class AttributeBlock {
 public:
-    /// Empty (valid() is false) if memory is short.
+    /// Over a buffer of its own; empty (valid() is false) if memory is short.
     explicit AttributeBlock(uint32 capacity);
 
     bool valid() const { return m_bytes != nullptr; }
@@ -39,6 +39,10 @@ public:
     /// Six bytes, as "%02x:%02x:%02x:%02x:%02x:%02x".
     bool address(uint16 number, const char* name, std::string& value);
 
+protected:
+    /// Over one that outlives it.
+    AttributeBlock(unsigned char* buffer, uint32 capacity) : m_capacity(capacity), m_bytes(buffer) {}
+
 private:
     /// The bytes of the attribute that lie inside the block: `size` of them; null if there is none.
     const unsigned char* find(uint16 number, std::size_t& room, uint16& length, uint32& status);
@@ -47,7 +51,18 @@ private:
         void operator()(unsigned char* bytes) const;
     };
     const uint32 m_capacity;
-    std::unique_ptr<unsigned char[], Free> m_bytes;
+    std::unique_ptr<unsigned char[], Free> m_owned;
+    unsigned char* const m_bytes;
+};
+
+/// One that stands where it is declared and asks for no memory.
+template <uint32 capacity>
+class Local_Attribute_Block : public AttributeBlock {
+public:
+    Local_Attribute_Block() : AttributeBlock(m_buffer, capacity) {}
+
+private:
+    unsigned char m_buffer[capacity] = {};
 };
 
 } // namespace cimple

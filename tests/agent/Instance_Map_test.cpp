@@ -217,6 +217,21 @@ TEST_F(InstanceMap, ClearEmptiesItForNewInstances)
     EXPECT_EQ(map.size(), 30u);
 }
 
+TEST_F(InstanceMap, SwapExchangesElementsAndWhatFindsThem)
+{
+    fill(3);
+    Instance_Map other(map.meta_class());
+    ASSERT_EQ(other.insert(port<NVRHBA_FCPort>("another")), 0);
+    map.swap(other);
+    EXPECT_EQ(map.size(), 1u);
+    EXPECT_EQ(other.size(), 3u);
+    const Ref<Instance> key(port<NVRHBA_FCPort>("another"));
+    EXPECT_EQ(map.find(key.get()), 0);
+    EXPECT_EQ(other.find(key.get()), -1);
+    const Ref<Instance> last(port<NVRHBA_FCPort>("2"));
+    EXPECT_EQ(other.find(last.get()), 2);
+}
+
 TEST_F(InstanceMap, HandOverGivesTheElementsThemselves)
 {
     fill(3);

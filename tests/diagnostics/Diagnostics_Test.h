@@ -28,6 +28,9 @@ constexpr char reset_name[] = "NVR:FCHBA Reset Test";
 constexpr char self_name[] = "NVR:FCHBA Self Test";
 constexpr char target_wwpn[] = "50060E8005A10000";
 
+/// True: buffers of the C library's are refused.
+extern bool no_more_buffers;
+
 class Diagnostics : public SimulatedHost {
 protected:
     Diagnostics();

@@ -46,30 +46,39 @@ struct Expected_Test {
     const char* supportedExecutionControls;
     const char* others;
     const char* modes;
+    const char* description;
     bool hasPattern;
     bool hasTarget;
 };
 
 const Expected_Test table[] = {
-    {beacon_name, "2", "{2}", "null", "{3}", "{5}", "{3,4}", "{32768}", "null", "{32768}", false, false},
+    {beacon_name, "2", "{2}", "null", "{3}", "{5}", "{3,4}", "{32768}", "null", "{32768}",
+     "Test causes a port's LEDs to flash on and off, allowing the port to be easily visually identified", false, false},
     {echo_name, "3", "{3,5}", "{4,10}", "{3}", "{100}", "{3}", "{1}",
-     "{TargetDevice,EchoMechanism,LUN,BufferSize,BufferPattern}", "{4}", true, true},
-    {external_name, "4", "{2,5}", "{4,10}", "{3}", "{100}", "{2,3}", "{1}", "{BufferSize,BufferPattern}", "{4}", true,
-     false},
-    {host_name, "5", "{2}", "{4}", "{3}", "{100}", "{2,3}", "{1}", "{BufferSize,BufferPattern}", "{4}", true, false},
-    {internal_name, "6", "{2}", "{4}", "{3}", "{100}", "{2,3}", "{1}", "{BufferSize,BufferPattern}", "{4}", true,
-     false},
+     "{TargetDevice,EchoMechanism,LUN,BufferSize,BufferPattern}", "{4}",
+     "Test verifies the data path from host to target", true, true},
+    {external_name, "4", "{2,5}", "{4,10}", "{3}", "{100}", "{2,3}", "{1}", "{BufferSize,BufferPattern}", "{4}",
+     "Test verifies that the entire data path through an FCHBA is working properly", true, false},
+    {host_name, "5", "{2}", "{4}", "{3}", "{100}", "{2,3}", "{1}", "{BufferSize,BufferPattern}", "{4}",
+     "Test verifies the FC HBA hostbus interface", true, false},
+    {internal_name, "6", "{2}", "{4}", "{3}", "{100}", "{2,3}", "{1}", "{BufferSize,BufferPattern}", "{4}",
+     "Test verifies the integrity of internal data paths in the FCHBA", true, false},
     {ping_name, "7", "{5}", "{4,10}", "{3}", "{100}", "{3}", "{1}",
-     "{TargetDevice,PingMechanism,LUN,BufferSize,BufferPattern}", "{4}", true, true},
-    {status_name, "10", "{4}", "null", "null", "null", "{32768}", "{32768}", "null", "{32768}", false, false},
-    {reset_name, "8", "{2}", "{4}", "null", "null", "{32768}", "{32768}", "null", "{32768}", false, false},
-    {self_name, "9", "{2}", "{4}", "null", "null", "{32768}", "{32768}", "null", "{32768}", false, false},
+     "{TargetDevice,PingMechanism,LUN,BufferSize,BufferPattern}", "{4}",
+     "Test verifies the existence and accessibility of devices on the SAN", true, true},
+    {status_name, "10", "{4}", "null", "null", "null", "{32768}", "{32768}", "null", "{32768}",
+     "Test checks the health of the FCHBA, not including the FC optics", false, false},
+    {reset_name, "8", "{2}", "{4}", "null", "null", "{32768}", "{32768}", "null", "{32768}",
+     "Test causes the FCHBA to re-initialize itself", false, false},
+    {self_name, "9", "{2}", "{4}", "null", "null", "{32768}", "{32768}", "null", "{32768}",
+     "Test allows all components of the FCHBA to be tested", false, false},
 };
 
 } // namespace
 
 TEST_F(Class_Feature, PublishesEveryColumnOfTheTable)
 {
+    const std::string system_name = value(static_cast<Instance_Map&>(agent().m_CIM_ComputerSystem_map)[0], "Name");
     for (std::size_t i = 0; i < std::size(table); i++) {
         const Expected_Test& row = table[i];
         SCOPED_TRACE(row.name);
@@ -78,6 +87,7 @@ TEST_F(Class_Feature, PublishesEveryColumnOfTheTable)
                                                     {"ElementName", name},
                                                     {"CreationClassName", "NVRHBA_FCHBADiagnosticTest"},
                                                     {"SystemCreationClassName", "CIM_ComputerSystem"},
+                                                    {"SystemName", system_name},
                                                     {"FCHBATestType", row.type},
                                                     {"TestTypes", row.testTypes},
                                                     {"Characteristics", row.characteristics}});
@@ -105,9 +115,28 @@ TEST_F(Class_Feature, PublishesEveryColumnOfTheTable)
                      {"SupportedLoopControl", row.supportedLoopControl},
                      {"SupportedExecutionControls", row.supportedExecutionControls},
                      {"OtherSupportedExecutionControlsDescriptions", row.others}});
+        expect_rows(map("HelpService")[i], {{"SystemCreationClassName", "CIM_ComputerSystem"},
+                                            {"SystemName", system_name},
+                                            {"CreationClassName", "NVRHBA_HelpService"},
+                                            {"Name", name},
+                                            {"ElementName", name + " HelpService"},
+                                            {"DeliveryOptions", "{1}"},
+                                            {"OtherDeliveryOptionDescription", "String"},
+                                            {"DocumentFormat", "{1}"},
+                                            {"OtherDocumentFormatDescription", "String"},
+                                            {"DocumentsAvailable", "{" + name + "}"},
+                                            {"DocumentDescriptions", "{" + std::string(row.description) + "}"}});
+        expect_rows(map("DiagnosticsLog")[i],
+                    {{"InstanceID", name},
+                     {"ElementName", name + " DiagnosticLog"},
+                     {"Description", "NVRHBA_DiagnosticsLog represents the logs for FCHBA CDM tests"}});
         expect_rows(map("DiagElementSettingData")[i], {{"IsDefault", "1"}});
         expect_rows(map("JobElementSettingData")[i], {{"IsDefault", "1"}});
         expect_rows(map("DiagnosticIdentity")[i], {{"InstanceID", name},
+                                                   {"Name", name},
+                                                   {"ElementName", name + " DiagnosticIdentity"},
+                                                   {"Classifications", "{7}"},
+                                                   {"ClassificationDescriptions", "{NVR: FCHBA Diagnostics}"},
                                                    {"MajorVersion", "1"},
                                                    {"MinorVersion", "3"},
                                                    {"RevisionNumber", "1"},
@@ -116,7 +145,25 @@ TEST_F(Class_Feature, PublishesEveryColumnOfTheTable)
                                                    {"IsEntity", "true"}});
         EXPECT_EQ(end(map("ServiceAvailableToElement")[i], "ServiceProvided", "Name"), name);
         EXPECT_EQ(end(map("ServiceAvailableToElement")[i], "UserOfService", "FCHBATestType"), row.type);
-        EXPECT_EQ(end(map("UseOfLog")[i], "Antecedent", "InstanceID"), name);
+        const struct {
+            const char* map;
+            const char* first;
+            const char* first_key;
+            const char* second;
+            const char* second_key;
+        } ties[] = {{"DiagElementSettingData", "ManagedElement", "Name", "SettingData", "InstanceID"},
+                    {"DiagElementCapabilities", "ManagedElement", "Name", "Capabilities", "InstanceID"},
+                    {"DiagElementSoftwareIdentity", "Antecedent", "InstanceID", "Dependent", "Name"},
+                    {"UseOfLog", "Antecedent", "InstanceID", "Dependent", "Name"}};
+        for (const auto& tie : ties) {
+            EXPECT_EQ(end(map(tie.map)[i], tie.first, tie.first_key), name) << tie.map;
+            EXPECT_EQ(end(map(tie.map)[i], tie.second, tie.second_key), name) << tie.map;
+        }
+        EXPECT_EQ(end(map("JobElementSettingData")[i], "ManagedElement", "Name"), name);
+        EXPECT_EQ(end(map("JobElementSettingData")[i], "SettingData", "InstanceID"), "NVR:FCHBA JobSettingData");
+        EXPECT_EQ(end(map("ServiceAffectsElement")[i], "AffectedElement", "DeviceID"), first_wwpn);
+        EXPECT_EQ(end(map("ServiceAffectsElement")[i], "AffectingElement", "Name"), name);
+        EXPECT_EQ(end(map("DiagHostedService")[i], "Antecedent", "Name"), system_name);
         EXPECT_EQ(end(map("DiagServiceConformsToProfile")[i], "ConformantStandard", "RegisteredName"),
                   "FCHBA Diagnostics");
         EXPECT_EQ(end(map("DiagHostedService")[i], "Dependent", "Name"), name);

@@ -1,6 +1,7 @@
 // What clients cannot reach through the factories: a run of a test that the table does not know, and maps that refuse
 // their own elements.
 
+#include "classes/CIM_DiagnosticRecord.h"
 #include "classes/CIM_RecordForLog.h"
 #include "classes/NVRHBA_DiagnosticCompletionRecord.h"
 #include "classes/NVRHBA_DiagnosticServiceRecord.h"
@@ -118,6 +119,30 @@ TEST_F(Log_Clearing, EndsAtAMapThatRefusesItsOwnElements)
         EXPECT_EQ(map(row.map).size(), 3u) << "the rest stays as it stands";
         EXPECT_EQ(map("LogManagesRecord").size(), 4u) << "what was done before is done";
     }
+}
+
+TEST_F(Log_Clearing, EndsAtTiesThatAreRefused)
+{
+    // Of the last two ties, both of another test, one gets the end of the other.
+    const auto twin = [](auto& ties, auto* typed, auto end) {
+        auto* first = static_cast<decltype(typed)>(ties[ties.size() - 2]);
+        auto* second = static_cast<decltype(typed)>(ties[ties.size() - 1]);
+        ref(first->*end);
+        unref(std::exchange(second->*end, first->*end));
+    };
+    twin(map("RecordAppliesToElement"), (NVRHBA_RecordAppliesToElement*)nullptr,
+         &NVRHBA_RecordAppliesToElement::Antecedent);
+    EXPECT_EQ(clear_log(log_of(status_name)), 4u);
+    EXPECT_EQ(words().back(), "Insert Failed : NVRHBA_RecordAppliesToElement_map");
+    EXPECT_EQ(map("LogManagesRecord").size(), 4u) << "what was done before is done";
+    EXPECT_EQ(map("RecordAppliesToElement").size(), 8u) << "the rest stays as it stands";
+    EXPECT_EQ(map("DiagnosticCompletionRecord").size(), 4u);
+
+    twin(map("LogManagesRecord"), (NVRHBA_LogManagesRecord*)nullptr, &NVRHBA_LogManagesRecord::Record);
+    EXPECT_EQ(clear_log(log_of(internal_name)), 4u);
+    EXPECT_EQ(words().back(), "Insert Failed : temp_NVRHBA_LogManagesRecord_map");
+    EXPECT_EQ(map("LogManagesRecord").size(), 4u);
+    EXPECT_EQ(map("DiagnosticServiceRecord").size(), 4u);
 }
 
 TEST_F(Log_Clearing, IsForLogsAlone)

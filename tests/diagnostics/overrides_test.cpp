@@ -97,6 +97,10 @@ TEST_F(Overrides, WithoutADefaultThereIsNothingToWriteTo)
     EXPECT_THAT(give(input(internal_name).get(), internal_name),
                 ElementsAre("Could not find the default setting data", using_given));
     EXPECT_EQ(result, nullptr);
+    EXPECT_THAT(give(input(self_name).get(), self_name),
+                ElementsAre("Could not find the default setting data", using_given,
+                            std::string("No Override Setting Supported for test : ") + self_name));
+    EXPECT_EQ(result, nullptr);
 }
 
 TEST_F(Overrides, ThreeTestsTakeNone)
@@ -303,6 +307,9 @@ TEST_F(Overrides, OfATargetAreReadBehindThePattern)
                                 "Entering NVR_MethodWrapper::Id2HBAName", std::string("DeviceID is:: ") + target_wwpn,
                                 "HBA Name is:: 50:06:0E:80:05:A1:00:00"));
         expect_rows(&setting(name), {{"LUN", "5"}, {"TargetDevice", target_wwpn}});
+        given->LUN.null = 1;
+        EXPECT_THAT(give(given.get(), name), Contains("Invalid LUN, Using the default value '0' "));
+        EXPECT_EQ(now("LUN", name), "5") << "whatever was last set";
         // Only texts of sixteen characters are stored, whatever characters.
         for (const char* target : {"", "50060E8005A1000", "50060E8005A10000F"}) {
             given->TargetDevice.set(target);

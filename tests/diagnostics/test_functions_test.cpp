@@ -339,6 +339,18 @@ TEST_F(Polled_Test, WithoutAPlugThereIsNoExternalLoopback)
     }
 }
 
+TEST_F(Polled_Test, WithoutMemoryForTheTargetsThereIsNoPlug)
+{
+    port("loopback_plug = true");
+    no_more_buffers = true;
+    const Ran ran = run(external_name);
+    no_more_buffers = false;
+    EXPECT_EQ(ran.status, 1u);
+    EXPECT_EQ(calls("RM_GetFcpTargetMapping"), 0u);
+    EXPECT_EQ(ran.words.back(), "Loopback plug is not detected. Unabled to run test. Install loopback plug and make "
+                                "sure HBA Port is Up/Ready.. ");
+}
+
 // -------------------------------------------------------------------------------------------------------- polling
 
 TEST_F(Polled_Test, ATestThatNeverEndsIsCancelledAtThe121stPoll)
@@ -506,6 +518,18 @@ TEST_F(Polled_Test, TheCountersOfTheAdapterAreTakenAsTheyAre)
                                     {"TimeToExecute", "4294967295"}});
 }
 
+TEST_F(Polled_Test, ALongResultIsCutToItsBuffer)
+{
+    const std::string name(1000, 'n');
+    const Ref<NVRHBA_FCHBADiagnosticSettingData> longer(clone_as(&setting(internal_name)));
+    longer->InstanceID.set(name.c_str());
+    Diagnostic_Run work = {agent(), {}, *longer, job_setting(), controller(), {}};
+    ASSERT_EQ(string2HBAName(&work.port, first_wwpn), 1);
+    EXPECT_EQ(NVR_DiagTestFunc::LoopBackTest(work, LOOPBACK_INTERNAL), 0u);
+    EXPECT_EQ(value(first("DiagnosticCompletionRecord"), "RecordData"), name.substr(0, 511));
+    EXPECT_EQ(value(first("DiagnosticCompletionRecord"), "ServiceName"), name);
+}
+
 TEST_F(Polled_Test, AJobThatIsToGoIsNotHandedOut)
 {
     job_setting().DeleteOnCompletion.set(true);
@@ -542,6 +566,21 @@ TEST_F(Direct_Test, StatusTestReadsThePortOnce)
                  {"CompletedCycles", "null"},
                  {"TimeToExecute", "null"}});
     EXPECT_EQ(ran.seconds, 0u);
+}
+
+TEST_F(Direct_Test, StatusTestNeedsABuffer)
+{
+    no_more_buffers = true;
+    const Ran ran = run(status_name);
+    no_more_buffers = false;
+    EXPECT_EQ(ran.status, 8u);
+    EXPECT_FALSE(ran.job);
+    EXPECT_EQ(ran.words.back(), "ERROR: GetPHYPortAttributeValues: Unable to allocate buffer");
+    // The others have theirs already.
+    no_more_buffers = true;
+    for (const char* name : {self_name, internal_name, host_name, reset_name, beacon_name})
+        EXPECT_TRUE(run(name).job) << name;
+    no_more_buffers = false;
 }
 
 TEST_F(Direct_Test, ResetTestResetsTheAdapter)

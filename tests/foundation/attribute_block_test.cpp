@@ -69,6 +69,9 @@ TEST_F(Block, TellsTheLibraryItsSizeAndIsZeroBefore)
         return 9u;
     };
     EXPECT_EQ(fresh.fill(cimple::RM_GetPortStatistics, HBA_WWN{}), 9u);
+    Local_Attribute_Block<16> local;
+    EXPECT_TRUE(local.valid());
+    EXPECT_EQ(local.fill(cimple::RM_GetPortStatistics, HBA_WWN{}), 9u);
 }
 
 TEST_F(Block, GivesNumbersUpToItsEnd)

@@ -1,35 +1,11 @@
-// Names seen before, and what becomes of them when memory runs out. Replaces operator new for the whole program.
+// Names seen before, and what becomes of them when memory runs out.
 #include "services/WWPN_List.h"
 
-#include <cstdlib>
-#include <new>
 #include <string>
 
 #include <gtest/gtest.h>
 
-namespace {
-
-long allocations_left = -1; // off below zero
-
-} // namespace
-
-void* operator new(std::size_t size)
-{
-    if (allocations_left == 0) throw std::bad_alloc();
-    if (allocations_left > 0) --allocations_left;
-    if (void* block = std::malloc(size ? size : 1)) return block;
-    throw std::bad_alloc();
-}
-
-void operator delete(void* block) noexcept
-{
-    std::free(block);
-}
-
-void operator delete(void* block, std::size_t) noexcept
-{
-    std::free(block);
-}
+#include "tests/support/short_memory.h"
 
 using namespace cimple;
 
@@ -44,13 +20,13 @@ HBA_WWN named(unsigned number)
     return wwn;
 }
 
-/// Adds a name with so many allocations left; gives what it wrote.
-std::string add_with(WWPN_List& list, const HBA_WWN& wwn, long allocations)
+/// Adds a name without memory for the allocation of that number; gives what it wrote.
+std::string add_without(WWPN_List& list, const HBA_WWN& wwn, long allocation)
 {
     testing::internal::CaptureStdout();
-    allocations_left = allocations;
+    nvrtest::refuse_allocation(allocation);
     const bool seen = list.isDuplicateEntryInWWPNList(wwn);
-    allocations_left = -1;
+    EXPECT_TRUE(nvrtest::forget_refusal());
     EXPECT_FALSE(seen);
     return testing::internal::GetCapturedStdout();
 }
@@ -72,7 +48,7 @@ TEST(WWPNList, IsGivenUpWithoutMemoryForItsSlots)
 {
     WWPN_List list;
     EXPECT_FALSE(list.isDuplicateEntryInWWPNList(named(1)));
-    EXPECT_EQ(add_with(list, named(2), 0), "\nERROR: isDuplicateEntryInWWPNList: realloc failed");
+    EXPECT_EQ(add_without(list, named(2), 1), "\nERROR: isDuplicateEntryInWWPNList: realloc failed");
     EXPECT_EQ(list.size(), 0u);
     EXPECT_FALSE(list.isDuplicateEntryInWWPNList(named(1)));
     EXPECT_TRUE(list.isDuplicateEntryInWWPNList(named(1)));
@@ -82,7 +58,7 @@ TEST(WWPNList, IsGivenUpWithoutMemoryForAName)
 {
     WWPN_List list;
     EXPECT_FALSE(list.isDuplicateEntryInWWPNList(named(1)));
-    EXPECT_EQ(add_with(list, named(2), 1), "\nERROR: isDuplicateEntryInWWPNList: malloc failed");
+    EXPECT_EQ(add_without(list, named(2), 2), "\nERROR: isDuplicateEntryInWWPNList: malloc failed");
     EXPECT_EQ(list.size(), 0u);
     EXPECT_FALSE(list.isDuplicateEntryInWWPNList(named(2)));
 }
