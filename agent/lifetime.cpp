@@ -4,6 +4,7 @@
 #include "agent/ProviderAgent.h"
 #include "foundation/CLogger.h"
 #include "runtime/Registration.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -98,6 +99,7 @@ void ProviderAgent::releaseRef()
     // The fetch thread's up-call may have a provider of ours loaded by another thread of the server, which needs the
     // lifetime mutex: wait without it. `releasing` keeps the agent for us if such a thread loads and releases
     // meanwhile.
+    const Undisturbed undisturbed;
     releasing++;
     bool used;
     while (!(used = in_use()) && the_agent->hasFetchThread()) {

@@ -6,6 +6,7 @@
 #include "foundation/CLogger.h"
 #include "inventory/NVR_Data.h"
 #include "runtime/Forced_Unwind.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -94,18 +95,23 @@ int ProviderAgent::BuildCimpleInfo()
 }
 
 /// Under m_DataFetchMutex, with no fetch thread running. The thread before is past its last look, so that its join is
-/// short.
+/// short. Nobody cancels the caller between the flag and the thread that clears it.
 bool ProviderAgent::startFetchThread()
 {
+    const Undisturbed undisturbed;
     m_bDataFetchRunning = true;
-    if (!m_dataFetchThread.empty()) {
-        NVR_LOG("PERF: Clearing the previous thread...with join");
-        void* result;
-        Thread::join(m_dataFetchThread, result);
-        m_dataFetchThread.reset();
-    }
-    NVR_LOG("PERF: Creating DataFetch_Handler Thread.");
-    if (Thread::create_joinable(m_dataFetchThread, &DataFetch_Handler, this) == 0) return true;
+    bool created = false;
+    guarded([&] { // the server's hook for new threads may throw
+        if (!m_dataFetchThread.empty()) {
+            NVR_LOG("PERF: Clearing the previous thread...with join");
+            void* result;
+            Thread::join(m_dataFetchThread, result);
+            m_dataFetchThread.reset();
+        }
+        NVR_LOG("PERF: Creating DataFetch_Handler Thread.");
+        created = Thread::create_joinable(m_dataFetchThread, &DataFetch_Handler, this) == 0;
+    });
+    if (created) return true;
     m_dataFetchThread.reset();
     m_bDataFetchRunning = false;
     return false;

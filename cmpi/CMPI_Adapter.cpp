@@ -10,6 +10,7 @@
 #include "cmpi/operation.h"
 #include "cmpi/operations.h"
 #include "runtime/Forced_Unwind.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -102,6 +103,15 @@ void make_absent(MI_Table_Set* set)
     set->adapter = nullptr;
 }
 
+// One more, unless nobody is counted any longer.
+bool count_in(std::atomic<uint32>& count)
+{
+    uint32 found = count.load(std::memory_order_relaxed);
+    while (found != 0)
+        if (count.compare_exchange_weak(found, found + 1, std::memory_order_relaxed)) return true;
+    return false;
+}
+
 } // namespace
 
 // --- Life
@@ -110,7 +120,7 @@ void make_absent(MI_Table_Set* set)
 CMPI_Adapter::CMPI_Adapter(MI_Table_Set* tables, const Registration* registration, const CMPIBroker* broker)
     : registration(registration), proc(registration->proc), provider(nullptr), broker(broker), static_data(tables),
       load_count(0), allow_unload(true), meta_class(nullptr), indications_enabled(false), lock(true),
-      filters_lock(false), m_users(1)
+      filters_lock(false), m_users(1), m_calls(1)
 {
     call(OP_CREATE_PROVIDER, &provider);
 }
@@ -140,10 +150,17 @@ CMPI_Adapter::~CMPI_Adapter()
 
 bool CMPI_Adapter::hold()
 {
-    uint32 users = m_users.load(std::memory_order_relaxed);
-    while (users != 0)
-        if (m_users.compare_exchange_weak(users, users + 1, std::memory_order_relaxed)) return true;
-    return false;
+    return count_in(m_users);
+}
+
+bool CMPI_Adapter::begin_call()
+{
+    return count_in(m_calls);
+}
+
+void CMPI_Adapter::end_call()
+{
+    if (m_calls.fetch_sub(1, std::memory_order_acq_rel) == 1) call(OP_UNLOAD, provider);
 }
 
 void CMPI_Adapter::give_back()
@@ -174,6 +191,16 @@ Adapter_Use::Adapter_Use(MI_Table_Set* tables)
 void Adapter_Use::give_back()
 {
     if (CMPI_Adapter* adapter = release()) adapter->give_back();
+}
+
+Running_Call::~Running_Call()
+{
+    if (!m_adapter) return;
+    const Undisturbed undisturbed;
+    guarded([&] {
+        m_adapter->end_call();
+        return CMPI_RC_OK;
+    });
 }
 
 // --- Factory
@@ -263,7 +290,7 @@ CMPIStatus cleanup(const MI* mi, const CMPIContext* context, CMPIBoolean termina
             log_return("cleanup decrement", CMPI_RC_OK);
             return CMPI_RC_OK;
         }
-        adapter->call(OP_UNLOAD, adapter->provider);
+        adapter->end_call();
         log_return("cleanup unload", CMPI_RC_OK);
         adapter.give_back();
         return CMPI_RC_OK;

@@ -91,6 +91,12 @@ public:
     /// Counts a user out; the last one destroys the adapter.
     void give_back();
 
+    /// Counts a call of the provider in. False if the provider has been unloaded.
+    bool begin_call();
+    /// Counts a call out, and at the last clean-up the table. The last of them all unloads the provider, on its thread
+    /// and in its context: no call runs in a provider that has been unloaded. Throws what the unload throws.
+    void end_call();
+
 private:
     ~CMPI_Adapter();
 
@@ -104,7 +110,8 @@ private:
     }
 
     std::atomic<uint32> m_users;
-    bool m_started = false; // wholly built: only such an adapter has an end to tell of
+    std::atomic<uint32> m_calls; // and one of the table's
+    bool m_started = false;      // wholly built: only such an adapter has an end to tell of
 };
 
 /// One count of an adapter: of a table set's for the length of a call, or none.
@@ -127,6 +134,20 @@ public:
 
 private:
     CMPI_Adapter* m_adapter = nullptr;
+};
+
+/// A call of an adapter's provider, for a scope within the thread's context; or none, if the provider is unloaded.
+class Running_Call {
+public:
+    explicit Running_Call(CMPI_Adapter& adapter) : m_adapter(adapter.begin_call() ? &adapter : nullptr) {}
+    ~Running_Call();
+    Running_Call(const Running_Call&) = delete;
+    Running_Call& operator=(const Running_Call&) = delete;
+
+    explicit operator bool() const { return m_adapter != nullptr; }
+
+private:
+    CMPI_Adapter* m_adapter;
 };
 
 /// Holds a table set's mutex for a scope.

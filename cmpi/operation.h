@@ -61,6 +61,8 @@ CMPIStatus operate(const MI* mi, const CMPIContext* context, const char* label, 
         if (!adapter) return CMPI_RC_ERR_FAILED;
         CMPI_Thread_Context thread_context(adapter->broker, context, adapter.get());
         Pushed_Context pushed(thread_context);
+        Running_Call running(*adapter);
+        if (!running) return CMPI_RC_ERR_FAILED;
         Auto_Mutex locked(adapter->lock);
         log_enter(label);
         const Outcome outcome = steps(*adapter);

@@ -12,6 +12,7 @@
 #include "foundation/management_binding.h"
 #include "runtime/Immortal.h"
 #include "runtime/Mutex.h"
+#include "runtime/Undisturbed.h"
 
 namespace cimple {
 
@@ -66,8 +67,30 @@ void wait_for(sem_t* semaphore)
     }
 }
 
+/// Gives the guard back that the initialiser took, so that the next instance does not wait for it for ever; and, unless
+/// the session stands, the opening of it too.
+class Guard_Return {
+public:
+    Guard_Return(sem_t* guard, const std::string& name) : m_guard(guard), m_name(name) {}
+    ~Guard_Return()
+    {
+        ::sem_post(m_guard);
+        if (!stands) close_guard(m_guard, m_name);
+    }
+    Guard_Return(const Guard_Return&) = delete;
+    Guard_Return& operator=(const Guard_Return&) = delete;
+
+    bool stands = false;
+
+private:
+    sem_t* m_guard;
+    const std::string& m_name;
+};
+
+/// Throws what the library throws, and std::exception if it refuses.
 void initialise(sem_t* guard, const std::string& name)
 {
+    Guard_Return given_back(guard, name);
     NVR_LOG("Aquired Semaphore.. Running RM_InitLib %s ", name.c_str());
     const std::string done_name = name_for_process("/NVR_RM_INIT_LIB_DONE_");
     sem_t* done = ::sem_open(done_name.c_str(), O_CREAT, 0644, 0);
@@ -80,13 +103,10 @@ void initialise(sem_t* guard, const std::string& name)
     const int status = RM_InitLib();
     if (status > 0) {
         NVR_LOG("Error : Initialization of RMLib:: RM_InitLib failed with[%d]", status);
-        ::sem_post(guard);
-        close_guard(guard, name);
         throw std::exception();
     }
     NVR_LOG("Signalling Completed Semaphore.. Running RM_InitLib");
-    ::sem_post(guard);
-    NVR_LOG("Signaled Completed Semaphore.. Running RM_InitLib");
+    given_back.stands = true;
 }
 
 } // namespace
@@ -95,6 +115,7 @@ void initialise(sem_t* guard, const std::string& name)
 // takes what is left and waits for that.
 Management_Session::Management_Session()
 {
+    const Undisturbed undisturbed; // a thread that ended here would leave the others to wait for ever
     NVR_LOG("Constructor");
     NVR_LOG("Setting Up for FIFO.. ");
     const std::string name = guard_name();
@@ -104,6 +125,7 @@ Management_Session::Management_Session()
         wait_for(guard);
         if (value == 2) {
             initialise(guard, name);
+            NVR_LOG("Signaled Completed Semaphore.. Running RM_InitLib");
         } else {
             NVR_LOG("Waiting on Completed Semaphore.. To issue RM Calls..%s.. sem = %ul", name.c_str(),
                     static_cast<unsigned>(reinterpret_cast<std::uintptr_t>(guard)));

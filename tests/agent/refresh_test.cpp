@@ -7,6 +7,7 @@
 #include "agent/Agent_Wait.h"
 #include "simulator/nvrsim.h"
 #include "tests/agent/Simulated_Host.h"
+#include "tests/runtime/Fake_Context.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -221,6 +222,18 @@ TEST_F(Refresh, AThreadThatIsEndedInsideARefreshLeavesNobodyWaiting)
     EXPECT_THAT(plain(agent().m_NVRHBA_FCPort_map), SizeIs(1));
     EXPECT_THAT(words(), contains_in_order({"PERF: Clearing the previous thread...with join", building_adapters,
                                             "PERF: updateAdapterMaps: cleanExit", building_targets}));
+}
+
+TEST_F(Refresh, AServerThatThrowsAtANewThreadLeavesNobodyWaiting)
+{
+    struct Server : Fake_Context {
+        Thread_Context* thread_create_hook(void*) override { throw 1; }
+    } server;
+    Thread_Context::push(&server);
+    EXPECT_THAT(plain(agent().m_NVRHBA_FCPort_map), SizeIs(0));
+    Thread_Context::pop();
+    EXPECT_FALSE(agent().m_bDataFetchRunning);
+    EXPECT_THAT(plain(agent().m_NVRHBA_FCPort_map), SizeIs(1));
 }
 
 TEST_F(Refresh, AClientThatIsCancelledWhileItWaitsIsNotServedForEver)

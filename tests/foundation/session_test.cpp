@@ -79,6 +79,16 @@ TEST_F(Session, RefusesToStandWhenTheLibraryDoes)
     EXPECT_TRUE(there(guard)) << "a later one may succeed";
 }
 
+TEST_F(Session, WhoseLibraryThrowsLeavesTheGuardToTheNext)
+{
+    fake::operations().RM_InitLib = []() -> int { throw std::bad_alloc(); };
+    EXPECT_THROW(Management_Session(), std::bad_alloc);
+    EXPECT_FALSE(there(guard));
+    fake::operations().RM_InitLib = [this] { return initialised++, 0; };
+    Management_Session next; // would wait for ever
+    EXPECT_EQ(initialised, 1);
+}
+
 TEST_F(Session, TakesANegativeResultForSuccess)
 {
     result = -1;

@@ -161,6 +161,31 @@ TEST(Life, ACallAfterTheLastCleanupIsAnsweredPolitely)
     EXPECT_EQ(rig.count_words(unloaded), 1u);
 }
 
+TEST(Life, TheLastCleanupUnderARequestUnloadsBehindIt)
+{
+    Rig rig;
+    Entries entries;
+    const auto released = testing::StartsWith("ProviderAgent::releaseRef[");
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        CMPIInstanceMI* ports = entries.instances("NVRHBA_FCPort", broker, context);
+        add_fault("call = \"HBA_GetNumberOfAdapters\", delay_ms = 300");
+        host::Answer answer;
+        std::thread request([&] { answer = rig.enumerate("NVRHBA_FCPort"); });
+        while (calls("HBA_GetNumberOfAdapters") == 0)
+            std::this_thread::yield();
+        for (int of_ours_and_the_server = 0; of_ours_and_the_server < 5; of_ours_and_the_server++)
+            EXPECT_EQ(ports->ft->cleanup(ports, context, 1).rc, CMPI_RC_OK);
+        EXPECT_THAT(rig.words(), Not(Contains(released)));
+        request.join();
+        EXPECT_THAT(answer, succeeded());
+        EXPECT_EQ(answer.instances.size(), 4u);
+    });
+    EXPECT_THAT(rig.words(), Contains(released).Times(1));
+    rig.stop();
+    EXPECT_EQ(rig.count_words(unloaded), 1u);
+    EXPECT_EQ(nvrsim_open_handles(), 0u);
+}
+
 class Lives : public Every_Manner {};
 NVR_IN_EVERY_MANNER(Lives);
 
