@@ -225,6 +225,29 @@ TEST_F(Lifecycle, ManyThreadsLoadAndUnloadAtOnce)
     EXPECT_FALSE(exists(guard_name()));
 }
 
+TEST_F(Lifecycle, AHostWithoutAnIssueOrTheHardwaresConsentIsLoadedAllTheSame)
+{
+    remove("/etc/issue");
+    fault("call = \"CPQFC_LoadLibrary\", status = 5");
+    ASSERT_EQ(load(), 0);
+    EXPECT_THAT(words(), contains_in_order({"getOSInformation() failed", "Initializing RM API ",
+                                            "Provider Agent::CPQFC_LoadLibrary() Failed:5 ", "Constructor"}));
+    EXPECT_EQ(plain(agent().m_NVRHBA_FCPort_map).size(), 1u);
+    unload();
+}
+
+TEST_F(Lifecycle, WithoutItsDataTheUpdateSaysSoAndEnds)
+{
+    ASSERT_EQ(load(), 0);
+    plain(agent().m_NVRHBA_FCPort_map);
+    words();
+    agent().m_pData.reset();
+    EXPECT_EQ(agent().updateAdapterMaps(), 32769u);
+    EXPECT_EQ(words().back(), "Could not locate the data pointer - Serious issue");
+    EXPECT_TRUE(agent().m_NVRHBA_FCPort_map.empty());
+    unload();
+}
+
 TEST_F(Lifecycle, AThreadThatCannotBeCreatedLeavesEmptyAnswersAndTheNextCallTriesAgain)
 {
     ASSERT_EQ(load(), 0);

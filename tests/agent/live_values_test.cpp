@@ -151,6 +151,23 @@ TEST_F(LiveValues, APortsStatusIsReadAtMostOnceInTenSeconds)
     EXPECT_THAT(words(), Contains("PERF: update driver map"));
 }
 
+TEST_F(LiveValues, ANewAgentReadsTheStatusAtOnce)
+{
+    ports();
+    unload();
+    listenAgain();
+    ASSERT_EQ(load(), 0);
+    ports();
+    nvrsim_set("0", "state", 6);
+    EXPECT_EQ(value(ports()[0].get(), "OperationalStatus"), "{2}") << "within ten seconds of its first look";
+    unload();
+    listenAgain();
+    ASSERT_EQ(load(), 0);
+    plain(agent().m_NVRHBA_FCPort_map);
+    nvrsim_set("0", "state", 2);
+    EXPECT_EQ(value(ports()[0].get(), "OperationalStatus"), "{2}") << "no time of the agent before counts";
+}
+
 TEST_F(LiveValues, TheLibrarysOwnStatesShowTheirWords)
 {
     const struct {

@@ -313,7 +313,7 @@ TEST(Exit, WhileAlertsAreOnIsClean)
     EXPECT_EQ(ended.status, 0);
 }
 
-// The request's threads meet the exit at any point, also within the logger and the agent's own end.
+// The threads of the requests meet the exit at any point, also within the logger.
 TEST(Exit, AtAnyMomentOfOtherThreadsIsClean)
 {
     for (int round = 0; round < 20; round++) {

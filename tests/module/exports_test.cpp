@@ -103,11 +103,7 @@ TEST(Exports, NoManagementLibraryIsLinked)
 // The class records are constant: only the list of registrations and a few process-wide objects are made at load.
 TEST(Exports, LittleCodeRunsAtLoad)
 {
-    const std::size_t count = Elf_File(NVR_MODULE).initializers();
-    std::cout << "initializers at load: " << count << '\n';
-    RecordProperty("initializers", static_cast<int>(count));
-    EXPECT_GE(count, 1u);
-    EXPECT_LE(count, 16u);
+    EXPECT_EQ(Elf_File(NVR_MODULE).initializers(), 2u); // the compiler's own and the list of registrations
 }
 
 #endif

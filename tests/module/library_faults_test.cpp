@@ -384,10 +384,10 @@ TEST(FailingCalls, TextsOfTheLibraryEndWithTheirField)
     add_fault("call = \"HBA_GetAdapterPortAttributes\", damage = \"unterminated\"");
     const host::Answer packages = rig.enumerate("NVRHBA_PhysicalPackage");
     ASSERT_EQ(packages.instances.size(), 1u);
-    EXPECT_LE(packages.instances[0].get("Manufacturer").as_text().size(), 64u);
-    EXPECT_LE(packages.instances[0].get("SerialNumber").as_text().size(), 64u);
-    EXPECT_LE(packages.instances[0].get("Model").as_text().size(), 256u);
-    EXPECT_LE(packages.instances[0].get("Description").as_text().size(), 256u);
+    EXPECT_EQ(packages.instances[0].get("Manufacturer").as_text().size(), 64u);
+    EXPECT_EQ(packages.instances[0].get("SerialNumber").as_text().size(), 64u);
+    EXPECT_EQ(packages.instances[0].get("Model").as_text().size(), 256u);
+    EXPECT_EQ(packages.instances[0].get("Description").as_text().size(), 256u);
 }
 
 TEST(FailingCalls, AHugeCountOfAdaptersIsWalkedToItsEndAndNoFurther)

@@ -88,7 +88,7 @@ TEST_P(Settings_File, GivesTheseValues)
 INSTANTIATE_TEST_SUITE_P(That, Settings_File, testing::ValuesIn(settings),
                          [](const auto& info) { return "Is" + std::string(info.param.label); });
 
-TEST(SettingsFile, ThatIsAFolderIsToldAndPassedOver)
+TEST(SettingsFile, ThatIsAFolderIsPassedOver)
 {
     remove(conf_path);
     Rig rig({host::Manner::strict(), "small"});
@@ -98,7 +98,7 @@ TEST(SettingsFile, ThatIsAFolderIsToldAndPassedOver)
     remove(conf_path);
 }
 
-TEST(SettingsFile, ThatCannotBeOpenedIsTold)
+TEST(SettingsFile, ThatCannotBeOpenedIsPassedOver)
 {
     Rig rig({host::Manner::strict(), "small", "NVR_PROVIDER_CACHE_TIMEOUT = 20\n"});
     make_unopenable(conf_path);
