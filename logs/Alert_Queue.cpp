@@ -41,6 +41,7 @@ bool Alert_Queue::push(const indication_data& record)
         try {
             m_IndicationQueue.push_back(record);
         } catch (const std::bad_alloc&) {
+            NVR_LOG("Failed to allocate memory to queue the event");
             return false;
         }
     }

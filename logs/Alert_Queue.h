@@ -29,7 +29,7 @@ public:
     /// From now on records are dropped, and the worker ends once it has popped what is there.
     void close();
 
-    /// False if the record was dropped, since the queue is closed or memory is out.
+    /// False if the record was dropped, since the queue is closed or (then logged) memory is out.
     bool push(const indication_data& record);
     /// Waits for a record and takes it; false: the queue is closed and empty.
     bool pop(indication_data& record);

@@ -81,16 +81,23 @@ NVRHBA_AlertIndication_Provider::enable_indications(std::unique_ptr<Indication_H
     if (const Indication_Handler* in_use = _indication_handler)
         return same(*in_use, *handler) ? ENABLE_INDICATIONS_OK : ENABLE_INDICATIONS_FAILED;
     m_agent = ProviderAgent::GetInstance();
+    Alert_Queue& queue = Alert_Queue::instance(); // its first use needs memory
     _indication_handler = handler.get();
-    Alert_Queue::instance().open();
-    if (Thread::create_attached(m_IndicationThread, &providerThreadProc, this) != 0) {
-        Alert_Queue::instance().close();
+    queue.open();
+    int created = -1;
+    guarded([&] { created = Thread::create_attached(m_IndicationThread, &providerThreadProc, this); });
+    if (created != 0) {
+        queue.close();
         _indication_handler = nullptr;
         return ENABLE_INDICATIONS_FAILED;
     }
-    handler.release();
-    m_agent->BuildCimpleInfo();
-    return setHBACallbacks(true) == 0 ? ENABLE_INDICATIONS_OK : ENABLE_INDICATIONS_FAILED;
+    handler.release(); // it is the worker's from here on, whatever becomes of the ports
+    uint32 result = NVR_FAILURE;
+    guarded([&] {
+        m_agent->BuildCimpleInfo();
+        result = setHBACallbacks(true);
+    });
+    return result == 0 ? ENABLE_INDICATIONS_OK : ENABLE_INDICATIONS_FAILED;
 }
 
 Disable_Indications_Status NVRHBA_AlertIndication_Provider::disable_indications()
@@ -127,7 +134,8 @@ void* NVRHBA_AlertIndication_Provider::providerThreadProc(void* data)
             break;
         }
         NVR_LOG("Popped from Queue: IndicationType 0x%x", record.eventType);
-        guarded([&] { provider->generateIndication(record.portWWN, record.eventType); });
+        if (!guarded([&] { provider->generateIndication(record.portWWN, record.eventType); }))
+            NVR_LOG("Error: Failed to generate or deliver the indication");
     }
     NVR_LOG("NVRHBA_AlertIndication_Provider::providerThreadProc() finished");
     return nullptr;

@@ -18,7 +18,7 @@ NVRHBA_DriverRecordLogManagesRecord_Provider::enum_instances(const NVRHBA_Driver
             // Another key than the line has as an instance of its own; clients know both.
             const String id = text("NVRHBA:FC Driver Record Log:%zu", position);
             return makeManagesRecord<NVRHBA_DriverRecordLogManagesRecord>(
-                log, makeDriverLogEntry(records.lines[position], position, id, log));
+                log, makeDriverLogEntry((*records.lines)[position], position, id, log));
         },
         [] {
             NVR_LOG("Enter -- NVRHBA_DriverRecordLogManagesRecord");

@@ -15,7 +15,7 @@ Enum_Instances_Status NVRHBA_FCDriverLogEntry_Provider::enum_instances(const NVR
         "logs/NVRHBA_FCDriverLogEntry_Provider.cpp",
         [](const Log_Records& records, std::size_t position, const NVRHBA_RecordLog* log) {
             const String id = text("NVR:HBA FC Driver Record:%zu", position);
-            return Ref<Instance>(makeDriverLogEntry(records.lines[position], position, id, log).release());
+            return Ref<Instance>(makeDriverLogEntry((*records.lines)[position], position, id, log).release());
         },
         [] {
             NVR_LOG("Entering NVRHBA_FCDriverLogEntry::enum_instances");

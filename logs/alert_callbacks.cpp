@@ -59,7 +59,7 @@ uint32 unregisterPorts()
 /// An adapter of the library for a scope; null where it cannot be opened.
 class Open_Adapter {
 public:
-    explicit Open_Adapter(std::string name) : m_handle(HBA_OpenAdapter(name.data())) {}
+    explicit Open_Adapter(std::string& name) : m_handle(HBA_OpenAdapter(name.data())) {}
     ~Open_Adapter()
     {
         if (m_handle != 0) HBA_CloseAdapter(m_handle);
@@ -75,7 +75,7 @@ private:
 uint32 registerPort(const Adapter& adapter, int index, const Port& port, void* provider)
 {
     // Memory first: a registration must not be forgotten, nor a place without one be left.
-    const std::string name = adapter.name();
+    std::string name = adapter.name();
     auto& ports = registered_ports();
     ports.push_back({nullptr, port.portName()});
     HBA_STATUS status = HBA_STATUS_ERROR;
@@ -129,6 +129,7 @@ uint32 NVRHBA_AlertIndication_Provider::registerPorts()
             continue;
         }
         for (const Port* port : *adapter->getPorts()) {
+            // One that is still registered, or that two adapters list, would tell every event twice.
             if (isRegistered(port->portName())) continue;
             if (registerPort(*adapter, number, *port, this) != 0) return NVR_FAILURE;
         }

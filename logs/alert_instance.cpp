@@ -21,8 +21,7 @@ const Instance* host_of(const ProviderAgent& agent)
 /// A clone of the map's port of that name, or null, logged.
 Ref<Instance> findPort(const ProviderAgent& agent, const std::string& wwpn)
 {
-    auto model = makeOrLog<NVRHBA_FCPort>("Could not create FCPort instance");
-    if (!model) return Ref<Instance>();
+    const auto model = make<NVRHBA_FCPort>();
     const Instance* found = nullptr;
     if (const Instance* host = host_of(agent)) {
         set(model->SystemCreationClassName, string_property(host, "CreationClassName"));
@@ -45,6 +44,38 @@ void setAlertingElement(NVRHBA_AlertIndication& alert, const Instance* port)
     const bool has_path = instance_to_model_path(port, path) == 0;
     set(alert.AlertingManagedElement, has_path ? path : String("NVRHBA_FCPort"));
     set(alert.AlertingElementFormat, has_path ? format_object_path : format_unknown);
+}
+
+/// All of the indication of an event on that port of the host's.
+Ref<NVRHBA_AlertIndication> fillAlert(const ProviderAgent& agent, const Port_Event& event, const std::string& wwpn,
+                                      const Instance* port)
+{
+    auto alert = make<NVRHBA_AlertIndication>();
+    constexpr uint16 severity_information = 2, alert_other = 1, trending_unknown = 0;
+    const uint32 sequence = agent.m_indicationSequence;
+    const String number = text("%u", sequence);
+    const Datetime now = Datetime::now();
+    const Instance* host = host_of(agent);
+    set(alert->IndicationIdentifier, number);
+    set(alert->CorrelatedIndications, {});
+    set(alert->IndicationTime, now);
+    set(alert->PerceivedSeverity, severity_information);
+    set(alert->SequenceNumber, sequence);
+    set(alert->Description, text(event.description, wwpn.c_str()));
+    setAlertingElement(*alert, port);
+    set(alert->AlertType, alert_other);
+    set(alert->OtherAlertType, "Link Status");
+    set(alert->ProbableCause, event.probable_cause);
+    set(alert->ProbableCauseDescription, event.cause_description);
+    set(alert->Trending, trending_unknown);
+    set(alert->EventID, number);
+    set(alert->EventTime, now);
+    set(alert->SystemCreationClassName, string_property(host, "CreationClassName"));
+    set(alert->SystemName, string_property(host, "Name"));
+    set(alert->ProviderName, "NVRHBA_AlertIndication_Provider");
+    if (event.message) set(alert->Message, event.message);
+    set(alert->MessageID, "Norvane");
+    return alert;
 }
 
 } // namespace
@@ -73,39 +104,14 @@ Ref<NVRHBA_AlertIndication> makeAlert(ProviderAgent& agent, HBA_WWN portWWN, uin
                           "m_bIsAdapterMapsReady");
     NVR_LOG("Getting the Alerting Element");
     const std::string wwpn = wwnText(portWWN);
-    const Ref<Instance> port = findPort(agent, wwpn);
+    const Ref<Instance> port = madeOrLog("Could not create FCPort instance", [&] { return findPort(agent, wwpn); });
     if (!port) return Ref<NVRHBA_AlertIndication>();
     NVR_LOG("Creating the NVRHBA AlertIndication");
-    auto alert = makeOrLog<NVRHBA_AlertIndication>("Could not create the required AlertIndication instance");
+    auto alert = madeOrLog("Could not create the required AlertIndication instance",
+                           [&] { return fillAlert(agent, port_event(eventType), wwpn, port.get()); });
     if (!alert) return alert;
-
-    constexpr uint16 severity_information = 2, alert_other = 1, trending_unknown = 0;
-    const Port_Event& event = port_event(eventType);
-    const uint32 sequence = agent.m_indicationSequence;
-    const String number = text("%u", sequence);
-    const Datetime now = Datetime::now();
-    const Instance* host = host_of(agent);
-    set(alert->IndicationIdentifier, number);
-    set(alert->CorrelatedIndications, {});
-    set(alert->IndicationTime, now);
-    set(alert->PerceivedSeverity, severity_information);
-    set(alert->SequenceNumber, sequence);
-    set(alert->Description, text(event.description, wwpn.c_str()));
-    setAlertingElement(*alert, port.get());
-    set(alert->AlertType, alert_other);
-    set(alert->OtherAlertType, "Link Status");
-    set(alert->ProbableCause, event.probable_cause);
-    set(alert->ProbableCauseDescription, event.cause_description);
-    set(alert->Trending, trending_unknown);
-    set(alert->EventID, number);
-    set(alert->EventTime, now);
-    set(alert->SystemCreationClassName, string_property(host, "CreationClassName"));
-    set(alert->SystemName, string_property(host, "Name"));
-    set(alert->ProviderName, "NVRHBA_AlertIndication_Provider");
-    if (event.message) set(alert->Message, event.message);
-    set(alert->MessageID, "Norvane");
+    NVR_LOG("Indication %u WWN = %s", agent.m_indicationSequence, wwpn.c_str());
     agent.m_indicationSequence++;
-    NVR_LOG("Indication %u WWN = %s", sequence, wwpn.c_str());
     return alert;
 }
 

@@ -14,7 +14,7 @@ void makeAll(const Record_Walk& walk, const ProviderAgent& agent, Instance_Map& 
     if (walk.log == Record_Log::provider)
         agent.m_cimLogger.getEntries(records.entries);
     else
-        records.lines = agent.m_driverLogStore.lines;
+        records.lines = &agent.m_driverLogStore.lines;
     const NVRHBA_RecordLog* log = findRecordLog(agent, recordLogID(agent, walk.log));
     NVR_LOG("Log Size %d", static_cast<int>(records.size()));
     for (std::size_t position = 0; position < records.size(); position++) {

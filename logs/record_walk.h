@@ -1,5 +1,5 @@
-/// The walk that enumerates a log's records, or the ties between a log and its records: what is recorded is copied, one
-/// instance is made of each record, and all are handed out when no lock is held any more.
+/// The walk that enumerates a log's records, or the ties between a log and its records: one instance is made of each
+/// record, under the agent's locks, and all are handed out when no lock is held any more.
 #pragma once
 
 #include <string>
@@ -12,12 +12,13 @@
 
 namespace cimple {
 
-/// A copy of what is recorded, of one of the logs.
+/// What is recorded, of one of the logs.
 struct Log_Records {
-    std::vector<NVR_CIMLogEntry> entries; ///< of the provider's log
-    std::vector<std::string> lines;       ///< of the driver's
+    std::vector<NVR_CIMLogEntry> entries; ///< of the provider's log: a copy, since logging goes on
+    const std::vector<std::string>* lines =
+        nullptr; ///< of the driver's: those of the store, which the locks keep still
 
-    std::size_t size() const { return entries.size() + lines.size(); }
+    std::size_t size() const { return lines ? lines->size() : entries.size(); }
 };
 
 /// What is different from one provider of records to the other.

@@ -8,6 +8,7 @@
 #include "logs/NVRHBA_RecordLog_Provider.h"
 #include "tests/agent/Simulated_Host.h"
 #include "tests/support/private_host.h"
+#include "tests/support/short_memory.h"
 
 namespace nvrtest {
 
@@ -99,6 +100,32 @@ protected:
         EXPECT_EQ(one.enum_instances(nullptr, {collect, &all}), 0);
         settle();
         return all;
+    }
+
+    /// With each allocation refused in turn: these words and nothing else, at last all.
+    template <class Provider>
+    void expect_all_or_nothing(const char* failure, std::size_t all)
+    {
+        Provider one;
+        std::vector<Instance*> seen;
+        const cimple::Enum_Handler handler = {[](Instance* instance, int, void* data) {
+                                                  static_cast<std::vector<Instance*>*>(data)->push_back(instance);
+                                                  return true;
+                                              },
+                                              &seen};
+        seen.reserve(all); // its memory is not the module's
+        words();
+        const long refused = refuse_each_allocation([&] { EXPECT_EQ(one.enum_instances(nullptr, handler), 0); },
+                                                    [&](bool has_thrown) {
+                                                        EXPECT_FALSE(has_thrown);
+                                                        EXPECT_EQ(words().back(), failure);
+                                                        EXPECT_TRUE(seen.empty());
+                                                    });
+        EXPECT_GT(refused, 10);
+        EXPECT_EQ(seen.size(), all);
+        for (Instance* instance : seen)
+            cimple::unref(instance);
+        settle();
     }
 
     cimple::NVRHBA_RecordLog_Provider provider;

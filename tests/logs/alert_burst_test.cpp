@@ -1,6 +1,6 @@
 // Bursts of events from many threads, with alerts going on and off.
 #include <array>
-#include <set>
+#include <cstring>
 #include <thread>
 
 #include "foundation/NVR_Common.h"
@@ -13,6 +13,27 @@ namespace {
 
 constexpr unsigned senders = 4;
 constexpr unsigned events = 10000;
+
+/// Counts what becomes of events, by the words of the log.
+class Counts : public NVR_LoggerInterface {
+public:
+    Counts() { CLogger::instance()->attach(this); }
+    ~Counts() override { CLogger::instance()->detach(this); }
+
+    void logMessage(sint32, const char*, uint32, const char* text) override
+    {
+        const auto begins = [text](const char* words) { return std::strncmp(text, words, std::strlen(words)) == 0; };
+        queued += begins("sending the signal for thread to indicate");
+        popped += begins("Popped from Queue: ");
+        delivered += begins("Indication Delivered to the specified client");
+        refused += begins("Error: Failed to deliver indication as ");
+    }
+    void open() override {}
+    void close() override {}
+    void clear() override {}
+
+    std::atomic<std::size_t> queued{0}, popped{0}, delivered{0}, refused{0};
+};
 
 class AlertBurst : public Alerts_Test {
 protected:
@@ -40,6 +61,23 @@ protected:
         string2HBAName(&wwn, number % 2 ? "10000000C9A00002" : "10000000C9A00001");
         return wwn;
     }
+    /// While alerts are off: each event that was queued was taken once, and then delivered or refused; the client has
+    /// what was delivered.
+    static void expect_each_accounted_for(const Counts& counts, std::size_t at_client)
+    {
+        EXPECT_EQ(counts.popped, counts.queued);
+        EXPECT_EQ(counts.delivered + counts.refused, counts.popped);
+        EXPECT_EQ(at_client, counts.delivered);
+    }
+    /// Each with a number of its own, in the order of delivery.
+    static void expect_own_numbers(const std::vector<Ref<NVRHBA_AlertIndication>>& alerts)
+    {
+        sint64 last = -1;
+        for (const auto& alert : alerts) {
+            EXPECT_GT(alert->SequenceNumber.value, last);
+            last = alert->SequenceNumber.value;
+        }
+    }
     /// No number twice, none left out.
     static void expect_each_once(const std::vector<Ref<NVRHBA_AlertIndication>>& alerts)
     {
@@ -53,6 +91,7 @@ protected:
 
 TEST_F(AlertBurst, NoneIsLostWhileAlertsAreOn)
 {
+    const Counts counts;
     ASSERT_EQ(enable(), 0);
     from_many_threads([](unsigned sender) {
         for (unsigned i = 0; i < events / senders; i++)
@@ -61,6 +100,8 @@ TEST_F(AlertBurst, NoneIsLostWhileAlertsAreOn)
     const auto alerts = client.wait_for(events);
     EXPECT_EQ(disable(), 0);
     ASSERT_EQ(client.count(), events);
+    EXPECT_EQ(counts.queued, events);
+    expect_each_accounted_for(counts, events);
     expect_each_once(alerts);
     std::size_t downs = 0;
     for (const auto& alert : alerts)
@@ -82,13 +123,18 @@ TEST_F(AlertBurst, ThroughTheLibraryNoneIsLostEither)
 
 TEST_F(AlertBurst, WithAlertsGoingOnAndOffEachIsDeliveredAtMostOnce)
 {
-    std::atomic<bool> goes_on{true};
+    const Counts counts;
+    std::atomic<bool> goes_on{true}, is_on{false};
     std::atomic<int> rounds{0};
     std::thread switches([&] {
         Fake_Context mine;
         Thread_Context::push(&mine);
         while (goes_on || rounds < 3) {
             EXPECT_EQ(enable(), 0);
+            is_on = true;
+            const std::size_t before = counts.queued;
+            while (goes_on && counts.queued == before)
+                std::this_thread::yield();
             EXPECT_EQ(disable(), 0);
             // Nothing comes behind a disable.
             const std::size_t count = client.count();
@@ -98,6 +144,8 @@ TEST_F(AlertBurst, WithAlertsGoingOnAndOffEachIsDeliveredAtMostOnce)
         }
         Thread_Context::pop();
     });
+    while (!is_on)
+        std::this_thread::yield();
     from_many_threads([](unsigned sender) {
         for (unsigned i = 0; i < events / senders; i++)
             nvrsim_event(sender % 2 ? "1" : "0", link_up, sender);
@@ -107,15 +155,10 @@ TEST_F(AlertBurst, WithAlertsGoingOnAndOffEachIsDeliveredAtMostOnce)
     switches.join();
     EXPECT_EQ(client.stops, rounds);
     const auto alerts = client.wait_for(0);
-    EXPECT_LE(alerts.size(), events);
-    std::set<sint64> numbers;
-    sint64 last = -1;
-    for (const auto& alert : alerts) {
-        EXPECT_GT(alert->SequenceNumber.value, last);
-        last = alert->SequenceNumber.value;
-        numbers.insert(last);
-    }
-    EXPECT_EQ(numbers.size(), alerts.size());
+    EXPECT_GT(counts.queued, 0u);
+    EXPECT_LE(counts.queued, events);
+    expect_own_numbers(alerts);
+    expect_each_accounted_for(counts, alerts.size());
 
     // And on again, none is lost.
     ASSERT_EQ(enable(), 0);
@@ -128,23 +171,33 @@ TEST_F(AlertBurst, WithAlertsGoingOnAndOffEachIsDeliveredAtMostOnce)
 
 TEST_F(AlertBurst, CallbacksFromManyThreadsMeetAChangeOfState)
 {
-    std::atomic<bool> goes_on{true};
+    const Counts counts;
+    std::atomic<bool> goes_on{true}, is_on{false};
     std::thread switches([&] {
         Fake_Context mine;
         Thread_Context::push(&mine);
         while (goes_on) {
             EXPECT_EQ(enable(), 0);
+            is_on = true;
+            const std::size_t before = counts.queued;
+            while (goes_on && counts.queued == before)
+                std::this_thread::yield();
             EXPECT_EQ(disable(), 0);
         }
         Thread_Context::pop();
     });
+    while (!is_on)
+        std::this_thread::yield();
     from_many_threads([](unsigned sender) {
         for (unsigned i = 0; i < events / senders; i++)
             NVRHBA_AlertIndication_Provider::hbaThreadProc(nullptr, port(sender), link_down, i);
     });
     goes_on = false;
     switches.join();
-    EXPECT_LE(client.count(), events);
+    EXPECT_GT(counts.queued, 0u);
+    EXPECT_LE(counts.queued, events);
+    expect_own_numbers(client.wait_for(0));
+    expect_each_accounted_for(counts, client.count());
 }
 
 TEST_F(AlertBurst, RefreshesGoOnBetweenDeliveries)

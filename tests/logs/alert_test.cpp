@@ -6,10 +6,13 @@
 #include "foundation/NVR_Common.h"
 #include "foundation/management_binding.h"
 #include "inventory/NVR_Data.h"
+#include "inventory/Port.h"
 #include "logs/Alert_Queue.h"
+#include "logs/alert_instance.h"
 #include "tests/agent/Other_Adapter.h"
 #include "tests/agent/expect_rows.h"
 #include "tests/logs/Alerts_Test.h"
+#include "tests/support/short_memory.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -618,4 +621,101 @@ TEST_F(Alerts, ADeliveryThatThrowsCostsOnlyItself)
     link("0", true);
     expect_rows(client.wait_for(1)[0].get(), {{"SequenceNumber", "1"}});
     EXPECT_EQ(disable(), 0);
+}
+
+TEST_F(Alerts, ADeliveryThatThrowsIsTold)
+{
+    client.during = [] { throw 1; };
+    ASSERT_EQ(enable(), 0);
+    link("0", false);
+    wait_for_word("Error: Failed to generate or deliver the indication");
+    EXPECT_EQ(disable(), 0);
+    EXPECT_EQ(client.count(), 0u);
+}
+
+TEST_F(Alerts, AnEventOfAnotherTypeWouldBeToldAsUnknown)
+{
+    const Ref<NVRHBA_AlertIndication> alert = makeAlert(agent(), wwn_of(first_wwpn), 515);
+    ASSERT_TRUE(alert);
+    expect_rows(alert.get(), {{"Description", "Port WWN 10000000C9A00001 status changed to unknown."},
+                              {"ProbableCause", "0"},
+                              {"ProbableCauseDescription", "Unknown"},
+                              {"Message", "null"},
+                              {"MessageID", "Norvane"}});
+}
+
+TEST_F(Alerts, WithoutMemoryAnAlertIsNotMadeAndCostsNoNumber)
+{
+    Ref<NVRHBA_AlertIndication> alert;
+    ProviderAgent& the_agent = agent();
+    const HBA_WWN port = wwn_of(first_wwpn);
+    words();
+    int ports = 0, alerts = 0;
+    refuse_each_allocation([&] { alert = makeAlert(the_agent, port, link_down); },
+                           [&](bool has_thrown) {
+                               EXPECT_FALSE(alert);
+                               EXPECT_EQ(the_agent.m_indicationSequence, 0u);
+                               const std::string last = words().back();
+                               const bool is_port = last == "Could not create FCPort instance";
+                               const bool is_alert = last == "Could not create the required AlertIndication instance";
+                               EXPECT_NE(has_thrown, is_port || is_alert) << last;
+                               ports += is_port;
+                               alerts += is_alert;
+                           });
+    EXPECT_GT(ports, 5);
+    EXPECT_GT(alerts, 5);
+    ASSERT_TRUE(alert);
+    expect_rows(alert.get(), {{"SequenceNumber", "0"}});
+}
+
+TEST_F(Alerts, WithoutMemoryEnablingLeavesNothingThatCannotBeTakenBack)
+{
+    settle();
+    int status = -1;
+    const long refused = refuse_each_allocation(
+        [&] {
+            auto handler = client.handler();
+            status = provider->enable_indications(std::move(handler));
+        },
+        [&](bool) {
+            nvrsim_clear_log();
+            EXPECT_EQ(disable(), 0);
+            EXPECT_EQ(nvrsim_callbacks(), 0u);
+        });
+    EXPECT_GT(refused, 5);
+    EXPECT_EQ(status, 0);
+    EXPECT_EQ(nvrsim_callbacks(), 2u) << "no port is taken for one that is registered";
+    link("0", false);
+    client.wait_for(1);
+}
+
+TEST_F(Alerts, APortThatTwoAdaptersListIsToldOnce)
+{
+    scenario("allow_twins = true\n"
+             "[[adapter]]\n[[adapter.port]]\nwwpn = '10000000C9A00001'\n"
+             "[[adapter]]\n[[adapter.port]]\nwwpn = '10000000C9A00001'\n");
+    refresh();
+    ASSERT_EQ(agent().m_pData->getAdapters().size(), 2u);
+    ASSERT_EQ(enable(), 0);
+    EXPECT_EQ(nvrsim_callbacks(), 1u);
+    call_back(first_wwpn, link_down);
+    client.wait_for(1);
+    EXPECT_EQ(disable(), 0);
+    EXPECT_EQ(nvrsim_callbacks(), 0u);
+}
+
+TEST_F(Alerts, APortWhoseNameIsNoneEndsTheRegistration)
+{
+    struct Odd_Port : FCPort {
+        explicit Odd_Port(Adapter* adapter) : FCPort(adapter, 0) { m_portName = "no name"; }
+    };
+    auto& adapters = agent().m_pData->getAdapters();
+    adapters.front()->getPorts()->push_back(new Odd_Port(adapters.front()));
+    words();
+    EXPECT_EQ(enable(), 140);
+    EXPECT_THAT(words(), Contains("INVALID WWN"));
+    EXPECT_EQ(nvrsim_callbacks(), 2u) << "those before it";
+    EXPECT_EQ(nvrsim_open_handles(), 0u);
+    EXPECT_EQ(disable(), 0);
+    EXPECT_EQ(nvrsim_callbacks(), 0u);
 }

@@ -153,6 +153,15 @@ TEST_F(DriverEvents, TheTiesKnowALineByAnotherKey)
                                             "Exit -- NVRHBA_DriverRecordLogManagesRecord"}));
 }
 
+TEST_F(DriverEvents, WithoutMemoryNothingIsHandedOut)
+{
+    write_file(system_log, line(1) + "\n" + line(2) + "\n");
+    read();
+    expect_all_or_nothing<NVRHBA_FCDriverLogEntry_Provider>("Could not create NVRVCNA_LogEntry instance", 2);
+    expect_all_or_nothing<NVRHBA_DriverRecordLogManagesRecord_Provider>(
+        "Could not create NVRHBA_FCDriverLogEntry instance", 2);
+}
+
 TEST_F(DriverEvents, ReadingAnewForgetsWhatWasThere)
 {
     write_file(system_log, line(1) + "\n");

@@ -3,6 +3,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "logs/NVRHBA_DriverRecordLogManagesRecord_Provider.h"
+#include "logs/NVRHBA_FCDriverLogEntry_Provider.h"
 #include "logs/NVRHBA_LogEntry_Provider.h"
 #include "logs/NVRHBA_RecordLogManagesRecord_Provider.h"
 #include "tests/agent/expect_rows.h"
@@ -140,6 +142,15 @@ TEST_F(RecordLog, WithoutItsInstanceTheRecordsHaveNoNamesAndNoTies)
     EXPECT_THAT(words(), Not(Contains("NVRHBA_RecordLogManagesRecord returned instance 0")));
 }
 
+TEST_F(RecordLog, WithoutMemoryNothingIsHandedOut)
+{
+    set_params(provider_log(), 5, 1, "");
+    for (const char* record : {"one", "two", "three"})
+        log_at(1, record);
+    expect_all_or_nothing<NVRHBA_LogEntry_Provider>("Could not create NVRVCNA_LogEntry instance", 3);
+    expect_all_or_nothing<NVRHBA_RecordLogManagesRecord_Provider>("Could not create NVRVCNA_LogEntry instance", 3);
+}
+
 TEST_F(RecordLog, ParametersAreShownStoredAndReadBack)
 {
     for (const uint16 mode : {uint16{2}, uint16{4}}) {
@@ -264,6 +275,9 @@ TEST_F(RecordLog, DevicesAndDanglingLinksCanBeTraceFiles)
 TEST_F(RecordLog, ClearingEmptiesTraceFileAndRing)
 {
     set_params(provider_log(), 5, 4, trace);
+    auto& logs = agent().m_NVRHBA_RecordLog_map;
+    ASSERT_EQ(logs[0], log_of(provider_log()));
+    logs[0]->CurrentNumberOfRecords.set(uint64{7});
     log_at(1, "record");
     ASSERT_THAT(read_file(trace), testing::HasSubstr("[NVR_CRIT] record"));
     words();
@@ -272,7 +286,7 @@ TEST_F(RecordLog, ClearingEmptiesTraceFileAndRing)
     EXPECT_THAT(words(), Contains("Cleared all the logs"));
     EXPECT_THAT(read_file(trace), Not(testing::HasSubstr("[NVR_CRIT] record")));
     EXPECT_THAT(entries(), IsEmpty());
-    EXPECT_EQ(shown("CurrentNumberOfRecords"), "null"); // as it was
+    EXPECT_EQ(shown("CurrentNumberOfRecords"), "7") << "as it was";
 }
 
 TEST_F(RecordLog, IsDisabledAndEnabled)
@@ -359,15 +373,21 @@ TEST(RecordLogWithoutAnAgent, HasNoRecordsAndSaysWhy)
             install({});
             NVRHBA_LogEntry_Provider entries;
             NVRHBA_RecordLogManagesRecord_Provider ties;
+            NVRHBA_FCDriverLogEntry_Provider lines;
+            NVRHBA_DriverRecordLogManagesRecord_Provider line_ties;
             EXPECT_EQ(entries.load(), 30);
             words();
             Instances all;
             EXPECT_EQ(entries.enum_instances(nullptr, {collect, &all}), 0);
             EXPECT_EQ(ties.enum_instances(nullptr, {collect, &all}), 0);
+            EXPECT_EQ(lines.enum_instances(nullptr, {collect, &all}), 0);
+            EXPECT_EQ(line_ties.enum_instances(nullptr, {collect, &all}), 0);
             EXPECT_THAT(all, IsEmpty());
-            EXPECT_THAT(words(),
-                        testing::ElementsAre("RM Init failed for logs/NVRHBA_LogEntry_Provider.cpp",
-                                             "RM Init failed for logs/NVRHBA_RecordLogManagesRecord_Provider.cpp"));
+            EXPECT_THAT(words(), testing::ElementsAre(
+                                     "RM Init failed for logs/NVRHBA_LogEntry_Provider.cpp",
+                                     "RM Init failed for logs/NVRHBA_RecordLogManagesRecord_Provider.cpp",
+                                     "RM Init failed for logs/NVRHBA_FCDriverLogEntry_Provider.cpp",
+                                     "RM Init failed for logs/NVRHBA_DriverRecordLogManagesRecord_Provider.cpp"));
             entries.unload();
         }
     };

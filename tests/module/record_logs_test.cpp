@@ -3,6 +3,7 @@
 
 #include <gmock/gmock.h>
 
+#include "tests/module/support/Entries.h"
 #include "tests/module/support/Rig.h"
 #include "tests/support/private_host.h"
 #include "tests/support/trace.h"
@@ -120,11 +121,67 @@ TEST_P(RecordLogs, TheDriversLinesComeWhenAsked)
     remove(system_log);
 }
 
-TEST_P(RecordLogs, MethodsOfAForeignInstanceAreRefused)
+// The logger is one: who steers it by a log that is not there steers it all the same, and no log shows it.
+TEST_P(RecordLogs, ALogThatIsNotThereIsSteeredButNotShown)
 {
     Rig rig({*GetParam()});
     ASSERT_THAT(rig.enumerate("NVRHBA_FCPort"), succeeded());
-    host::Path unknown = log_path("no such log");
+    const host::Path unknown = log_path("no such log");
+    EXPECT_THAT(rig.server().get(unknown), failed_with(CMPI_RC_ERR_NOT_FOUND));
+    const auto shown = [&](const char* property) {
+        return rig.server().get(provider_log()).instances.at(0).get(property).to_text();
+    };
+    const std::string mode = shown("LogMode"), path = shown("TracePath"), state = shown("EnabledState");
+    EXPECT_EQ(set_params(rig, unknown, 3, 1, "").value.as_uint(), 32968u);
+    EXPECT_EQ(set_params(rig, unknown, 5, 4, other_trace).value.as_uint(), 0u);
+    EXPECT_EQ(read_file(dmp_path), std::string("4,5,1\n") + other_trace);
     EXPECT_EQ(request(rig, unknown, 77).value.as_uint(), 32968u);
+    EXPECT_EQ(request(rig, unknown, 3).value.as_uint(), 0u);
+    EXPECT_EQ(read_file(dmp_path), std::string("4,5,0\n") + other_trace);
+    EXPECT_EQ(request(rig, unknown, 2).value.as_uint(), 0u);
+    EXPECT_EQ(rig.server().call(unknown, "ClearLog").value.as_uint(), 0u);
+    EXPECT_EQ(shown("LogMode"), mode);
+    EXPECT_EQ(shown("TracePath"), path);
+    EXPECT_EQ(shown("EnabledState"), state);
+    EXPECT_THAT(rig.enumerate("NVRHBA_RecordLog").instances, SizeIs(2));
     EXPECT_THAT(rig.server().report().violations, IsEmpty());
+    rig.stop();
+    remove(other_trace);
+}
+
+// A server routes by class. What is handed to this provider all the same is no log of its, whatever its methods.
+TEST_P(RecordLogs, AnInstanceOfAnotherClassIsNoLog)
+{
+    Rig rig({*GetParam()});
+    const host::Path other = rig.names("NVRHBA_DiagnosticsLog").paths.at(0);
+    const std::string id = other.find("InstanceID")->as_text();
+    Entries entries;
+    rig.settle();
+    rig.forget_words();
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        CMPIMethodMI* mi = entries.methods("NVRHBA_RecordLog", broker, context);
+        ASSERT_TRUE(mi);
+        CMPIStatus status = {CMPI_RC_OK, nullptr};
+        CMPIObjectPath* path = broker->eft->newObjectPath(broker, "root/norvane", other.class_name.c_str(), &status);
+        ASSERT_TRUE(path);
+        path->ft->addKey(path, "InstanceID", reinterpret_cast<const CMPIValue*>(id.c_str()), CMPI_chars);
+        CMPIArgs* in = broker->eft->newArgs(broker, &status);
+        CMPIArgs* out = broker->eft->newArgs(broker, &status);
+        CMPIValue disabled;
+        disabled.uint16 = 3;
+        in->ft->addArg(in, "RequestedState", &disabled, CMPI_uint16);
+        const auto call = [&](const char* method) {
+            return mi->ft->invokeMethod(mi, context, nullptr, path, method, in, out).rc;
+        };
+        EXPECT_EQ(call("SetLogParams"), CMPI_RC_ERR_METHOD_NOT_FOUND) << "which is of record logs alone";
+        EXPECT_EQ(call("RequestStateChange"), CMPI_RC_OK);
+        EXPECT_EQ(call("ClearLog"), CMPI_RC_OK);
+        in->ft->release(in);
+        out->ft->release(out);
+        path->ft->release(path);
+        mi->ft->cleanup(mi, context, 1);
+    });
+    EXPECT_EQ(rig.count_words("Invalid instance of Record Log"), 2u);
+    const std::vector<std::string> words = rig.words();
+    EXPECT_THAT(words, testing::Not(testing::AnyOf(Contains("Cleared all the logs"), Contains("Logs disabled"))));
 }
