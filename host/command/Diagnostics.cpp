@@ -93,6 +93,7 @@ private:
     int find_of_test(const char* class_name, const char* key, Path& found);
     int find_port(Path& found);
     int read_settings(const std::string& test, Value& settings);
+    int refuse_settings(const std::string& test);
     int tell_run(const Answer& answer, const std::string& test, const std::string& port);
 
     Host& m_server;
@@ -217,6 +218,20 @@ int Diagnostics::read_settings(const std::string& test, Value& settings)
     return 0;
 }
 
+/// A setting that the test does not have would be dropped without a word.
+int Diagnostics::refuse_settings(const std::string& test)
+{
+    if (m_options.given.empty()) return 0;
+    for (const Instance& setting : m_server.enumerate(m_options.name_space, setting_class).instances) {
+        if (setting.get("InstanceID").as_text() != test) continue;
+        for (const auto& [label, text] : m_options.given)
+            if (setting.get(label == "--target" ? "TargetDevice" : "BufferSizes").is_null())
+                return wrong("the " + short_name(test) + " test takes no " + label +
+                             "; diag list shows the options of each");
+    }
+    return 0;
+}
+
 int Diagnostics::run()
 {
     Path test, port;
@@ -226,6 +241,7 @@ int Diagnostics::run()
     std::vector<Named_Value> arguments = {{"ManagedElement", Value::reference(port)}};
     Value settings;
     if (int status = read_settings(name, settings)) return status;
+    if (int status = refuse_settings(name)) return status;
     if (!settings.is_null()) arguments.push_back({"DiagnosticSettings", settings});
     Answer answer;
     {

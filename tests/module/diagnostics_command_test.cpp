@@ -3,6 +3,10 @@
 #include <sstream>
 #include <string>
 
+#include <pty.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
 #include <gmock/gmock.h>
 
 #include "host/command/Check.h"
@@ -69,6 +73,48 @@ TEST(DiagnosticCommand, TellsFailuresInWordsAndByItsStatus)
            "  result = NVR:FCHBA Ping Test Resulted with Failure, Result - Error: Target Unreachable , 99 of 100 loops "
            "passed in 1 s\n"
            "  job = NVR:FCHBA Ping Test:1:1\n");
+}
+
+TEST(DiagnosticCommand, RefusesSettingsThatATestDoesNotHave)
+{
+    const auto refused = [](const std::string& test, const std::string& option) {
+        return "nvrcim: wrong command: the " + test + " test takes no " + option +
+               "; diag list shows the options of each\n";
+    };
+    const struct {
+        const char* test;
+        const char* option;
+        const char* value;
+    } rows[] = {{"beacon", "--loops", " 3"},
+                {"status", "--pattern", " 5a"},
+                {"reset", "--size", " 4"},
+                {"self", "--halt-on-error", ""},
+                {"self", "--target", " 50060E8005A10000"},
+                {"internal-loopback", "--target", " 50060E8005A10000"}};
+    for (const auto& row : rows)
+        expect(std::string("diag run ") + row.test + " " + row.option + row.value, 64, refused(row.test, row.option));
+}
+
+TEST(DiagnosticCommand, TellsOnATerminalThatTheTestRuns)
+{
+    int terminal = -1;
+    const pid_t child = forkpty(&terminal, nullptr, nullptr, nullptr);
+    ASSERT_GE(child, 0);
+    if (child == 0) {
+        execl(NVR_NVRCIM, NVR_NVRCIM, "--module", NVR_MODULE, "--scenario", NVRSIM_BUILD "/scenarios/small.toml",
+              "diag", "run", "self", nullptr);
+        _exit(127);
+    }
+    std::string output;
+    char buffer[4096];
+    for (ssize_t size; (size = read(terminal, buffer, sizeof buffer)) > 0;) // an error: the other side is closed
+        output.append(buffer, static_cast<std::size_t>(size));
+    int status = -1;
+    waitpid(child, &status, 0);
+    close(terminal);
+    EXPECT_EQ(status, 0);
+    EXPECT_THAT(output, HasSubstr("\r| running the self test, "));
+    EXPECT_THAT(output, HasSubstr("\r\033[Kdiag run self, port 10000000C9A00001: passed, carried out (0)\r\n"));
 }
 
 TEST(DiagnosticCommand, NamesWhatIsMissing)

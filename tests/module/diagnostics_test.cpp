@@ -1,8 +1,11 @@
 // The diagnostics as a management client meets them: runs, jobs, records, help and logs through the module's factories.
 #include <algorithm>
+#include <atomic>
 #include <chrono>
+#include <mutex>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include <gmock/gmock.h>
@@ -471,6 +474,148 @@ TEST_P(DiagnosticRuns, FailuresAtTheAdapterAreRecordsAndFailuresOfTheRunAreNumbe
     clear_faults();
     EXPECT_THAT(run(rig, self), returned(0));
     expect_clean();
+}
+
+// Every way from poll to poll, with what the client gets of it and how long it waited.
+TEST(DiagnosticPolls, EndInAJobOrInANumber)
+{
+    const std::string never = "polls = 100000";
+    const struct {
+        std::string adapter;   // how it answers polls
+        std::string fault;     // of the library
+        std::uint64_t value;   // of the method
+        bool has_job;          //
+        long long seconds;     // slept
+        std::uint64_t cancels; // asked
+    } rows[] = {
+        {"polls = 0", "", 0, true, 1, 0},
+        {"polls = 1, running_status = 0", "", 0, true, 2, 0},
+        {"polls = 120", "", 0, true, 121, 0}, // the last one in time
+        {"polls = 120, running_state = 2", "", 0, true, 121, 0},
+        {"polls = 121, running_state = 0", "", 0, true, 122, 0}, // and without a state
+        // Cancels that work, at once and after a while.
+        {"polls = 121", "", 40060, false, 122, 1},
+        {never + ", running_state = 2", "", 40060, false, 122, 1},
+        {never + ", running_status = 0", "", 0, false, 122, 1},
+        {never + ", running_state = 2, running_status = 0", "", 0, false, 122, 1},
+        {never + ", cancel_polls = 5", "", 40060, false, 127, 6},
+        // One that fails, with the test going on and with its end, and one that times out.
+        {never + ", can_cancel = false", "", 40060, false, 244, 122},
+        {"polls = 121, can_cancel = false", "", 0, true, 244, 122},
+        {never + ", cancel_polls = 100000", "", 40060, false, 244, 122},
+        {never + ", cancel_polls = 100000, running_status = 0", "", 0, false, 243, 122},
+        // No state that a running test has.
+        {never + ", running_state = 0", "", 40060, false, 122, 0},
+        {never + ", running_state = 3", "", 40060, false, 122, 0},
+        {never + ", running_state = 0, running_status = 0", "", 0, false, 1, 0},
+        {"polls = 0, state = 5", "", 0, false, 1, 0},
+        {"polls = 0, state = 7", "", 0, false, 1, 0},
+        {"polls = 0, state = 4294967295", "", 0, false, 1, 0},
+        // Other statuses, at the first poll and later.
+        {"polls = 3", "call = \"RM_DiagGetResults\", status = 1", 40001, false, 1, 0},
+        {"polls = 3", "call = \"RM_DiagGetResults\", from = 2, status = 62", 40062, false, 2, 0},
+        {"polls = 3", "call = \"RM_DiagGetResults\", from = 3, status = 4294967295", 39999, false, 3, 0},
+        {"polls = 0", "call = \"RM_DiagGetResults\", damage = \"ones\"", 0, false, 1, 0},
+    };
+    const char* const tests[] = {internal, self, ping}; // which share the course of their polls
+    std::size_t turn = 0;
+    int jobs = 0; // they are counted for as long as the module is there
+    for (const auto& row : rows) {
+        const char* test = tests[turn++ % 3];
+        SCOPED_TRACE(row.adapter + "; " + row.fault + "; " + test);
+        Rig rig({host::Manner::strict(),
+                 "[[adapter]]\n[[adapter.port]]\ndiagnostics = { " + row.adapter + " }\n[[target]]\n"});
+        Arguments more;
+        if (test == ping) more = {{"DiagnosticSettings", settings_of(ping, {{"TargetDevice", target_device(target)}})}};
+        if (!row.fault.empty()) add_fault(row.fault);
+        const auto before = slept();
+        const Called called = run(rig, test, more);
+        EXPECT_THAT(called, returned(row.value));
+        EXPECT_EQ(job_id(called), row.has_job ? job_of(test, ++jobs, 1) : "no job");
+        EXPECT_EQ(slept() - before, std::chrono::seconds(row.seconds));
+        EXPECT_EQ(calls("RM_DiagCancelDiagnostic"), row.cancels);
+        EXPECT_THAT(called.words,
+                    Contains(std::string(test) + (row.value ? " Failed to Run" : " Launched/Completed Succesful")));
+        EXPECT_EQ(rig.enumerate("NVRHBA_DiagnosticServiceRecord").instances.size(), row.has_job ? 1u : 0u);
+        EXPECT_EQ(rig.enumerate("NVRHBA_ConcreteJob").instances.size(), row.has_job ? 1u : 0u);
+        clear_faults();
+    }
+}
+
+// The tests wait for each other, and readers see each job with its records.
+TEST(DiagnosticThreads, RunsFromManyThreadsAreOneAfterTheOther)
+{
+    Rig rig({host::Manner::strict(), "typical"});
+    constexpr unsigned threads = 4, runs = 8;
+    const std::vector<host::Path> ports = rig.names("NVRHBA_PortController").paths;
+    const std::vector<host::Path> tests = rig.names("NVRHBA_FCHBADiagnosticTest").paths;
+    const host::Path log = rig.names("NVRHBA_DiagnosticsLog").paths.at(6);
+    ASSERT_EQ(log.find("InstanceID")->as_text(), status);
+    ASSERT_THAT(ports, SizeIs(threads));
+    std::mutex mutex;
+    std::vector<std::string> jobs;
+    std::atomic<bool> goes_on{true};
+    std::vector<std::thread> all;
+    for (unsigned thread = 0; thread < threads; thread++)
+        all.emplace_back([&, thread] {
+            for (unsigned i = 0; i < runs; i++) {
+                const host::Path& test = tests.at(i % 2 ? 4 : 8); // internal loopback, self test
+                Called called;
+                called.answer = rig.server().call(test, "RunDiagnosticService",
+                                                  {{"ManagedElement", host::Value::reference(ports.at(thread))}});
+                EXPECT_THAT(called, returned(0));
+                const std::lock_guard<std::mutex> lock(mutex);
+                jobs.push_back(job_id(called));
+            }
+        });
+    std::thread reader([&] {
+        while (goes_on) {
+            const auto jobs_seen = rig.enumerate("NVRHBA_ConcreteJob").instances.size();
+            const auto records_seen = rig.enumerate("NVRHBA_DiagnosticCompletionRecord").instances.size();
+            EXPECT_GE(records_seen, jobs_seen);
+            EXPECT_THAT(rig.server().call(log, "ClearLog"), succeeded());
+        }
+    });
+    for (std::thread& thread : all)
+        thread.join();
+    goes_on = false;
+    reader.join();
+    std::sort(jobs.begin(), jobs.end());
+    EXPECT_EQ(std::unique(jobs.begin(), jobs.end()), jobs.end()) << "a job came twice";
+    EXPECT_THAT(jobs, SizeIs(threads * runs));
+    EXPECT_THAT(rig.enumerate("NVRHBA_ConcreteJob").instances, SizeIs(threads * runs));
+    EXPECT_THAT(rig.enumerate("NVRHBA_LogManagesRecord").instances, SizeIs(2 * threads * runs));
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
+}
+
+TEST(DiagnosticThreads, RunsMeetRebuilds)
+{
+    Rig rig({host::Manner::strict(), "typical", refreshing_settings});
+    const host::Path port = rig.names("NVRHBA_PortController").paths.at(0);
+    const host::Path test = rig.names("NVRHBA_FCHBADiagnosticTest").paths.at(4);
+    std::atomic<bool> goes_on{true};
+    std::vector<std::thread> all;
+    for (int thread = 0; thread < 2; thread++)
+        all.emplace_back([&] {
+            const host::Value given = settings_of(internal, {{"LoopControlParameter", strings({"7"})}});
+            while (goes_on) {
+                // In the middle of a rebuild there may be no such test.
+                const host::Answer answer = rig.server().call(
+                    test, "RunDiagnosticService",
+                    {{"ManagedElement", host::Value::reference(port)}, {"DiagnosticSettings", given}});
+                ASSERT_THAT(answer, succeeded());
+                EXPECT_THAT(answer.value.as_uint(), testing::AnyOf(0u, 5u));
+            }
+        });
+    for (int round = 0; round < 5; round++)
+        rig.refresh();
+    goes_on = false;
+    for (std::thread& thread : all)
+        thread.join();
+    rig.refresh();
+    EXPECT_THAT(rig.enumerate("NVRHBA_ConcreteJob").instances, IsEmpty());
+    EXPECT_EQ(setting(rig, internal).get("LoopControlParameter").to_text(), "{100}");
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
 }
 
 TEST_P(DiagnosticRuns, AreForgottenWhenTheAdaptersAreReadAnew)

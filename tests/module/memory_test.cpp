@@ -195,6 +195,61 @@ TEST_P(Memory, ARefreshLeavesTheSameInstancesAndNotAByteMore)
     EXPECT_EQ(held_at_rest(resting), before) << "after the requests";
 }
 
+// All nine tests on each port, with overrides and without, jobs that go at once and logs that are cleared.
+TEST(MemoryOfDiagnostics, ARebuildTakesAllThatRunsLeft)
+{
+    const std::size_t resting = threads();
+    Rig rig({host::Manner::strict(), "typical", refreshing_settings});
+    library.find("libstdc++.so");
+    ASSERT_THAT(rig.names("NVRHBA_FCPort"), succeeded());
+    module.find("libnorvane_fc_provider.so");
+    ASSERT_NE(module.first, 0u);
+    const auto with_id = [](const char* class_name, const host::Value& id) {
+        host::Instance instance;
+        instance.path.name_space = "root/norvane";
+        instance.path.class_name = class_name;
+        instance.set("InstanceID", id);
+        return instance;
+    };
+    const auto run_all = [&](bool deletes) {
+        for (const host::Path& test : rig.names("NVRHBA_FCHBADiagnosticTest").paths) {
+            host::Instance settings = with_id("NVRHBA_FCHBADiagnosticSettingData", *test.find("Name"));
+            settings.set("LoopControlParameter", host::Value::array(CMPI_string, {host::Value::string("7")}));
+            settings.set("TargetDevice", host::Value::string("50060E8005A10000"));
+            host::Instance jobs = with_id("NVRHBA_JobSettingData", host::Value::string("NVR:FCHBA JobSettingData"));
+            jobs.set("DeleteOnCompletion", host::Value::boolean(deletes));
+            for (const host::Path& port : rig.names("NVRHBA_PortController").paths)
+                ASSERT_THAT(rig.server().call(test, "RunDiagnosticService",
+                                              {{"ManagedElement", host::Value::reference(port)},
+                                               {"DiagnosticSettings", host::Value::instance(settings)},
+                                               {"JobSettings", host::Value::instance(jobs)}}),
+                            succeeded());
+        }
+    };
+    const auto act = [&] {
+        run_all(false);
+        const std::size_t records = rig.enumerate("NVRHBA_DiagnosticCompletionRecord").instances.size();
+        EXPECT_GT(records, 20u);
+        run_all(true);
+        EXPECT_EQ(rig.enumerate("NVRHBA_DiagnosticCompletionRecord").instances.size(), 2 * records);
+        const std::vector<host::Path> logs = rig.names("NVRHBA_DiagnosticsLog").paths;
+        for (std::size_t i = 0; i < logs.size(); i += 2)
+            ASSERT_THAT(rig.server().call(logs[i], "ClearLog"), succeeded());
+    };
+    act();
+    rig.refresh();
+    const std::string names = all_names(rig);
+    rig.refresh();
+    const Held before = held_at_rest(resting);
+    for (int round = 0; round < 3; round++) {
+        act();
+        EXPECT_GT(held_at_rest(resting).blocks, before.blocks + 1000) << "nothing was left to take";
+        rig.refresh();
+        EXPECT_EQ(held_at_rest(resting), before) << "round " << round;
+    }
+    EXPECT_EQ(all_names(rig), names);
+}
+
 INSTANTIATE_TEST_SUITE_P(Of, Memory, testing::Bool(),
                          [](const auto& info) { return info.param ? "AThousandPaths" : "TheTypicalHost"; });
 
