@@ -33,6 +33,8 @@ struct Point {
     const char* name;
     unsigned ports, targets, luns;
     unsigned paths() const { return ports * targets * luns; }
+    /// What a port's endpoint is tied to: its units and their endpoints.
+    unsigned port_ends() const { return 2 * targets * luns; }
 };
 
 constexpr Point points[] = {
@@ -176,7 +178,7 @@ void measure_lookups(nvrbench::Bench_Host& host, const Point& point, Figures& fi
     figures["volume_all"] =
         least_of([&] { require(server.associators(volume).instances.size() >= 2, "a volume lost its ends"); });
     const host::Path initiator = server.names(name_space, "NVRHBA_SCSIProtocolInitiatorEndpoint").paths.at(0);
-    const std::size_t ends = 2 * point.targets * point.luns;
+    const std::size_t ends = point.port_ends();
     figures["port_devices"] =
         least_of([&] {
             const char* path_class = "NVRHBA_SCSIInitiatorTargetStorageVolumePath";
@@ -246,16 +248,41 @@ void print_row(const Point& point, const Figures& f)
     std::fflush(stdout);
 }
 
+/// The points a power of ten apart: whole times, and what a path costs relative to the host of 1,000.
+void print_growth(const std::map<std::string, Figures>& measured)
+{
+    const char* const compared[] = {"64", "1000", "10000", "XXL"};
+    const Figures& unit = measured.at("1000");
+    std::puts("\n| paths | refresh s | a path to 1,000 | enumeration s | a path to 1,000 | names s | a path to 1,000 | "
+              "heap B/path | to 1,000 | "
+              "from a port s | an end to 1,000 |");
+    std::puts("|---|---|---|---|---|---|---|---|---|---|---|");
+    for (const char* name : compared) {
+        const auto found = measured.find(name);
+        if (found == measured.end()) continue;
+        const Point& point = point_of(name);
+        const Figures& f = found->second;
+        std::printf("| %u |", point.paths());
+        for (const char* figure : {"refresh", "instances", "names"})
+            std::printf(" %.4f | %.2f |", f.at(figure) * point.paths() * 1e-6, f.at(figure) / unit.at(figure));
+        std::printf(" %.0f | %.2f | %.4f | %.2f |\n", f.at("heap"), f.at("heap") / unit.at("heap"),
+                    f.at("port_devices") * point.port_ends() * 1e-6, f.at("port_devices") / unit.at("port_devices"));
+    }
+}
+
 void print_table(const std::vector<std::string>& names)
 {
+    std::map<std::string, Figures> measured;
     std::puts(
         "| point | paths | first answer s | refresh us/path | with libraries | resident B/path | heap B/path | peak | "
         "instances us | of floor | names us | of floor | get us | associators ms | all classes ms | from a port us |");
     std::puts("|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|");
     for (const std::string& name : names) {
         const Point& point = point_of(name);
-        print_row(point, measured_apart(point.name));
+        measured[name] = measured_apart(point.name);
+        print_row(point, measured[name]);
     }
+    if (measured.count("1000")) print_growth(measured);
 }
 
 } // namespace
