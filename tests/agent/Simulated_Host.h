@@ -24,6 +24,13 @@ using cimple::Ref;
 /// What the refresh of this room's tests reaches on higher floors: nothing, until a test says so.
 extern std::function<void(cimple::ProviderAgent&)> on_driver_log;
 
+/// What these answer to it.
+struct Higher_Floors {
+    cimple::uint32 driver_log = 0, dumps = 0, virtual_ports = 0;
+    std::function<cimple::uint32()> diagnostics; ///< null: 0
+};
+extern Higher_Floors higher_floors;
+
 /// True: the next threads cannot be created.
 extern bool no_more_threads;
 

@@ -196,6 +196,20 @@ TEST_F(PortData, VitalProductDataHaveAPropertyEach)
                              {"Inside CreateVPD", "\x82\x82--The adapter", "PN--pn", "SN--sn", "YA--", "FC Port # 0"}));
 }
 
+TEST_F(PortData, VitalProductDataHaveNamesWithTheirPort)
+{
+    port("vpd = { product = \"The adapter\", entries = [[\"CP\", \"cp\"], [\"EC\", \"ec\"], [\"FG\", \"fg\"], "
+         "[\"LC\", \"lc\"], [\"MN\", \"mn\"], [\"PG\", \"pg\"], [\"PN\", \"pn\"], [\"SN\", \"sn\"], "
+         "[\"V0\", \"v0\"]] }\n");
+    const Ref<Instance> made = only(agent().m_NVRHBA_FCPort_map);
+    EXPECT_THAT(value(made.get(), "OtherIdentifyingInfo"),
+                testing::StartsWith("{The adapter,cp,ec,fg,lc,mn,pg,pn,sn,v0,"));
+    EXPECT_EQ(value(made.get(), "IdentifyingDescriptions"),
+              "{VPD:PRODUCT_NAME,VPD:EXT_CAPABILITY,VPD:EC_LEVEL,VPD:FABRIC_GEOGRAPHY,VPD:LOCATION,"
+              "VPD:MANUFACTURER_ID,VPD:PCI_GEOGRAPHY,VPD:PART_NUMBER,VPD:SERIAL_NUMBER,VPD:V0,OS Device Name,"
+              "NORVANE:IEEE_ADDRESS}");
+}
+
 TEST_F(PortData, VitalProductDataWithoutOtherTagsHaveNoList)
 {
     port("vpd = { product = \"\", entries = [[\"SN\", \"sn\"]] }\n");

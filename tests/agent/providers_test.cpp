@@ -234,6 +234,7 @@ TEST_F(ConfigSetting, TakesATimeOutFrom1To30ThoughItSaysFrom5)
                                             "The value provided for cache time-out is out of range"}));
     EXPECT_EQ(modify("cachetimeout", 0), 102);
     EXPECT_EQ(current(0), "3");
+    EXPECT_EQ(words().back(), "NVRHBA_ProviderConfigSetting_Provider::enum_instances()");
 }
 
 TEST_F(ConfigSetting, TakesTheFlagsAs0Or1)

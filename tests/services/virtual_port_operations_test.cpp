@@ -4,6 +4,7 @@
 
 #include "foundation/NVR_Common.h"
 #include "services/NVR_MethodWrapper.h"
+#include "simulator/nvrsim.h"
 #include "tests/agent/Simulated_Host.h"
 
 using namespace cimple;
@@ -107,6 +108,17 @@ TEST_F(VirtualPortOperations, AllocateNoMoreThan16MiB)
     fault("call = \"RM_GetVMFromVPort\", status = 7, value = 32768");
     EXPECT_EQ(NVR_MethodWrapper::ListVMfromVPort(port, vport, &machines), 1);
     EXPECT_THAT(words(), Contains("FMCMD_ListVMS: Unable to allocate buffer\n"));
+}
+
+TEST_F(VirtualPortOperations, TellThatTheTargetsAreListed)
+{
+    fault("call = \"RM_IsLocalHBA\", value = 1");
+    EXPECT_EQ(NVR_MethodWrapper::ListVPortTargets(port, vport.wwpn), 0);
+    EXPECT_EQ(words().back(), "Exit the ListVPortTargets method");
+    EXPECT_EQ(nvrsim_calls("RM_VPListTargets"), 2u) << "three do not fit the room of the first call";
+    fault("call = \"RM_VPListTargets\", status = 7, value = 4294967295");
+    EXPECT_EQ(NVR_MethodWrapper::ListVPortTargets(port, vport.wwpn), 1);
+    EXPECT_EQ(words().back(), "FMCMD_VportTargets: Unable to allocate buffer");
 }
 
 // The library calls a virtual port local only where it knows it as one.
