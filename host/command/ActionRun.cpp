@@ -2,6 +2,7 @@
 #include "host/command/Actions.h"
 #include "host/command/Arguments.h"
 #include "host/command/Dialogue.h"
+#include "host/command/Listing.h"
 #include "host/command/Meanings.h"
 #include "host/command/Options.h"
 #include "host/command/Table.h"
@@ -204,6 +205,13 @@ int Runner::call()
                             {"out", out}});
         return status;
     }
+    if (m_options.csv) {
+        std::vector<Named_Value> fields = {
+            {"port", Value::string(port_name())}, {"returnValue", answer.value}, {"meaning", Value::string(words)}};
+        fields.insert(fields.end(), answer.out.begin(), answer.out.end());
+        m_out << csv_record(fields);
+        return status;
+    }
     tell(words + " (" + answer.value.to_text() + ")");
     for (const Named_Value& each : answer.out) {
         if (each.value.is_null()) continue;
@@ -239,6 +247,8 @@ int Runner::set_property()
     if (!answer.ok()) return failed(answer.status);
     if (m_options.json)
         m_out << json_text({{"status", 0}, {"port", port_name()}});
+    else if (m_options.csv)
+        m_out << csv_record({{"port", Value::string(port_name())}});
     else
         tell("done");
     return 0;

@@ -281,6 +281,14 @@ int Diagnostics::tell_run(const Answer& answer, const std::string& test, const s
                             {"job", job},
                             {"outcome", outcome},
                             {"result", result}});
+    } else if (m_options.csv) {
+        m_out << csv_record({{"test", Value::string(short_name(test))},
+                             {"port", Value::string(port)},
+                             {"returnValue", Value::uint64(value)},
+                             {"meaning", Value::string(words)},
+                             {"outcome", Value::string(outcome)},
+                             {"result", Value::string(result)},
+                             {"job", Value::string(job)}});
     } else {
         m_out << "diag run " << short_name(test) << ", port " << port << ": " << (outcome.empty() ? "" : outcome + ", ")
               << words << " (" << value << ")\n";
@@ -338,16 +346,20 @@ int Diagnostics::clear()
     }
     int status = 0;
     Json json = Json::array();
+    Listing listing({{"log", "LOG"}, {"returnValue", "RETURNS"}, {"meaning", "MEANING"}});
     for (const Path& log : logs) {
         const Answer answer = m_server.call(log, "ClearLog");
         if (!answer.ok()) return failed(answer.status);
         const std::string name = short_name(key_text(log, "InstanceID"));
         const std::string words = answer.value.as_uint() == 0 ? "cleared" : "not cleared";
-        if (!m_options.json) m_out << "log " << name << ": " << words << " (" << answer.value.to_text() << ")\n";
+        listing.add({name, {answer.value.to_text(), answer.value}, words});
+        if (!m_options.json && !m_options.csv)
+            m_out << "log " << name << ": " << words << " (" << answer.value.to_text() << ")\n";
         json.push_back({{"log", name}, {"returnValue", to_json(answer.value)}});
         if (answer.value.as_uint() != 0) status = returned_another;
     }
     if (m_options.json) m_out << json_text({{"status", 0}, {"logs", json}});
+    if (m_options.csv) m_out << listing.csv();
     return status;
 }
 

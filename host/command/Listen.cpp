@@ -1,4 +1,5 @@
 // nvrcim listen: subscriptions, and alerts printed as they come.
+#include "host/command/Listing.h"
 #include "host/command/Logs.h"
 #include "host/command/Table.h"
 #include "host/command/Verbs.h"
@@ -50,6 +51,8 @@ public:
     Printer(const Options& options, std::ostream& out)
         : m_options(options), m_out(out), m_left(options.count), m_listener(pthread_self())
     {
+        if (options.csv && !options.quiet)
+            m_out << csv_line({"time", "namespace", "number", "description"}) << std::flush;
     }
 
     void take(const Indication& indication)
@@ -77,6 +80,11 @@ private:
             // One line each, for those who read line by line.
             const nlohmann::ordered_json json = {{"namespace", indication.name_space}, {"alert", to_json(alert)}};
             m_out << json.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace) << "\n";
+            return;
+        }
+        if (m_options.csv) {
+            m_out << csv_line({time_text(alert.get("EventTime").as_text()), indication.name_space,
+                               alert.get("SequenceNumber").to_text(), alert.get("Description").as_text()});
             return;
         }
         m_out << printable(time_text(alert.get("EventTime").as_text()) + "  " + indication.name_space + "  " +
@@ -156,6 +164,8 @@ int listen(Host& server, const Options& options, std::ostream& out, std::ostream
     if (options.quiet) {
         if (options.json)
             out << json_text({{"status", 0}, {"alerts", printer.seen()}});
+        else if (options.csv)
+            out << csv_record({{"alerts", Value::uint64(printer.seen())}});
         else
             out << printer.seen() << (printer.seen() == 1 ? " alert\n" : " alerts\n");
     }

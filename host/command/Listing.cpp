@@ -22,6 +22,11 @@ std::string csv_cell(const std::string& raw)
     return quoted + '"';
 }
 
+std::string csv_text(const Value& value)
+{
+    return value.is_null() ? "" : value.to_text();
+}
+
 } // namespace
 
 void Listing::add(std::vector<Cell> cells)
@@ -64,16 +69,35 @@ std::string Listing::blocks() const
 
 std::string Listing::csv() const
 {
-    std::string text;
-    for (std::size_t i = 0; i < m_fields.size(); ++i)
-        text += (i ? "," : "") + csv_cell(m_fields[i].key);
-    text += "\r\n";
+    std::vector<std::string> cells;
+    for (const Field& field : m_fields)
+        cells.push_back(field.key);
+    std::string text = csv_line(cells);
     for (const std::vector<Cell>& row : m_rows) {
-        for (std::size_t i = 0; i < row.size(); ++i)
-            text += (i ? "," : "") + csv_cell(row[i].value.is_null() ? "" : row[i].value.to_text());
-        text += "\r\n";
+        cells.clear();
+        for (const Cell& cell : row)
+            cells.push_back(csv_text(cell.value));
+        text += csv_line(cells);
     }
     return text;
+}
+
+std::string csv_line(const std::vector<std::string>& cells)
+{
+    std::string line;
+    for (std::size_t i = 0; i < cells.size(); ++i)
+        line += (i ? "," : "") + csv_cell(cells[i]);
+    return line + "\r\n";
+}
+
+std::string csv_record(const std::vector<Named_Value>& fields)
+{
+    std::vector<std::string> names, values;
+    for (const Named_Value& field : fields) {
+        names.push_back(field.name);
+        values.push_back(csv_text(field.value));
+    }
+    return csv_line(names) + csv_line(values);
 }
 
 nlohmann::ordered_json Listing::json() const

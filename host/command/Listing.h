@@ -47,4 +47,9 @@ private:
     std::vector<std::vector<Cell>> m_rows;
 };
 
+/// A line of CSV, ended by CR and LF: cells quoted where they ask for it, control characters as '?'.
+std::string csv_line(const std::vector<std::string>& cells);
+/// One row with a line of names before it, as `Listing::csv` writes it.
+std::string csv_record(const std::vector<Named_Value>& fields);
+
 } // namespace host

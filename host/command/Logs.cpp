@@ -172,6 +172,7 @@ private:
                                         : "")
                      << "\n";
         if (m_options.json) m_out << json_text({{"status", 0}, {"returnValue", value}});
+        if (m_options.csv) m_out << csv_record({{"returnValue", answer.value}});
         return returned_another;
     }
     int tell(const Answer& answer, const std::string& done)
@@ -179,6 +180,8 @@ private:
         if (const int status = refused(answer)) return status;
         if (m_options.json)
             m_out << json_text({{"status", 0}, {"returnValue", 0}});
+        else if (m_options.csv)
+            m_out << csv_record({{"returnValue", answer.value}});
         else
             m_out << printable(done) << "\n";
         return 0;
@@ -195,6 +198,14 @@ private:
             m_out << json_text({{"status", 0}, {"log", to_json(m_log)}, {"records", records}});
             return 0;
         }
+        Listing listing({{"time", "TIME"}, {"level", "LEVEL"}, {"record", "RECORD"}});
+        for (const Instance& entry : entries.instances)
+            listing.add({entry.get("CreationTimeStamp").to_text(), entry.get("LogLevel").as_text(),
+                         entry.get("RecordData").as_text()});
+        if (m_options.csv) {
+            m_out << listing.csv();
+            return 0;
+        }
         const std::string trace = m_log.get("TracePath").as_text();
         m_out << "log         " << printable(m_log.get("InstanceID").as_text()) << "\n"
               << "state       " << (is_enabled() ? "enabled" : "disabled") << "\n"
@@ -203,12 +214,7 @@ private:
               << "trace file  " << (trace.empty() ? "none" : printable(trace)) << "\n"
               << "records     " << entries.instances.size() << " of " << m_log.get("MaxNumberOfRecords").as_uint()
               << "\n";
-        if (entries.instances.empty()) return 0;
-        Table table({"TIME", "LEVEL", "RECORD"});
-        for (const Instance& entry : entries.instances)
-            table.add({entry.get("CreationTimeStamp").to_text(), entry.get("LogLevel").as_text(),
-                       entry.get("RecordData").as_text()});
-        m_out << "\n" << table.to_text(page_width);
+        if (!listing.empty()) m_out << "\n" << listing.table(page_width);
         return 0;
     }
 

@@ -14,9 +14,8 @@
 namespace host {
 namespace {
 
-/// Verbs whose answers are rows.
-const std::string with_table[] = {"associators", "check", "classes", "diag list", "diag results", "driverlog",
-                                  "enum",        "get",   "names",   "paths",     "ports",        "references"};
+/// Verbs whose answers are no rows.
+const std::string without_rows[] = {"graph", "serve"};
 
 constexpr const char* description =
     "nvrcim asks the Fibre Channel provider module as a CIM server would: it loads the module, calls it through CMPI,\n"
@@ -147,7 +146,7 @@ int read_options(int count, char** arguments, Options& options)
     app.add_option("--mof", options.mof, "Folder with the class files");
     app.add_option("--user", options.user, "Name of the user that the requests come from");
     CLI::Option* json = app.add_flag("--json", options.json, "Print JSON");
-    app.add_flag("--csv", options.csv, "Print tables and lists as comma-separated values")->excludes(json);
+    app.add_flag("--csv", options.csv, "Print comma-separated values")->excludes(json);
 
     CLI::App* classes = app.add_subcommand("classes", "List the classes that the module serves");
     classes->add_option("pattern", options.object, "Only classes with this in their name");
@@ -227,10 +226,9 @@ int read_options(int count, char** arguments, Options& options)
         std::cout << bash_completion(app);
         return 0;
     }
-    const std::string whole = options.verb + (options.verb == "diag" ? " " + options.method : "");
-    const bool has_table = std::count(std::begin(with_table), std::end(with_table), whole) != 0;
-    if (options.csv && !has_table) {
-        std::cerr << "nvrcim: wrong command: " << whole << " prints no table that --csv could show\n";
+    const bool has_rows = std::count(std::begin(without_rows), std::end(without_rows), options.verb) == 0;
+    if (options.csv && !has_rows) {
+        std::cerr << "nvrcim: wrong command: " << options.verb << " prints no rows that --csv could show\n";
         return usage_error;
     }
     return -1;

@@ -1,5 +1,6 @@
 #include "host/command/Tree.h"
 
+#include "host/command/Listing.h"
 #include "host/command/Table.h"
 #include "host/command/Verbs.h"
 #include "host/command/Views.h"
@@ -61,6 +62,37 @@ private:
     std::ostream& m_out;
 };
 
+/// A row for each node that has none below it, with those above it.
+Listing rows(const Walk& walk)
+{
+    Listing listing({{"host", "HOST"},
+                     {"adapter", "ADAPTER"},
+                     {"port", "PORT"},
+                     {"target", "TARGET"},
+                     {"lun", "LUN"},
+                     {"unit", "UNIT"},
+                     {"device", "DEVICE"}});
+    for (const Host_Node& host : walk.hosts) {
+        const std::string top = host_name(host);
+        if (host.adapters.empty()) listing.add({top});
+        for (const Adapter_Node& adapter : host.adapters) {
+            const std::string tag = adapter.package.get("Tag").as_text();
+            if (adapter.ports.empty()) listing.add({top, tag});
+            for (const Port_Node& port : adapter.ports) {
+                const std::string name = port.port.get("DeviceID").as_text();
+                if (port.targets.empty()) listing.add({top, tag, name});
+                for (const Target_Node& target : port.targets) {
+                    if (target.units.empty()) listing.add({top, tag, name, target.name});
+                    for (const Unit_Node& unit : target.units)
+                        listing.add({top, tag, name, target.name, unit.number, unit.unit.get("DeviceID").as_text(),
+                                     unit.device});
+                }
+            }
+        }
+    }
+    return listing;
+}
+
 Json to_json(const Walk& walk)
 {
     Json hosts = Json::array();
@@ -96,6 +128,10 @@ int show_tree(Host& server, const Options& options, std::ostream& out, std::ostr
         if (!walk.status.ok()) return tell_failure(walk.status, options, out, complaints);
         out << json_text({{"status", 0}, {"hosts", to_json(walk)}});
         return 0;
+    }
+    if (options.csv) {
+        out << rows(walk).csv();
+        return walk.status.ok() ? 0 : tell_failure(walk.status, options, out, complaints);
     }
     Tree_Printer printer(server.schema(), out);
     for (const Host_Node& host : walk.hosts)

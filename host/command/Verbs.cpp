@@ -225,6 +225,14 @@ int Run::get()
     return 0;
 }
 
+std::vector<Named_Value> properties_named(const Instance& instance, const std::vector<std::string>& names)
+{
+    std::vector<Named_Value> properties;
+    for (const std::string& name : names)
+        properties.push_back({name, instance.get(name)});
+    return properties;
+}
+
 int Run::set()
 {
     if (std::string missing = missing_keys(); !missing.empty()) return wrong(missing);
@@ -247,8 +255,9 @@ int Run::set()
                                       : m_server.modify(instance, names);
     if (!answer.ok()) return failed(answer.status);
     if (m_options.json) m_out << json_text({{"status", 0}});
+    if (m_options.csv) m_out << csv_record(properties_named(instance, names));
     for (const std::string& name : names)
-        if (!m_options.json)
+        if (!m_options.json && !m_options.csv)
             m_out << m_class->name << "." << name << " = "
                   << printable(value_text_with_number(m_class->property(name), instance.get(name))) << "\n";
     return 0;
@@ -283,6 +292,11 @@ int Run::call()
         for (const Named_Value& each : answer.out)
             out[each.name] = to_json(each.value);
         m_out << json_text({{"status", 0}, {"returnValue", to_json(answer.value)}, {"out", out}});
+        return 0;
+    }
+    if (m_options.csv) {
+        answer.out.insert(answer.out.begin(), {"returnValue", answer.value});
+        m_out << csv_record(answer.out);
         return 0;
     }
     Element_Record result;

@@ -219,6 +219,7 @@ const Class_Record& Cim_Server::class_of(const std::string& name) const
 {
     if (name.empty()) throw Cim_Fault{invalid_parameter, "no class is named"};
     const Class_Record* record = m_host.schema().find(name);
+    if (!record) record = Subscriptions::schema().find(name);
     if (!record) throw Cim_Fault{invalid_class, "there is no class " + name};
     return *record;
 }

@@ -20,6 +20,23 @@ constexpr const char* subscription_class = "CIM_IndicationSubscription";
 constexpr const char* destination_classes[] = {"CIM_ListenerDestinationCIMXML", "CIM_IndicationHandlerCIMXML",
                                                "CIM_ListenerDestination"};
 
+constexpr const char* declarations = R"(
+class CIM_IndicationFilter {
+  [Key] string SystemCreationClassName; [Key] string SystemName; [Key] string CreationClassName; [Key] string Name;
+  string SourceNamespace; string SourceNamespaces[]; [Required] string Query; [Required] string QueryLanguage;
+};
+class CIM_ListenerDestination {
+  [Key] string SystemCreationClassName; [Key] string SystemName; [Key] string CreationClassName; [Key] string Name;
+  uint16 PersistenceType = 2; [Required] string Destination; uint16 Protocol;
+};
+class CIM_ListenerDestinationCIMXML : CIM_ListenerDestination {};
+class CIM_IndicationHandlerCIMXML : CIM_ListenerDestination {};
+[Association]
+class CIM_IndicationSubscription {
+  [Key] CIM_IndicationFilter REF Filter; [Key] CIM_ListenerDestination REF Handler;
+};
+)";
+
 bool is_destination(const std::string& class_name)
 {
     return std::any_of(std::begin(destination_classes), std::end(destination_classes),
@@ -108,6 +125,15 @@ bool Subscriptions::serves(const std::string& class_name) const
 {
     return same_name(class_name, filter_class) || same_name(class_name, subscription_class) ||
            is_destination(class_name);
+}
+
+const Schema& Subscriptions::schema()
+{
+    static const std::shared_ptr<const Schema> classes = [] {
+        std::string error;
+        return Schema::from_text(declarations, error);
+    }();
+    return *classes;
 }
 
 std::vector<Instance> Subscriptions::instances(const std::string& class_name) const

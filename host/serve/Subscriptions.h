@@ -28,6 +28,8 @@ public:
 
     /// Is the class one of those kept here?
     bool serves(const std::string& class_name) const;
+    /// Their declarations, which clients ask for before they create one.
+    static const Schema& schema();
 
     std::vector<Instance> instances(const std::string& class_name) const;
     std::optional<Instance> find(const Path& path) const;

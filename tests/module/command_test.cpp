@@ -229,8 +229,26 @@ TEST(Command, PrintsRowsAsCsvWhereverThereAreRows)
     EXPECT_THAT(nvrcim("--csv diag list").output, testing::StartsWith("test,loops,ports,options,description\r\n"));
     EXPECT_EQ(nvrcim("--csv diag results").output, "test,outcome,passed,failed,seconds,adapter,result\r\n");
     EXPECT_THAT(nvrcim("--csv driverlog").output, testing::StartsWith("line\r\n"));
-    EXPECT_EQ(nvrcim("diag clear --csv").status, 64);
-    EXPECT_EQ(nvrcim("tree --csv").status, 64);
+    EXPECT_EQ(nvrcim(std::string("--csv set ") + minutes + " current=10").output, "current\r\n10\r\n");
+    EXPECT_THAT(
+        nvrcim(std::string("--csv call 'NVRHBA_RecordLog.InstanceID=\"NVRHBA:ProviderLog:") + rig_host_name + "\"' ClearLog").output,
+        "returnValue\r\n0\r\n");
+    EXPECT_THAT(
+        nvrcim("--csv wwn read").output,
+        testing::StartsWith("port,returnValue,meaning,WWPN,WWNN,WWNOperationStatus\r\n10000000C9A00001,0,done,"));
+    EXPECT_EQ(nvrcim("--csv port beacon on --yes").output, "port\r\n10000000C9A00001\r\n");
+    EXPECT_THAT(
+        nvrcim("--csv param list").output,
+        testing::StartsWith("parameter,current,default,low,high,changes,help\r\nlog-verbose,0,0,0,4294967295,"));
+    EXPECT_EQ(nvrcim("--csv log show").output, "time,level,record\r\n");
+    EXPECT_EQ(nvrcim("--csv log enable").output, "returnValue\r\n0\r\n");
+    EXPECT_THAT(nvrcim("--csv diag run status").output,
+                testing::StartsWith("test,port,returnValue,meaning,outcome,result,job\r\nstatus,10000000C9A00001,0,"));
+    EXPECT_THAT(nvrcim("--csv diag clear status").output, "log,returnValue,meaning\r\nstatus,0,cleared\r\n");
+    EXPECT_THAT(nvrcim("--csv tree").output, testing::StartsWith("host,adapter,port,target,lun,unit,device\r\n"));
+    EXPECT_THAT(nvrcim("--csv tree").output, HasSubstr(",20000000C9A00001,10000000C9A00001,50060E8005A10000,0,"));
+    EXPECT_EQ(nvrcim("--csv graph none.svg").status, 64);
+    EXPECT_EQ(nvrcim("--csv serve").status, 64);
     EXPECT_EQ(nvrcim("paths --csv --json").status, 64);
 }
 

@@ -172,6 +172,16 @@ TEST_F(ListenCommand, PrintsALineOfJsonForEach)
     EXPECT_EQ(run.end(), 0);
 }
 
+TEST_F(ListenCommand, PrintsARowOfCsvForEach)
+{
+    Listening run("--csv listen --count 1");
+    EXPECT_EQ(run.line(), "time,namespace,number,description\r");
+    ASSERT_EQ(run.line(), "nvrcim: listening in root/norvane");
+    run.control("link down 10000000C9A00001");
+    EXPECT_THAT(run.line(), HasSubstr(",root/norvane,0,Port WWN 10000000C9A00001 status changed to LINK_DOWN.\r"));
+    EXPECT_EQ(run.end(), 0);
+}
+
 TEST_F(ListenCommand, CountsABurst)
 {
     Listening run("listen --quiet --count 10000");
