@@ -14,7 +14,7 @@ TOOL, DATA = sys.argv.pop(1), sys.argv.pop(1)
 
 # A stand-in: notes its call, may be told to fail, and keeps what a server of its kind would keep in $WORLD/server.json.
 STAND_IN = r'''#!/usr/bin/python3
-import json, os, re, sys
+import json, os, re, signal, sys
 world = os.environ["WORLD"]
 name, words = os.path.basename(sys.argv[0]), sys.argv[1:]
 with open(world + "/calls", "a") as calls:
@@ -22,8 +22,12 @@ with open(world + "/calls", "a") as calls:
 if os.path.exists(world + "/fail-" + name):
     only = open(world + "/fail-" + name).read()
     if only in " ".join(words):
-        print("told to fail")
+        sys.stdout.buffer.write(b"told to fail \xc3\xa9\xff\n")
         sys.exit(3)
+if os.path.exists(world + "/end-" + name):
+    os.unlink(world + "/end-" + name)
+    os.kill(os.getppid(), signal.SIGTERM)
+    signal.pause()
 path = world + "/server.json"
 state = json.load(open(path)) if os.path.exists(path) else {"stage": [], "modules": [], "classes": []}
 if name == "sfcbstage":
@@ -100,12 +104,17 @@ class Register(unittest.TestCase):
     def mend(self, program):
         (self.world / f"fail-{program}").unlink()
 
-    def run_tool(self, *arguments, data=None):
+    def run_tool(self, *arguments, data=None, stdout=subprocess.PIPE, **environment):
         return subprocess.run(
             [sys.executable, TOOL, *arguments, "--data", data or self.data, "--state", self.world / "state/registered.json",
              "--log", self.world / "log"],
-            env={"WORLD": str(self.world), "PATH": f"{self.world}/bin:/usr/bin:/bin"},
-            capture_output=True, text=True, check=False)
+            env={"WORLD": str(self.world), "PATH": f"{self.world}/bin:/usr/bin:/bin", **environment},
+            stdout=stdout, stderr=subprocess.PIPE, text=True, check=False)
+
+    def everything(self):
+        """All files of the world with their content, and all folders, but for what tells of runs."""
+        return {path: path.read_bytes() if path.is_file() else None
+                for path in self.world.rglob("*") if path.name not in ("log", "calls")}
 
     def calls(self):
         path = self.world / "calls"
@@ -119,6 +128,68 @@ class Register(unittest.TestCase):
             return {"stage": [], "modules": [], "classes": []}
         return json.loads(path.read_text(encoding="utf-8"))
 
+    def test_registered_twice_and_taken_back_nothing_is_left(self):
+        self.install(*SFCB, *PEGASUS)
+        (self.world / "server.json").write_text(json.dumps(
+            {"stage": [["root/cimv2", "other.mof"]], "modules": ["Other"], "classes": [["root/PG_InterOp", "CIM_Other"]]}),
+            encoding="utf-8")
+        before = self.everything()
+        for command in ("register", "register", "unregister"):
+            self.assertEqual(self.run_tool(command).returncode, 0)
+        self.assertEqual(self.everything(), before)
+
+    def test_a_failure_leaves_nothing_either(self):
+        self.install(*SFCB)
+        (self.world / "server.json").write_text(json.dumps({"stage": [], "modules": [], "classes": []}), encoding="utf-8")
+        self.fail("sfcbstage", "root/interop")
+        before = self.everything()
+        self.assertEqual(self.run_tool("register").returncode, 1)
+        self.assertEqual(self.everything(), before)
+
+    def test_what_is_broken_off_is_taken_back(self):
+        self.install(*SFCB)
+        (self.world / "end-sfcbrepos").write_text("", encoding="utf-8")
+        self.assertEqual(self.run_tool("register").returncode, 1)
+        self.assertEqual(self.server()["stage"], [])
+        self.assertFalse(self.has_state())
+
+    def test_taking_back_goes_on_where_it_failed(self):
+        self.install(*SFCB)
+        self.assertEqual(self.run_tool("register").returncode, 0)
+        self.fail("sfcbunstage", "root/norvane")
+        self.assertEqual(self.run_tool("unregister").returncode, 1)
+        self.assertTrue(self.has_state())
+        self.mend("sfcbunstage")
+        self.calls()
+        self.assertEqual(self.run_tool("unregister").returncode, 0)
+        self.assertEqual([call.split()[:3] for call in self.calls()],
+                         [["sfcbunstage", "-n", "root/norvane"], ["sfcbrepos", "-f"]])
+        self.assertEqual(self.server()["stage"], [])
+
+    def test_everybody_may_ask_for_the_status(self):
+        self.install(*SFCB)
+        self.assertEqual(self.run_tool("register").returncode, 0)
+        self.assertEqual((self.world / "state/registered.json").stat().st_mode & 0o777, 0o644)
+
+    def test_nobody_who_reads_the_words_and_words_that_cannot_be_printed_stop_nothing(self):
+        self.install(*SFCB)
+        reader, writer = os.pipe()
+        os.close(reader)
+        self.assertEqual(self.run_tool("register", stdout=writer).returncode, 0)
+        os.close(writer)
+        self.assertTrue(self.has_state())
+        self.fail("sfcbunstage")
+        done = self.run_tool("unregister", PYTHONIOENCODING="ascii")
+        self.assertEqual(done.returncode, 1)
+        self.assertIn("told to fail ", done.stderr)
+
+    def test_a_namespace_is_a_name(self):
+        self.install(*SFCB)
+        for name in ("", "root/", "root norvane", 'root"; };', "root/../etc", "root\nprovider: other"):
+            done = self.run_tool("register", "--namespace", name)
+            self.assertEqual((done.returncode, name in done.stdout), (2, name == ""), done.stderr)
+        self.assertEqual(self.calls(), [])
+
     def has_state(self):
         return (self.world / "state/registered.json").exists()
 
@@ -127,7 +198,7 @@ class Register(unittest.TestCase):
             done = self.run_tool(command)
             self.assertEqual(done.returncode, 0, done.stderr)
             self.assertEqual(done.stdout, "No CIM server is installed on this host: nothing to do.\n")
-        self.assertFalse(self.has_state())
+        self.assertFalse((self.world / "state").exists())
         self.assertEqual(self.run_tool("status").stdout, "sfcb: not on this host\npegasus: not on this host\n")
 
     def test_a_server_that_is_asked_for_must_be_there(self):
@@ -279,7 +350,8 @@ class Register(unittest.TestCase):
     def test_a_state_file_that_is_broken_or_cannot_be_written_stops_before_anything_is_done(self):
         self.install(*SFCB)
         (self.world / "state").mkdir()
-        for content in ("{", "[]"):
+        for content in ("{", "[]", '{"sfcb": 5}', '{"sfcb": {"done": {}}}',
+                        '{"sfcb": {"namespace": "a", "fingerprint": "b", "done": {"staged": [{"namespace": 1}]}}}'):
             (self.world / "state/registered.json").write_text(content, encoding="utf-8")
             done = self.run_tool("register")
             self.assertEqual(done.returncode, 1)
