@@ -2,6 +2,7 @@
 
 #include "agent/ProviderAgent.h"
 #include "agent/associations.h"
+#include "agent/guarded.h"
 #include "agent/instance_table.h"
 #include "classes/NVRHBA_EnabledRecordLogCapabilities.h"
 #include "classes/NVRHBA_FCDriverLogEntry.h"
@@ -12,6 +13,7 @@
 #include "inventory/Adapter.h"
 #include "inventory/AdapterAttributes.h"
 #include "inventory/NVR_Data.h"
+#include "logs/record_logs.h"
 
 namespace cimple {
 
@@ -28,13 +30,10 @@ const FCAdapterAttributes* firstAdapter(const NVR_Data& inventory)
     return nullptr;
 }
 
-const Instance* addLog(ProviderAgent& agent)
+Ref<NVRHBA_RecordLog> makeLog(const ProviderAgent& agent)
 {
-    const Instance_Map& hosts = agent.m_CIM_ComputerSystem_map;
-    const String host = hosts.empty() ? String() : string_property(hosts[0], "Name");
-    auto log = makeOrLog<NVRHBA_RecordLog>("Failed to allocate memory to create NVRHBA_RecordLog");
-    if (!log) return nullptr;
-    const String id = text("NVR: FC Driver Record Log:%s", host.c_str());
+    const String id = recordLogID(agent, Record_Log::driver);
+    auto log = make<NVRHBA_RecordLog>();
     set(log->InstanceID, id);
     set(log->ElementName, id);
     set(log->MaxNumberOfRecords, agent.m_driverLogStore.capacity);
@@ -46,19 +45,29 @@ const Instance* addLog(ProviderAgent& agent)
     set(log->EnabledState, 3);
     set(log->HealthState, 5);
     set(log->Name, "Driver logs for Norvane FC Provider");
-    return insertOrLog(agent.m_NVRHBA_RecordLog_map, Ref<Instance>(log.release()));
+    return log;
 }
 
-const Instance* addCapabilities(ProviderAgent& agent)
+Ref<NVRHBA_EnabledRecordLogCapabilities> makeCapabilities()
 {
-    auto able = makeOrLog<NVRHBA_EnabledRecordLogCapabilities>(
-        "Failed to allocate memory to create NVRHBA_EnabledRecordLogCapabilities");
-    if (!able) return nullptr;
+    auto able = make<NVRHBA_EnabledRecordLogCapabilities>();
     set(able->InstanceID, "NVR:FC Driver Record Log Capabilities");
     set(able->RequestedStatesSupported, {2, 3, 11});
     set(able->ElementNameEditSupported, false);
     set(able->MaxElementNameLen, 0);
-    return insertOrLog(agent.m_NVRHBA_EnabledRecordLogCapabilities_map, Ref<Instance>(able.release()));
+    return able;
+}
+
+const Instance* addLog(ProviderAgent& agent)
+{
+    auto log = madeOrLog("Failed to allocate memory to create NVRHBA_RecordLog", [&] { return makeLog(agent); });
+    return log ? insertOrLog(agent.m_NVRHBA_RecordLog_map, Ref<Instance>(log.release())) : nullptr;
+}
+
+const Instance* addCapabilities(ProviderAgent& agent)
+{
+    auto able = madeOrLog("Failed to allocate memory to create NVRHBA_EnabledRecordLogCapabilities", makeCapabilities);
+    return able ? insertOrLog(agent.m_NVRHBA_EnabledRecordLogCapabilities_map, Ref<Instance>(able.release())) : nullptr;
 }
 
 /// The identity under which the refresh published the driver, or null.
@@ -93,7 +102,9 @@ uint32 createClasses(ProviderAgent& agent)
 uint32 NVRHBA_DriverLogProfile::CreateFCDriverLogClasses(ProviderAgent& agent)
 {
     NVR_LOG("Enter CreateFCDriverLogClasses");
-    if (const uint32 status = createClasses(agent)) return status;
+    uint32 status = NVR_FAILURE; // without memory too: the rest of the refresh goes on
+    guarded([&] { status = createClasses(agent); });
+    if (status != 0) return status;
     NVR_LOG("Exit CreateFCDriverLogClasses");
     return 0;
 }

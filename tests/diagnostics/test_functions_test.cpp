@@ -283,6 +283,32 @@ TEST_F(Polled_Test, AStartThatFailsIsTold)
         }
 }
 
+TEST_F(Polled_Test, AnAdapterWithoutDiagnosticsRefusesEachStart)
+{
+    port("loopback_plug = true\ndiagnostics = { available = false }");
+    target(echo_name);
+    target(ping_name);
+    for (const char* name : {self_name, internal_name, external_name, host_name, echo_name, ping_name}) {
+        const Ran ran = run(name);
+        EXPECT_EQ(ran.status, 63u) << name;
+        EXPECT_FALSE(ran.job);
+        EXPECT_EQ(ran.words.back(), "Diagnostics not available/Port not supported , Exited with error code : 63");
+    }
+}
+
+TEST_F(Polled_Test, TheNumberOfATestIsTheLibrarysWord)
+{
+    // One that it never wrote is 0, and any other is asked for as it came.
+    for (const char* damage : {"damage = \"null\"", "value = 4294967295"}) {
+        nvrsim_clear_faults();
+        fault(std::string("call = \"RM_DiagRunPOST\", ") + damage);
+        const Ran ran = run(self_name);
+        EXPECT_EQ(ran.status, 4u) << "there is no such test";
+        EXPECT_FALSE(ran.job);
+        EXPECT_EQ(ran.words.back(), "Unknown , Exited with error code : 4");
+    }
+}
+
 TEST_F(Polled_Test, AWrongTypeOfLoopbackIsRefusedBeforeAnythingIsAsked)
 {
     Diagnostic_Run work = {agent(), {}, setting(internal_name), job_setting(), controller(), {}};

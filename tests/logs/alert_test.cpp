@@ -133,6 +133,7 @@ TEST_F(Alerts, ALinkThatComesUpIsTold)
                     {"ProbableCauseDescription", "Link Up"},
                     {"Message", "PORT LINK UP"},
                 });
+    EXPECT_THAT(words(), Contains(testing::EndsWith("eventType std::string is Port Online (LINK_UP) .")));
 }
 
 TEST_F(Alerts, EventsOfABurstAreNumberedInTheirOrder)

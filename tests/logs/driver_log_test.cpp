@@ -1,4 +1,5 @@
 // The driver's record log as instances: beside the provider's own, in the same maps.
+#include <map>
 
 #include "classes/CIM_ComputerSystem.h"
 #include "classes/NVRHBA_FCDriverLogEntry.h"
@@ -6,6 +7,7 @@
 #include "logs/NVRHBA_DriverLogProfile.h"
 #include "tests/agent/Other_Adapter.h"
 #include "tests/agent/expect_rows.h"
+#include "tests/support/short_memory.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -124,6 +126,37 @@ TEST_F(DriverLog, WithoutTheDriversIdentityItIsNobodys)
     EXPECT_THAT(words(), ElementsAre("Enter CreateFCDriverLogClasses", "Missing Provider Software Identity"));
     EXPECT_EQ(logs().size(), 1u);
     EXPECT_TRUE(uses().empty());
+}
+
+TEST_F(DriverLog, WithoutMemoryItIsToldAndEndsTheBuild)
+{
+    refresh();
+    ProviderAgent& the_agent = agent();
+    const auto clear = [&] {
+        the_agent.m_NVRHBA_RecordLog_map.clear();
+        the_agent.m_NVRHBA_EnabledRecordLogCapabilities_map.clear();
+        the_agent.m_NVRHBA_ProviderUseOfLog_map.clear();
+        words();
+    };
+    clear();
+    std::map<std::string, int> said;
+    uint32 status = 77;
+    refuse_each_allocation([&] { status = NVRHBA_DriverLogProfile::CreateFCDriverLogClasses(the_agent); },
+                           [&](bool has_thrown) {
+                               EXPECT_FALSE(has_thrown);
+                               const std::string last = words().back();
+                               said[last]++;
+                               // The use of the log is one of the ties that a refresh can do without.
+                               EXPECT_EQ(status, last == "Exit CreateFCDriverLogClasses" ? 0u : 32769u) << last;
+                               clear();
+                           });
+    EXPECT_EQ(status, 0u);
+    EXPECT_GT(said["Failed to allocate memory to create NVRHBA_RecordLog"], 3);
+    EXPECT_GT(said["Failed to allocate memory to create NVRHBA_EnabledRecordLogCapabilities"], 3);
+    EXPECT_GT(said["Insert Failed : m_NVRHBA_RecordLog_map"], 1);
+    EXPECT_GT(said["Insert Failed : m_NVRHBA_EnabledRecordLogCapabilities_map"], 1);
+    EXPECT_EQ(logs().size(), 1u);
+    EXPECT_EQ(uses().size(), 1u);
 }
 
 TEST_F(DriverLog, AHostWithoutAdaptersHasNone)
