@@ -1,7 +1,10 @@
 #include "logs/NVRHBA_RecordLog_Provider.h"
 
+#include <new>
+
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
+#include "agent/guarded.h"
 #include "agent/instance_table.h"
 #include "agent/method_answer.h"
 #include "foundation/CLogger.h"
@@ -108,8 +111,9 @@ void enableLog(ProviderAgent& agent, const Target& target)
     CLogger::instance()->enable();
     showState(target, state_enabled);
     if (target.is_driver) {
-        refreshDriverLog(agent);
+        const bool is_read = guarded([&] { refreshDriverLog(agent); });
         if (target.instance) set(target.instance->CurrentNumberOfRecords, agent.m_driverLogStore.lines.size());
+        if (!is_read) throw std::bad_alloc(); // the client is told, and the log shows what has come
     } else {
         NVR_LOG("FC Record Logs enabled");
         storeSettings();

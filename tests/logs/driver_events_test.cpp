@@ -162,6 +162,34 @@ TEST_F(DriverEvents, WithoutMemoryNothingIsHandedOut)
         "Could not create NVRHBA_FCDriverLogEntry instance", 2);
 }
 
+TEST_F(DriverEvents, WithoutMemoryTheLogShowsWhatWasRead)
+{
+    std::string content;
+    for (int i = 0; i < 300; i++)
+        content += line(i) + "\n";
+    write_file(system_log, content);
+    read();
+    ASSERT_THAT(store().lines, SizeIs(200));
+    const Ref<NVRHBA_RecordLog> log = target(driver_log());
+    const Instance* shown_log = log_of(driver_log());
+    const Driver_Log_Store& held = store();
+    Property<uint16> enabled;
+    enabled.set(uint16{2});
+    CIM_ConcreteJob* job = nullptr;
+    Property<uint32> answer;
+    long thrown = 0;
+    const long refused = refuse_each_allocation(
+        [&] { provider.RequestStateChange(log.get(), enabled, job, {}, answer); },
+        [&](bool has_thrown) {
+            thrown += has_thrown;
+            EXPECT_EQ(value(shown_log, "CurrentNumberOfRecords"), std::to_string(held.lines.size()));
+        });
+    EXPECT_GT(refused, 200);
+    EXPECT_EQ(thrown, refused);
+    EXPECT_THAT(held.lines, SizeIs(200));
+    settle();
+}
+
 TEST_F(DriverEvents, ReadingAnewForgetsWhatWasThere)
 {
     write_file(system_log, line(1) + "\n");
