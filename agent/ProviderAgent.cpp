@@ -6,7 +6,6 @@
 #include <unistd.h>
 
 #include "agent/fatal_signal.h"
-#include "agent/guarded.h"
 #include "agent/map_classes.h"
 #include "agent/settings_at_exit.h"
 #include "foundation/CLogger.h"
@@ -14,6 +13,7 @@
 #include "foundation/NVR_Common.h"
 #include "foundation/management_binding.h"
 #include "inventory/NVR_Data.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

@@ -4,9 +4,9 @@
 
 #include "agent/Agent_Builders.h"
 #include "agent/ProviderAgent.h"
-#include "agent/guarded.h"
 #include "classes/NVRHBA_FCPort.h"
 #include "foundation/CLogger.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

@@ -6,7 +6,6 @@
 #include "agent/ProviderAgent.h"
 #include "agent/associations.h"
 #include "agent/driver_param_instances.h"
-#include "agent/guarded.h"
 #include "agent/instance_table.h"
 #include "agent/library_name.h"
 #include "agent/walk_ports.h"
@@ -15,6 +14,7 @@
 #include "classes/NVRHBA_FCHBADriverParamService.h"
 #include "classes/NVRHBA_SoftwareIdentity.h"
 #include "foundation/NVR_Common.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

@@ -1,9 +1,9 @@
 #include "agent/enumerate.h"
 
 #include "agent/Agent_Wait.h"
-#include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "runtime/Selection.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

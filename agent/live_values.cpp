@@ -3,7 +3,6 @@
 
 #include "agent/Clock.h"
 #include "agent/ProviderAgent.h"
-#include "agent/guarded.h"
 #include "agent/instance_table.h"
 #include "agent/port_tables.h"
 #include "agent/walk_ports.h"
@@ -13,6 +12,7 @@
 #include "inventory/NVR_Data.h"
 #include "inventory/PortAttributes.h"
 #include "inventory/PortStatistics.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

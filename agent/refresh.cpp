@@ -2,11 +2,11 @@
 #include "agent/Agent_Wait.h"
 #include "agent/Clock.h"
 #include "agent/ProviderAgent.h"
-#include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "inventory/NVR_Data.h"
 #include "runtime/Forced_Unwind.h"
 #include "runtime/Undisturbed.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

@@ -5,11 +5,11 @@
 #include <unistd.h>
 #include <utility>
 
-#include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "foundation/Management_Session.h"
 #include "foundation/NvrConfigFile.h"
 #include "runtime/Mutex.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

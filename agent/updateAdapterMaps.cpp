@@ -2,11 +2,11 @@
 
 #include "agent/Adapter_Update.h"
 #include "agent/Agent_Builders.h"
-#include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
 #include "inventory/NVR_Data.h"
 #include "runtime/Forced_Unwind.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "foundation/management_binding.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
@@ -14,7 +15,11 @@ class AdapterHandle {
 public:
     /// Throws std::exception, logged, if the adapter cannot be opened.
     explicit AdapterHandle(const std::string& adapterName);
-    ~AdapterHandle() { HBA_CloseAdapter(m_handle); }
+    /// Whatever the library makes of that. Throws only where the thread is being cancelled.
+    ~AdapterHandle() noexcept(false)
+    {
+        guarded([&] { HBA_CloseAdapter(m_handle); });
+    }
     AdapterHandle(const AdapterHandle&) = delete;
     AdapterHandle& operator=(const AdapterHandle&) = delete;
 

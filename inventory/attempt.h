@@ -2,7 +2,7 @@
 #pragma once
 
 #include "foundation/CLogger.h"
-#include "runtime/Forced_Unwind.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
@@ -11,14 +11,9 @@ namespace cimple {
 template <class Body, class Words>
 bool attempt(Body body, Words words)
 {
-    try {
-        body();
-        return true;
-    } catch (...) {
-        if (is_forced_unwind()) throw;
-        words();
-        return false;
-    }
+    if (guarded(body)) return true;
+    words();
+    return false;
 }
 
 /// Deletes an owned part; a deletion that throws is logged with `words` and leaves the pointer as it was.

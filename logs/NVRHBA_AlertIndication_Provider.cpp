@@ -1,12 +1,12 @@
 #include "logs/NVRHBA_AlertIndication_Provider.h"
 
-#include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
 #include "logs/Alert_Queue.h"
 #include "logs/alert_callbacks.h"
 #include "logs/alert_instance.h"
 #include "runtime/Thread_Context.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

@@ -12,6 +12,7 @@
 #include "logs/NVRHBA_AlertIndication_Provider.h"
 #include "logs/alert_callbacks.h"
 #include "runtime/Immortal.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
@@ -60,9 +61,9 @@ uint32 unregisterPorts()
 class Open_Adapter {
 public:
     explicit Open_Adapter(std::string& name) : m_handle(HBA_OpenAdapter(name.data())) {}
-    ~Open_Adapter()
+    ~Open_Adapter() noexcept(false)
     {
-        if (m_handle != 0) HBA_CloseAdapter(m_handle);
+        if (m_handle != 0) guarded([&] { HBA_CloseAdapter(m_handle); });
     }
     Open_Adapter(const Open_Adapter&) = delete;
     Open_Adapter& operator=(const Open_Adapter&) = delete;

@@ -1,8 +1,8 @@
 #include "logs/record_walk.h"
 
 #include "agent/Agent_Wait.h"
-#include "agent/guarded.h"
 #include "foundation/CLogger.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

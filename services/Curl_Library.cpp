@@ -5,6 +5,7 @@
 
 #include "foundation/CLogger.h"
 #include "foundation/curl_places.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
@@ -19,11 +20,11 @@ template struct Curl_Entry<int(void*)>;
 template struct Curl_Entry<void(void*)>;
 template struct Curl_Entry<void()>;
 
-Curl_Library::~Curl_Library()
+Curl_Library::~Curl_Library() noexcept(false)
 {
     if (!m_library) return;
-    if (handle && easy_cleanup) easy_cleanup.call(handle);
-    if (initialised && global_cleanup) global_cleanup.call();
+    if (handle && easy_cleanup) guarded([&] { easy_cleanup.call(handle); });
+    if (initialised && global_cleanup) guarded([&] { global_cleanup.call(); });
     ::dlclose(m_library);
 }
 

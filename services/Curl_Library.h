@@ -47,7 +47,7 @@ struct Curl_Entry {
 struct Curl_Library {
     Curl_Library() = default;
     /// Ends what has begun and not ended, without a word: the handle, the global state, the library.
-    ~Curl_Library();
+    ~Curl_Library() noexcept(false);
     Curl_Library(const Curl_Library&) = delete;
     Curl_Library& operator=(const Curl_Library&) = delete;
 

@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <strings.h>
 #include <sys/stat.h>
+#include <utility>
 
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
@@ -14,6 +15,7 @@
 #include "foundation/management_binding.h"
 #include "foundation/open_file.h"
 #include "runtime/Forced_Unwind.h"
+#include "runtime/guarded.h"
 #include "services/NVR_MethodWrapper.h"
 #include "services/service_method.h"
 #include "services/tag_tables.h"
@@ -63,7 +65,7 @@ public:
     Tag_Adapter() = default;
     Tag_Adapter(const Tag_Adapter&) = delete;
     Tag_Adapter& operator=(const Tag_Adapter&) = delete;
-    ~Tag_Adapter() { close(); }
+    ~Tag_Adapter() noexcept(false) { close(); }
 
     /// Result 0 or the method's return value; `failure` are its words for an adapter that cannot be opened.
     uint32 open(const ProviderAgent& agent, const Instance* port, const char* failure)
@@ -83,8 +85,8 @@ public:
     }
     void close()
     {
-        if (m_handle != 0) CPQFC_CloseAdapter(m_handle);
-        m_handle = 0;
+        const uint32 handle = std::exchange(m_handle, 0);
+        if (handle != 0) guarded([&] { CPQFC_CloseAdapter(handle); });
     }
 
     const char* name() const { return m_name; }

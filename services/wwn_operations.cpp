@@ -9,10 +9,10 @@
 #include <cstring>
 
 #include "agent/Clock.h"
-#include "agent/guarded.h"
 #include "foundation/CLogger.h"
 #include "foundation/NVR_Common.h"
 #include "foundation/management_binding.h"
+#include "runtime/guarded.h"
 #include "services/Counted_List.h"
 #include "services/WWPN_List.h"
 #include "services/service_method.h"
