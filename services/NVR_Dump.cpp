@@ -21,11 +21,15 @@ namespace {
 
 constexpr uint32 status_not_made = 40008;
 
-/// Why an association came to nothing: an end is missing, or its keys are known.
-uint32 statusOf(const Instance* association, const Instance* first, const Instance* second)
+/// Associates two instances. Result 0, and the association, or why it came to nothing.
+uint32 tie(ProviderAgent& agent, Link link, const Instance* first, const Instance* second, Instance** made = nullptr)
 {
-    if (association) return 0;
-    return first && second ? NVR_FAILURE : status_not_made;
+    const Link_Row& row = link_row(link);
+    Ref<Instance> association = makeAssociationOrLog(agent, link, first, second);
+    if (!association) return status_not_made;
+    Instance* inserted = insertOrLog(row.map(agent), std::move(association), row.failure);
+    if (made) *made = inserted;
+    return inserted ? 0 : NVR_FAILURE;
 }
 
 /// The port's controller, which has its keys but for the class's name; or null.
@@ -67,8 +71,7 @@ Ref<NVRHBA_DumpData> makeData(const NVRHBA_FCPort& port, const HBA_WWN& wwn)
 uint32 createForPort(ProviderAgent& agent, const NVRHBA_FCPort& port, const Instance* service)
 {
     const Instance* controller = controllerOf(agent, port);
-    const Instance* affects = associate(agent, Link::DumpServiceAffectsElement, controller, service);
-    if (const uint32 status = statusOf(affects, controller, service)) return status;
+    if (const uint32 status = tie(agent, Link::DumpServiceAffectsElement, controller, service)) return status;
 
     HBA_WWN wwn = {};
     if (!library_name(wwn, port.DeviceID.value.c_str(), "NVR_Dump::Id2HBAName failed", "NVR_Dump::str2HBAName failed"))
@@ -78,8 +81,8 @@ uint32 createForPort(ProviderAgent& agent, const NVRHBA_FCPort& port, const Inst
     const Instance* data = insertOrLog(agent.m_NVRHBA_DumpData_map, Ref<Instance>(made.release()));
     if (!data) return NVR_FAILURE;
 
-    Instance* link = associate(agent, Link::ElementDumpData, service, data);
-    if (!link) return NVR_FAILURE;
+    Instance* link = nullptr;
+    if (const uint32 status = tie(agent, Link::ElementDumpData, service, data, &link)) return status;
     set(static_cast<NVRHBA_ElementDumpData*>(link)->IsDefault, 1);
     return 0;
 }
@@ -100,8 +103,7 @@ uint32 createClasses(ProviderAgent& agent)
     const Instance* service = insertOrLog(agent.m_NVRHBA_DumpService_map, Ref<Instance>(made.release()));
     if (!service) return NVR_FAILURE;
 
-    const Instance* hosted = associate(agent, Link::HostedDumpService, host, service);
-    if (const uint32 status = statusOf(hosted, host, service)) return status;
+    if (const uint32 status = tie(agent, Link::HostedDumpService, host, service)) return status;
 
     const auto& ports = agent.m_NVRHBA_FCPort_map;
     for (std::size_t i = 0; i < ports.size(); i++)
