@@ -233,6 +233,9 @@ TEST_F(Refresh, AServerThatThrowsAtANewThreadLeavesNobodyWaiting)
     EXPECT_THAT(plain(agent().m_NVRHBA_FCPort_map), SizeIs(0));
     Thread_Context::pop();
     EXPECT_FALSE(agent().m_bDataFetchRunning);
+    // The flags are up: the next call may still read what the last refresh left.
+    agent().BuildCimpleInfo();
+    settle();
     EXPECT_THAT(plain(agent().m_NVRHBA_FCPort_map), SizeIs(1));
 }
 
