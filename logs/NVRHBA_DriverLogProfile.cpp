@@ -2,7 +2,6 @@
 
 #include "agent/ProviderAgent.h"
 #include "agent/associations.h"
-#include "agent/guarded.h"
 #include "agent/instance_table.h"
 #include "classes/NVRHBA_EnabledRecordLogCapabilities.h"
 #include "classes/NVRHBA_FCDriverLogEntry.h"
@@ -14,6 +13,7 @@
 #include "inventory/AdapterAttributes.h"
 #include "inventory/NVR_Data.h"
 #include "logs/record_logs.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 

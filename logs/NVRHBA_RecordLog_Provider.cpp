@@ -4,12 +4,12 @@
 
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
-#include "agent/guarded.h"
 #include "agent/instance_table.h"
 #include "agent/method_answer.h"
 #include "foundation/CLogger.h"
 #include "logs/driver_log.h"
 #include "logs/record_logs.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
