@@ -4,13 +4,13 @@
 # libhbaapi2 is the system's own Common HBA API library: one test runs the module over it.
 # nvrcim serve listens by GNU libmicrohttpd, reads by pugixml and delivers by libcurl; sblim-wbemcli is a client that asks it.
 # graphviz draws what nvrcim graph writes.
-# lintian and dpkg-dev make and inspect the packages.
+# lintian, dpkg-dev and rpm make and inspect the packages.
 # libcurl4 is what the module loads for transfers; python3, python3-pyftpdlib and openssl make the servers that tests transfer
 # from and to: HTTP and HTTPS come with Python, FTP does not, and HTTPS needs a certificate.
 # shellcheck disable=SC2034 # the scripts that source this file use it
 packages="g++ cmake ninja-build ccache binutils libhbaapi-dev libhbaapi2 librapidxml-dev
     libtomlplusplus-dev libcli11-dev nlohmann-json3-dev libgtest-dev libgmock-dev libbenchmark-dev cmark-gfm
-    libcurl4 python3 python3-pyftpdlib openssl lintian dpkg-dev
+    libcurl4 python3 python3-pyftpdlib openssl lintian dpkg-dev rpm
     libmicrohttpd-dev libpugixml-dev libcurl4-openssl-dev sblim-wbemcli graphviz"
 
 # install_packages NAMES...: asks apt for those that are not there yet, so that a second run costs nothing.

@@ -10,7 +10,7 @@ LINK = re.compile(r"\[[^\]\n]*\]\(([^)\s]+)\)")
 
 
 def documents():
-    return sorted([*SOURCE.glob("*.md"), *(SOURCE / "docs").glob("*.md"), SOURCE / "classes/README.md"])
+    return sorted([*SOURCE.glob("*.md"), *(SOURCE / "docs").glob("*.md"), *SOURCE.glob("*/README.md")])
 
 
 def without_code(text):
@@ -63,8 +63,6 @@ class Links(unittest.TestCase):
 
     def test_the_class_pages_link_each_other(self):
         pages = sorted((BUILD / "docs/classes").glob("*.md"))
-        if not (BUILD / "docs/classes/index.md").exists():
-            self.skipTest("this build makes no class pages")
         self.assertGreater(len(pages), 260)
         self.assertEqual([fault for page in pages for fault in broken(page)], [])
 

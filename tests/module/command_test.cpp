@@ -230,9 +230,10 @@ TEST(Command, PrintsRowsAsCsvWhereverThereAreRows)
     EXPECT_EQ(nvrcim("--csv diag results").output, "test,outcome,passed,failed,seconds,adapter,result\r\n");
     EXPECT_THAT(nvrcim("--csv driverlog").output, testing::StartsWith("line\r\n"));
     EXPECT_EQ(nvrcim(std::string("--csv set ") + minutes + " current=10").output, "current\r\n10\r\n");
-    EXPECT_THAT(
-        nvrcim(std::string("--csv call 'NVRHBA_RecordLog.InstanceID=\"NVRHBA:ProviderLog:") + rig_host_name + "\"' ClearLog").output,
-        "returnValue\r\n0\r\n");
+    EXPECT_THAT(nvrcim(std::string("--csv call 'NVRHBA_RecordLog.InstanceID=\"NVRHBA:ProviderLog:") + rig_host_name +
+                       "\"' ClearLog")
+                    .output,
+                "returnValue\r\n0\r\n");
     EXPECT_THAT(
         nvrcim("--csv wwn read").output,
         testing::StartsWith("port,returnValue,meaning,WWPN,WWNN,WWNOperationStatus\r\n10000000C9A00001,0,done,"));
