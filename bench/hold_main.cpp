@@ -15,10 +15,16 @@
 
 #include "agent/ProviderAgent.h"
 #include "agent/instance_table.h"
+#include "classes/NVRHBA_DumpData.h"
+#include "classes/NVRHBA_DumpService.h"
 #include "classes/NVRHBA_FCPort.h"
 #include "services/NVRHBA_BootBIOSService_Provider.h"
+#include "services/NVRHBA_DumpData_Provider.h"
+#include "services/NVRHBA_DumpService_Provider.h"
+#include "services/NVRHBA_FCHBADriverParamService_Provider.h"
 #include "services/NVRHBA_FCHBAWWNService_Provider.h"
 #include "services/NVRHBA_FCPort_Provider.h"
+#include "services/NVRHBA_FCTagService_Provider.h"
 #include "services/NVRHBA_SoftwareInstallationService_Provider.h"
 #include "simulator/nvrsim.h"
 #include "tests/support/private_host_setup.h"
@@ -158,6 +164,56 @@ void measure_services(unsigned ports)
     measure("SetPortEnabled", ports, [&] {
         firmware.SetPortEnabled(install.get(), port.get(), value<boolean>(true), result);
         return result.value;
+    });
+
+    measure("ResetHBA", ports, [&] {
+        firmware.ResetHBA(install.get(), port.get(), result);
+        return result.value;
+    });
+
+    NVRHBA_FCPort* target = port.get();
+    Property<boolean> no = value<boolean>(false);
+    Property<String> name = value<String>("lun-queue-depth"), depth = value<String>("64");
+    NVRHBA_FCHBADriverParamService_Provider params;
+    const Ref<NVRHBA_FCHBADriverParamService> param(clone_as(agent.m_NVRHBA_FCHBADriverParamService_map[0]));
+    measure("SetDriverParameter", ports, [&] {
+        params.SetDriverParameter(param.get(), target, no, no, name, depth, result);
+        return result.value;
+    });
+
+    NVRHBA_FCTagService_Provider tags;
+    const Ref<NVRHBA_FCTagService> tag(clone_as(agent.m_NVRHBA_FCTagService_map[0]));
+    measure("GetGlobalFlag", ports, [&] {
+        tags.GetGlobalFlag(tag.get(), target, number, result);
+        return result.value;
+    });
+    measure("SetGlobalFlag", ports, [&] {
+        tags.SetGlobalFlag(tag.get(), target, number, result);
+        return result.value;
+    });
+
+    NVRHBA_DumpService_Provider dumps;
+    const Ref<NVRHBA_DumpService> dump(clone_as(agent.m_NVRHBA_DumpService_map[0]));
+    Property<Array<String>> files{};
+    measure("GenerateDump", ports, [&] {
+        dumps.GenerateDump(dump.get(), target, result);
+        return result.value;
+    });
+    measure("GetDumpFileNames", ports, [&] {
+        dumps.GetDumpFileNames(dump.get(), target, files, result);
+        return result.value;
+    });
+    measure("DeleteDump", ports, [&] {
+        dumps.DeleteDump(dump.get(), target, result);
+        return result.value;
+    });
+    NVRHBA_DumpData_Provider settings;
+    const Ref<NVRHBA_DumpData> data(clone_as(agent.m_NVRHBA_DumpData_map[ports - 1]));
+    uint32 kept = 1;
+    measure("RetentionCount", ports, [&] {
+        kept = kept % 20 + 1; // another one each time, so that all of them are built anew
+        set(data->RetentionCount, kept);
+        return static_cast<uint32>(settings.modify_instance(data.get(), data.get()));
     });
 
     settle(agent);
