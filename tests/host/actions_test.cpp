@@ -80,20 +80,72 @@ TEST(ActionTable, HasEachVerbOnceInAGroupThatHelpShows)
     }
 }
 
+// What changes the hardware or its fabric asks first; what lasts shows that it lives.
+TEST(ActionTable, AsksBeforeEachChangeAndShowsWhatLasts)
+{
+    std::set<std::string> without_question, lasting;
+    for (const Action& action : actions()) {
+        if (action.question.empty()) without_question.insert(action.group + ' ' + action.verb);
+        if (!action.doing.empty()) lasting.insert(action.group + ' ' + action.verb);
+    }
+    EXPECT_THAT(without_question, testing::ElementsAre("bootbios status", "dump list", "param list", "tag get",
+                                                       "tag save", "wwn capability", "wwn read"));
+    EXPECT_THAT(lasting, testing::ElementsAre("dump generate", "firmware install", "port reset", "tag load",
+                                              "wwn change", "wwn restore"));
+}
+
 TEST(ReturnWords, AreThoseOfTheMethodBeforeTheCommonOnes)
 {
     EXPECT_EQ(return_words({}, 0), "done");
     EXPECT_EQ(return_words({{0, "well done"}}, 0), "well done");
     EXPECT_EQ(return_words({{1, "other"}}, 0), "done");
-    for (std::uint64_t value : {1u,     4u,     5u,     91u,    4097u,  4107u,  32767u, 32768u, 32774u, 32968u, 32969u,
-                                33068u, 40001u, 40005u, 40089u, 40092u, 40097u, 40148u, 40149u, 40150u, 40221u, 40247u})
-        EXPECT_NE(return_words({}, value), "a value without a meaning that is known") << value;
     EXPECT_EQ(return_words({}, 12), "a value without a meaning that is known");
     EXPECT_EQ(return_words({}, 40000), "a value without a meaning that is known");
     EXPECT_EQ(return_words({}, 4294967295), "a value without a meaning that is known");
     EXPECT_EQ(return_words({}, 40253), "the management library answered 253");
     EXPECT_THAT(return_words({}, 40221), HasSubstr("boot code"));
     EXPECT_EQ(return_words({{40247, "other"}}, 40247), "other");
+}
+
+TEST(ReturnWords, AreKnownForEachValueThatAServiceReturns)
+{
+    const std::pair<std::uint64_t, const char*> rows[] = {
+        {0, "done"},
+        {1, "the library refused"},
+        {4, "it was asked of the wrong service, or a file could not be written"},
+        {5, "an option is none, or a file could not be looked at"},
+        {91, "the name is that of a virtual port"},
+        {4097, "something that is needed was not given"},
+        {4107, "the file was not found"},
+        {32767, "the adapter has no entries"},
+        {32768, "there is no adapter, or it failed for a reason of its own"},
+        {32774, "memory ran out"},
+        {32968, "the port is unknown, or something that was given is not possible"},
+        {32969, "a name is missing"},
+        {33068, "it was asked of an instance that is not the host's service"},
+        {40001,
+         "the management library answered 1: the port is not local, or the library does not have the call, or it "
+         "failed"},
+        {40002, "the management library answered 2: not supported"},
+        {40005, "the management library answered 5: no World Wide Name that can be used"},
+        {40007, "the management library answered 7: more data available"},
+        {40027, "the management library answered 27: the directory cannot be opened"},
+        {40063, "the management library answered 63: diagnostics are not available"},
+        {40089, "the management library answered 89: names of this type are not supported"},
+        {40092, "the management library answered 92: management of World Wide Names is not available"},
+        {40097, "the management library answered 97: management of World Wide Names is busy"},
+        {40128, "the management library answered 128: not supported on this host"},
+        {40148, "the management library answered 148: a command of the mailbox failed"},
+        {40149, "the management library answered 149: a command of the mailbox timed out"},
+        {40150, "the management library answered 150: the mailbox is busy"},
+        {40160, "the management library answered 160: the configuration cannot be opened"},
+        {40178, "the management library answered 178: the configuration cannot be written"},
+        {40191, "the management library answered 191: the list is too long"},
+        {40221, "the management library answered 221: boot code is enabled: disable it first"},
+        {40247, "the management library answered 247: the firmware is written, and a restart of the host activates it"},
+    };
+    for (const auto& [value, words] : rows)
+        EXPECT_EQ(return_words({}, value), words);
 }
 
 TEST(ReturnWords, OfBitsAreJoined)

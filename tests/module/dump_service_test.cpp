@@ -310,6 +310,23 @@ TEST(DumpServiceLists, CountsThatLieReadNoFurtherThanTheList)
     EXPECT_THAT(dumps.service.call("GetDumpFileNames", dumps.target), returned(40191));
 }
 
+TEST(DumpServiceLists, AFailureOfTheSecondQuestionIsTheAnswer)
+{
+    make_directory();
+    Dumps dumps(host_with_dumps(6));
+    for (const std::uint32_t status : {1u, 7u, 64u, 260u}) {
+        clear_faults();
+        add_fault("call = \"RM_GetDumpFileNames\", from = 2, status = " + std::to_string(status));
+        const Called called = dumps.service.call("GetDumpFileNames", dumps.target);
+        EXPECT_THAT(called, returned(40000 + status));
+        EXPECT_EQ(called.words, joined({begun("Entering GetDumpFileNames"),
+                                        asked(191),
+                                        asked(status),
+                                        {"NVRHBA_DumpService::nvrcimGetDumpFileNames failed"}}));
+        EXPECT_TRUE(called.out("DumpFiles").elements().empty());
+    }
+}
+
 TEST(DumpServiceLists, DamagedNamesEndWithTheirField)
 {
     make_directory();

@@ -158,6 +158,20 @@ TEST_P(FcPortBeacon, OfAnUnknownPortIsRefused)
     EXPECT_EQ(calls("RM_DiagBeacon"), 0u);
 }
 
+// It is not asked whether the port is local.
+TEST_P(FcPortBeacon, OfAPortThatIsNotLocalIsTheLibrarysToRefuse)
+{
+    Rig rig({*GetParam()});
+    const host::Instance on = port_with(rig, 2);
+    rig.settle();
+    const std::uint64_t asked = calls("RM_IsLocalHBA");
+    set_port(0, "local", 0);
+    const Changed changed = modify(rig, on);
+    EXPECT_THAT(changed.answer, succeeded());
+    EXPECT_EQ(changed.words, joined({switched(2), done}));
+    EXPECT_EQ(calls("RM_IsLocalHBA"), asked);
+}
+
 // A server routes by class; an instance of another known class that reaches the module all the same is not read as a
 // port.
 TEST(FcPortBeaconOfAnotherClass, IsRefused)

@@ -222,10 +222,12 @@ TEST_P(InstallFromBytes, WritesToNothingButAFile)
     make_folder("folder");
     nvrtest::link("/dev/null", "device");
     nvrtest::link("nowhere", "dangling");
+    write_file("a.file", "");
     const Words before = names_in(firmware_folder);
     for (const std::string& path :
          {std::string(""), std::string("fifo"), std::string("folder"), std::string("device"), std::string("dangling"),
-          std::string("/nothing/a.copy"), std::string("folder/"), std::string(".."), std::string(65536, 'x')}) {
+          std::string("/nothing/a.copy"), std::string("folder/"), std::string(".."), std::string("a.file/inside"),
+          std::string("a.file/"), std::string(65536, 'x')}) {
         const Called called = host.install_bytes(image(), {32768}, {path});
         EXPECT_THAT(called, returned(4)) << path;
         EXPECT_EQ(called.words, joined({with_file(1, 32768, path), {not_opened}}));
@@ -265,6 +267,22 @@ TEST_P(InstallFromBytes, AFileThatCannotBeRemovedIsTold)
                       converted(first_port),
                       downloaded(copy),
                       {removing, "nvrcimDownloadFW: Can't stat file " + copy, complete, gate_refreshing}}));
+}
+
+// The link is what goes in the end, as any path that an image is written by.
+TEST_P(InstallFromBytes, AFullDiskLeavesNoPartBehindALink)
+{
+    Firmware_Host host(*GetParam());
+    make_folder("/var/log/disk");
+    mount_small_disk("/var/log/disk", 16);
+    write_file("/var/log/disk/image", "old");
+    nvrtest::link("/var/log/disk/image", copy);
+    const Called called = host.install_bytes(image(new_version, 60000), {32768}, {copy});
+    EXPECT_THAT(called, returned(4));
+    EXPECT_EQ(called.words, joined({with_file(1, 32768), {not_opened}}));
+    EXPECT_EQ(read_file("/var/log/disk/image"), "");
+    EXPECT_THAT(host.install_bytes(image(), {32768}, {copy}), returned(0));
+    EXPECT_THAT(names_in(firmware_folder), IsEmpty());
 }
 
 TEST_P(InstallFromBytes, AFullDiskLeavesNoFile)

@@ -1,5 +1,6 @@
 // Firmware written from a file or URI.
 #include <algorithm>
+#include <filesystem>
 #include <sys/stat.h>
 
 #include <gmock/gmock.h>
@@ -351,6 +352,33 @@ TEST_P(InstallFromUri, PathsThatAreNoFilesAreRefusedWithoutWaiting)
     EXPECT_THAT(host.install("dangling"), returned(4107));
     EXPECT_EQ(names_in(firmware_folder), before);
     EXPECT_EQ(calls("RM_ImportHBAFileA"), 0u);
+}
+
+TEST_P(InstallFromUri, AFileIsNoFolder)
+{
+    Firmware_Host host(*GetParam());
+    write_image("an.image");
+    const Called called = host.install("an.image/inside");
+    EXPECT_THAT(called, returned(5));
+    EXPECT_EQ(called.words.end()[-2], "filename is : an.image/inside");
+    EXPECT_EQ(called.words.back(), "ERROR: nvrcimDownloadFW: Can't stat FW file ");
+    EXPECT_EQ(names_in(firmware_folder), Words{"an.image"});
+}
+
+// What came of the image is judged by the adapter, and stays as any fetched image that is refused.
+TEST_P(InstallFromUri, AFullDiskLeavesAPartThatIsNoImage)
+{
+    Firmware_Host host(*GetParam());
+    install_curl();
+    const std::string served = std::string(served_folder) + "/an.image";
+    write_file(served, image(new_version, 200000));
+    mount_small_disk(firmware_folder, 64);
+    std::filesystem::current_path(firmware_folder);
+    const Called called = host.install("file://" + served);
+    EXPECT_THAT(called, returned(40001));
+    EXPECT_THAT(called.words, contains_in_order({"download failed 23", "filename is : an.image", failed}));
+    EXPECT_EQ(names_in(firmware_folder), Words{"an.image"});
+    EXPECT_EQ(calls("RM_DownloadFirmware"), 0u);
 }
 
 TEST_P(InstallFromUri, StrangeUrisAreTakenLetterForLetter)

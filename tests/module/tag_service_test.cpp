@@ -677,6 +677,24 @@ TEST_F(TagServiceTransfer, AMalformedAddressIsNotFoundAndLeavesItsFile)
     EXPECT_THAT(files(here), ElementsAre("tags.xml"));
 }
 
+TEST_F(TagServiceTransfer, AFullDiskLeavesNoTable)
+{
+    install_curl();
+    std::string rows;
+    for (int i = 0; i < 1000; i++)
+        rows += row("1");
+    write_file(std::string(served) + "/tags.xml", document("<numberOfEntries>1000</numberOfEntries>" + rows));
+    const Small_Disk disk(here);
+    ASSERT_EQ(::chdir(here), 0);
+    const Called called = fetch(std::string("file://") + served + "/tags.xml");
+    EXPECT_THAT(called, returned(32968));
+    EXPECT_THAT(called.words, contains_in_order({"download failed 23", "unexpected end of data", removed}));
+    EXPECT_EQ(called.words.back(), removed);
+    EXPECT_THAT(files(here), IsEmpty());
+    EXPECT_EQ(table(), two_rows);
+    EXPECT_EQ(::chdir("/"), 0);
+}
+
 TEST_F(TagServiceTransfer, WithoutALibraryForItNothingIsFetched)
 {
     EXPECT_THAT(fetch("ftp://127.0.0.1/tags.xml"), returned(4107));

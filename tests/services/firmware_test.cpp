@@ -226,6 +226,8 @@ TEST_F(Firmware, TakesImagesOf64Megabytes)
     std::string image = read_file(local_image);
     ASSERT_EQ(image.size(), 64u << 20);
     EXPECT_EQ(install(bytes_of(image), "a.copy", port.get()), 0u);
+    EXPECT_EQ(install(local_image, port.get()), 0u);
+    EXPECT_EQ(install("file://" + local_image, port.get()), 0u);
     char version[64] = {};
     nvrsim_get("0", "firmware", version, sizeof version);
     EXPECT_STREQ(version, "2.10");
@@ -251,6 +253,7 @@ TEST_F(Firmware, AFileThatHasGoneIsALibrarysFailure)
     } rows[] = {{"nothing", "\nERROR: nvrcimDownloadFW: FW file not found"},
                 {"", "\nERROR: nvrcimDownloadFW: FW file not found"},
                 {longest, "\nERROR: nvrcimDownloadFW: Can't stat FW file"},
+                {local_image + "/inside", "\nERROR: nvrcimDownloadFW: Can't stat FW file"},
                 {"fifo", "\nERROR: nvrcimDownloadFW: Can't stat FW file"}};
     for (const auto& row : rows) {
         words();
