@@ -129,6 +129,14 @@ class Commands(unittest.TestCase):
                 self.assertEqual(done.returncode, 0, done.stderr)
                 self.assertTrue(done.stdout or " graph " in arguments)
 
+    def test_the_page_of_field_names_has_each_column(self):
+        page = (SOURCE / "docs/field-names.md").read_text(encoding="utf-8")
+        for verb in ("ports", "paths"):
+            rows = re.search(rf"^\| `nvrcim {verb}` \|.*\n\|[-|]+\n((?:\|.*\n)+)", page, re.M).group(1)
+            named = [re.search(r"`(\w+)`", row.split("|")[2]).group(1) for row in rows.splitlines()]
+            columns = self.run_nvrcim(f"--scenario {SMALL} {verb} --csv").stdout.splitlines()[0].split(",")
+            self.assertEqual(named, columns)
+
     def test_clients_ask_a_server_of_ours(self):
         port = re.search(r":(\d+)/cimom", self.start("serve --port 0", "for trying and testing")).group(1)
         for line in self.shown(r"wbemcli .*"):

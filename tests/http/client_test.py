@@ -260,6 +260,15 @@ class WithWbemcli(unittest.TestCase):
             with self.assertRaisesRegex(AssertionError, "CIM_ERR_NOT_SUPPORTED"):
                 wbemcli(verb, *arguments)
 
+    def test_a_management_suite_finds_the_profiles_and_what_conforms_to_them(self):
+        profiles = wbemcli("ein", url("root/pg_interop:CIM_RegisteredProfile"))
+        self.assertEqual(sorted(bare(profiles)),
+                         sorted(nvrcim("-n", "root/pg_interop", "names", "CIM_RegisteredProfile")["paths"]))
+        of_adapters = [line for line in profiles if line.endswith('"NVR:Storage HBA"')]
+        self.assertEqual(len(of_adapters), 1, profiles)
+        conforming = wbemcli("ain", "-ac", "CIM_ElementConformsToProfile", object_url(of_adapters[0]))
+        self.assertEqual(sum(":NVRHBA_PortController." in line for line in conforming), 4, conforming)
+
     def test_failures_are_told_by_their_status(self):
         for arguments, code in ((("ein", url(f"{NAMESPACE}:NVRHBA_Nothing")), "CIM_ERR_INVALID_CLASS"),
                                 (("ein", url("root/nowhere:NVRHBA_FCPort")), "CIM_ERR_INVALID_NAMESPACE"),
@@ -398,6 +407,30 @@ class WithXml(unittest.TestCase):
         for name in (subscription, filter_name, handler_name):
             self.assertNotIn("ERROR", self.delete(name))
         self.assertIn('ERROR CODE="6"', self.delete(filter_name))
+
+    def test_a_method_takes_an_instance(self):
+        def name_of(class_name, part):
+            text = request("EnumerateInstanceNames",
+                           f'<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="{class_name}"/></IPARAMVALUE>')
+            return [name for name in re.findall("<INSTANCENAME.*?</INSTANCENAME>", text) if part in name][0]
+
+        def run(settings):
+            reference = f"<VALUE.REFERENCE>{name_of('NVRHBA_PortController', '10000000C9A00001')}</VALUE.REFERENCE>"
+            return request("RunDiagnosticService",
+                           f'<PARAMVALUE NAME="ManagedElement" PARAMTYPE="reference">{reference}</PARAMVALUE>'
+                           f'<PARAMVALUE NAME="DiagnosticSettings" PARAMTYPE="string"><VALUE>{settings}</VALUE></PARAMVALUE>',
+                           extrinsic=name_of("NVRHBA_FCHBADiagnosticTest", "Internal Loopback"))
+
+        settings = ('<INSTANCE CLASSNAME="NVRHBA_FCHBADiagnosticSettingData"><PROPERTY NAME="InstanceID" TYPE="string">'
+                    '<VALUE>NVR:FCHBA Internal Loopback Test</VALUE></PROPERTY><PROPERTY NAME="HaltOnError" TYPE="boolean">'
+                    '<VALUE>TRUE</VALUE></PROPERTY></INSTANCE>')
+        for written in (html.escape(settings), f"<![CDATA[{settings}]]>"):
+            answer = run(written)
+            self.assertIn('<RETURNVALUE PARAMTYPE="uint32"><VALUE>0</VALUE></RETURNVALUE>', answer)
+            self.assertIn('<PARAMVALUE NAME="Job" PARAMTYPE="reference"><VALUE.REFERENCE>', answer)
+        for broken in (html.escape(settings[:-1]), html.escape(settings.replace("HaltOnError", "None")), "no instance",
+                       html.escape(settings.replace("TRUE", "&x;")), html.escape(settings.replace("TRUE", "perhaps"))):
+            self.assertIn('<ERROR CODE="4"', run(broken))
 
     def test_every_operation_answers_what_is_not_there(self):
         class_name = '<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="NVRHBA_Nothing"/></IPARAMVALUE>'
