@@ -132,7 +132,7 @@ bool cleans_up_all(const host::Manner& manner)
 }
 
 class Alerts : public Every_Manner {};
-NVR_IN_EVERY_MANNER(Alerts);
+NVR_THREADS_IN_EVERY_MANNER(Alerts);
 
 } // namespace
 

@@ -187,7 +187,7 @@ TEST(Life, TheLastCleanupUnderARequestUnloadsBehindIt)
 }
 
 class Lives : public Every_Manner {};
-NVR_IN_EVERY_MANNER(Lives);
+NVR_THREADS_IN_EVERY_MANNER(Lives);
 
 TEST_P(Lives, TenRoundsInOneProcessLeaveNothingBehind)
 {

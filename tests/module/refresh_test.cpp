@@ -339,7 +339,7 @@ protected:
         EXPECT_THAT(rig.server().report().violations, IsEmpty());
     }
 };
-NVR_IN_EVERY_MANNER(Refreshes);
+NVR_THREADS_IN_EVERY_MANNER(Refreshes);
 
 TEST_P(Refreshes, EachOfEightClientsSeesAllOldOrAllNew)
 {

@@ -37,7 +37,7 @@ std::vector<Hold> holds(const std::vector<Trace_Line>& lines, const std::string&
 } // namespace
 
 class ServiceClients : public Every_Manner {};
-NVR_IN_EVERY_MANNER(ServiceClients);
+NVR_THREADS_IN_EVERY_MANNER(ServiceClients);
 
 // Two providers run in parallel, but the agent's locks let one service in at a time.
 TEST_P(ServiceClients, OfTwoServicesTakeTurnsAndBothFinish)

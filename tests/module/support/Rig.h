@@ -121,10 +121,19 @@ MATCHER_P(failed_with, code, "")
 
 /// The manners of real servers and the strictest one, for parameterised tests.
 class Every_Manner : public testing::TestWithParam<const host::Manner*> {};
-#define NVR_IN_EVERY_MANNER(suite)                                                                                     \
-    INSTANTIATE_TEST_SUITE_P(In, suite, testing::ValuesIn(nvrtest::every_manner()),                                    \
-                             [](const auto& info) { return nvrtest::manner_label(*info.param); })
 std::vector<const host::Manner*> every_manner();
+#define NVR_IN_MANNERS(manners, suite)                                                                                 \
+    INSTANTIATE_TEST_SUITE_P(In, suite, testing::ValuesIn(manners),                                                    \
+                             [](const auto& info) { return nvrtest::manner_label(*info.param); })
+/// For tests whose threads meet.
+#define NVR_THREADS_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(nvrtest::every_manner(), suite)
+/// For tests that ask one thing after the other: the thread sanitizer, which takes ten times as long, sees them in the
+/// strict manner alone.
+#ifdef __SANITIZE_THREAD__
+#define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(std::vector{&host::Manner::strict()}, suite)
+#else
+#define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(nvrtest::every_manner(), suite)
+#endif
 std::string manner_label(const host::Manner& manner);
 
 } // namespace nvrtest
