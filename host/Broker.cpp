@@ -16,8 +16,6 @@
 namespace host {
 namespace {
 
-constexpr std::size_t most_retired = 256;
-
 std::string own_host_name()
 {
     char name[256] = "";
@@ -36,12 +34,6 @@ Broker::Broker(const Schema& schema, const Manner& manner, Server_Log& log)
     fill_encapsulation(m_eft, manner);
     fill_threads(m_xft, manner);
     m_face = {this, &m_bft, &m_eft, &m_xft, memory_table(manner)};
-}
-
-Broker::~Broker()
-{
-    for (Object* object : m_retired)
-        delete object;
 }
 
 void Broker::connect(Request_Runner* requests, Indication_Taker* indications)
@@ -163,19 +155,14 @@ int Broker::detach(const CMPIContext* context)
 
 void Broker::retire(Object& object)
 {
-    object.scope->remove(object);
     m_ledger.released(object.kind, object.origin);
-    object.magic = Object::dead;
-    Object* oldest = nullptr;
-    {
-        std::lock_guard lock(m_mutex);
-        m_retired.push_back(&object);
-        if (m_retired.size() > most_retired) {
-            oldest = m_retired.front();
-            m_retired.pop_front();
-        }
-    }
-    delete oldest;
+    object.scope->retire(object);
+}
+
+void Broker::keep(Retired_Objects&& retired)
+{
+    std::lock_guard lock(m_mutex);
+    m_retired.add(std::move(retired));
 }
 
 void Broker::violation(const std::string& text)

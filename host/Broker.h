@@ -16,7 +16,6 @@
 
 #include <cmpift.h>
 
-#include <deque>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -48,9 +47,8 @@ public:
 
 class Broker {
 public:
+    /// Its end frees what modules did not release. No thread may be attached then, nor prepared for it: see `is_lent`.
     Broker(const Schema& schema, const Manner& manner, Server_Log& log);
-    /// Frees what modules did not release. No thread may be attached, nor prepared for it: see `is_lent`.
-    ~Broker();
     Broker(const Broker&) = delete;
     Broker& operator=(const Broker&) = delete;
 
@@ -94,6 +92,8 @@ public:
 
     /// Frees an object that the module released.
     void retire(Object& object);
+    /// Keeps what a scope's end would free, for as long as it counts as released a moment ago.
+    void keep(Retired_Objects&& retired);
     /// Notes a broken rule, in the ledger and the log.
     void violation(const std::string& text);
     /// Notes a call of a broker function on a thread that has neither a request nor an attachment.
@@ -118,7 +118,7 @@ private:
     CMPIBroker m_face{};
 
     std::mutex m_mutex;
-    std::deque<Object*> m_retired; ///< released a moment ago: kept so that a second use is seen
+    Retired_Objects m_retired;
     std::vector<std::unique_ptr<Scope>> m_attached;
     Scope m_orphans, m_explicit;
 };

@@ -5,6 +5,22 @@
 namespace host {
 namespace {
 thread_local Scope* innermost = nullptr;
+constexpr std::size_t most_retired = 256;
+} // namespace
+
+std::unique_ptr<Object> Retired_Objects::add(std::unique_ptr<Object> object)
+{
+    m_objects.push_back(std::move(object));
+    if (m_objects.size() <= most_retired) return nullptr;
+    std::unique_ptr<Object> oldest = std::move(m_objects.front());
+    m_objects.pop_front();
+    return oldest;
+}
+
+void Retired_Objects::add(Retired_Objects&& others)
+{
+    for (std::unique_ptr<Object>& object : others.m_objects)
+        (void)add(std::move(object));
 }
 
 Scope::Scope(Broker& broker, Sort sort, std::string what) : m_broker(broker), m_sort(sort), m_what(std::move(what)) {}
@@ -19,6 +35,7 @@ Scope::~Scope()
         m_broker.ledger().settled(object->kind, object->origin);
         delete object;
     }
+    m_broker.keep(std::move(m_retired));
 }
 
 void Scope::enter()
@@ -55,8 +72,9 @@ void Scope::add(Object& object)
     m_first = &object;
 }
 
-void Scope::remove(Object& object)
+void Scope::retire(Object& object)
 {
+    std::unique_ptr<Object> oldest; // freed without the mutex
     std::lock_guard lock(m_mutex);
     if (object.previous)
         object.previous->next = object.next;
@@ -65,6 +83,8 @@ void Scope::remove(Object& object)
     if (object.next) object.next->previous = object.previous;
     object.previous = object.next = nullptr;
     object.scope = nullptr;
+    object.magic = Object::dead;
+    oldest = m_retired.add(std::unique_ptr<Object>(&object));
 }
 
 std::uint64_t Scope::mark() const

@@ -6,10 +6,24 @@
 
 #include "host/objects/Object.h"
 
+#include <deque>
+#include <memory>
 #include <mutex>
 #include <string>
 
 namespace host {
+
+/// The last objects that were released, marked dead.
+class Retired_Objects {
+public:
+    /// Takes one more, and gives the oldest back if there are too many then.
+    [[nodiscard]] std::unique_ptr<Object> add(std::unique_ptr<Object> object);
+    /// Takes all of another.
+    void add(Retired_Objects&& others);
+
+private:
+    std::deque<std::unique_ptr<Object>> m_objects;
+};
 
 class Scope {
 public:
@@ -33,8 +47,8 @@ public:
     static Scope* current(const Broker& broker);
 
     void add(Object& object);
-    /// Takes an object out of the list; it is the caller's then.
-    void remove(Object& object);
+    /// Frees an object that the module released, but not at once: a second use of one of the last is still seen.
+    void retire(Object& object);
     /// The number of the last object added, and the release of all that came after such a number.
     std::uint64_t mark() const;
     void release_since(std::uint64_t mark);
@@ -53,6 +67,7 @@ private:
     Scope* m_outer = nullptr;
     mutable std::mutex m_mutex;
     Object* m_first = nullptr;
+    Retired_Objects m_retired;
     std::uint64_t m_last_serial = 0;
 };
 
