@@ -59,6 +59,22 @@ std::string call(const std::string& method, const std::string& arguments, const 
            "</LOCALINSTANCEPATH>" + arguments + "</METHODCALL>" + closing;
 }
 
+std::string created(const std::string& class_name, const std::string& properties)
+{
+    return intrinsic("CreateInstance", "<IPARAMVALUE NAME=\"NewInstance\"><INSTANCE CLASSNAME=\"" + class_name + "\">" +
+                                           properties + "</INSTANCE></IPARAMVALUE>");
+}
+std::string text_property(const std::string& name, const std::string& text)
+{
+    return "<PROPERTY NAME=\"" + name + "\" TYPE=\"string\"><VALUE>" + text + "</VALUE></PROPERTY>";
+}
+std::string end_property(const std::string& name, const std::string& answer)
+{
+    const std::size_t from = answer.find("<INSTANCENAME"), to = answer.find("</INSTANCENAME>");
+    return "<PROPERTY.REFERENCE NAME=\"" + name + "\"><VALUE.REFERENCE>" + answer.substr(from, to + 15 - from) +
+           "</VALUE.REFERENCE></PROPERTY.REFERENCE>";
+}
+
 class Serve : public testing::Test {
 protected:
     struct Result {
@@ -363,26 +379,6 @@ TEST_F(Serve, HoldsTheHeadOfARequestAgainstItsBody)
     EXPECT_EQ("501 multiple-requests-unsupported", told([](Request_Head& head) { head.batch = "2"; }));
 }
 
-namespace {
-
-std::string created(const std::string& class_name, const std::string& properties)
-{
-    return intrinsic("CreateInstance", "<IPARAMVALUE NAME=\"NewInstance\"><INSTANCE CLASSNAME=\"" + class_name + "\">" +
-                                           properties + "</INSTANCE></IPARAMVALUE>");
-}
-std::string text_property(const std::string& name, const std::string& text)
-{
-    return "<PROPERTY NAME=\"" + name + "\" TYPE=\"string\"><VALUE>" + text + "</VALUE></PROPERTY>";
-}
-std::string end_property(const std::string& name, const std::string& answer)
-{
-    const std::size_t from = answer.find("<INSTANCENAME"), to = answer.find("</INSTANCENAME>");
-    return "<PROPERTY.REFERENCE NAME=\"" + name + "\"><VALUE.REFERENCE>" + answer.substr(from, to + 15 - from) +
-           "</VALUE.REFERENCE></PROPERTY.REFERENCE>";
-}
-
-} // namespace
-
 TEST_F(Serve, TakesNoSubscriptionThatLeadsNowhere)
 {
     const auto destination = [](const std::string& name, const std::string& url) {
@@ -441,6 +437,31 @@ TEST_F(Serve, OutlivesARequestCutAtEveryByte)
     for (std::size_t size = 0; size < whole.size(); ++size)
         EXPECT_EQ(400u, ask(whole.substr(0, size)).status) << size;
     EXPECT_EQ(200u, ask(whole).status);
+}
+
+TEST_F(Serve, OutlivesARequestWithAnyByteChanged)
+{
+    things::set("count", 1);
+    const std::string wholes[] = {
+        call("Double",
+             "<PARAMVALUE NAME=\"Words\" PARAMTYPE=\"string\"><VALUE.ARRAY><VALUE>a&amp;b</VALUE></VALUE.ARRAY>"
+             "</PARAMVALUE><PARAMVALUE NAME=\"Target\" PARAMTYPE=\"reference\"><VALUE.REFERENCE>" +
+                 name_of("3", "TEST_Other") + "</VALUE.REFERENCE></PARAMVALUE>"),
+        created("TEST_Thing",
+                "<PROPERTY NAME=\"Inner\" TYPE=\"string\" EmbeddedObject=\"instance\"><VALUE>"
+                "<![CDATA[<INSTANCE CLASSNAME=\"TEST_Other\"><PROPERTY NAME=\"Id\" TYPE=\"uint32\"><VALUE>1"
+                "</VALUE></PROPERTY></INSTANCE>]]></VALUE></PROPERTY><PROPERTY.ARRAY NAME=\"Numbers\" "
+                "TYPE=\"uint32\"><VALUE.ARRAY><VALUE>1</VALUE><VALUE.NULL/></VALUE.ARRAY></PROPERTY.ARRAY>")};
+    for (const std::string& whole : wholes) {
+        EXPECT_EQ(200u, ask(whole).status);
+        for (std::size_t at = 0; at < whole.size(); ++at)
+            for (const char c : {'<', '>', '&', '"', ']', '/', '\0', '\xff'}) {
+                std::string changed = whole;
+                changed[at] = c;
+                const unsigned status = ask(changed).status;
+                EXPECT_TRUE(status == 200 || status == 400 || status == 501) << status << ": " << changed;
+            }
+    }
 }
 
 TEST_F(Serve, BoundsWhatStandsWithinEachOther)
