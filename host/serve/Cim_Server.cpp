@@ -49,9 +49,8 @@ void check_head(const Request_Head& head, const Message& message)
         throw Http_Fault{400, "header-mismatch", "CIMMethod is not the method of the message"};
     // A method's object may name a class or an instance behind the namespace.
     const std::string named = lower_case(unescaped(head.object)), name_space = lower_case(message.name_space());
-    const bool begins_with = named.compare(0, name_space.size(), name_space) == 0;
-    const bool ends_there = named.size() == name_space.size() || named[name_space.size()] == ':';
-    if (!named.empty() && !(begins_with && ends_there))
+    const std::string front = named.substr(0, named.find(':'));
+    if (!named.empty() && front != name_space)
         throw Http_Fault{400, "header-mismatch", "CIMObject is not the namespace of the message"};
 }
 
