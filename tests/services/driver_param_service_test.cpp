@@ -1,12 +1,11 @@
 // The driver parameter service at its own interface: what no server hands over.
 #include "classes/NVRHBA_FCHBADriverParamService.h"
-#include "classes/NVRHBA_FCPort.h"
 #include "classes/NVRHBA_FCTagService.h"
 #include "classes/NVRHBA_PortController.h"
 #include "services/NVRHBA_FCHBADriverParamService_Provider.h"
 #include "services/NVR_MethodWrapper.h"
 #include "simulator/nvrsim.h"
-#include "tests/agent/Simulated_Host.h"
+#include "tests/services/Service_Host.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -15,22 +14,12 @@ using testing::ElementsAre;
 
 namespace {
 
-constexpr HBA_WWN first_name = {{0x10, 0, 0, 0, 0xC9, 0xA0, 0, 1}};
-
-class DriverParamMethod : public SimulatedHost {
+class DriverParamMethod : public ServiceHost {
 protected:
-    DriverParamMethod()
+    DriverParamMethod() : ServiceHost("[[adapter]]\n")
     {
-        scenario("[[adapter]]\n");
-        EXPECT_EQ(load(), 0);
-        refresh();
         name.set("lun-queue-depth");
         value.set("64");
-    }
-    ~DriverParamMethod() override
-    {
-        settle();
-        unload();
     }
 
     /// As a method of `self` with this Target, whatever their classes; the words go to `told`.
@@ -47,12 +36,10 @@ protected:
         return result.value;
     }
     Instance* service() { return agent().m_NVRHBA_FCHBADriverParamService_map[0]; }
-    Instance* port() { return agent().m_NVRHBA_FCPort_map[0]; }
 
     NVRHBA_FCHBADriverParamService_Provider provider;
     Property<boolean> permanent{}, global{};
     Property<String> name, value;
-    std::vector<std::string> told;
 };
 
 } // namespace
@@ -89,10 +76,7 @@ TEST_F(DriverParamMethod, TakesNoTargetOfAnotherClass)
 
 TEST_F(DriverParamMethod, NeedsAPortWithAName)
 {
-    Ref<NVRHBA_FCPort> wrong(create_as<NVRHBA_FCPort>(true));
-    wrong->DeviceID.set("no name");
-    ASSERT_GE(agent().m_NVRHBA_FCPort_map.insert(clone(wrong.get())), 0);
-    EXPECT_EQ(set_parameter(service(), wrong.get()), 32968u);
+    EXPECT_EQ(set_parameter(service(), known_port("no name").get()), 32968u);
     EXPECT_EQ(told.back(), "NVRHBA_FCHBADriverParamService_Provider::str2HBAName failed");
     EXPECT_THAT(told, Contains("no name"));
 }

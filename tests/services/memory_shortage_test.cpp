@@ -3,14 +3,13 @@
 #include <set>
 
 #include "classes/NVRHBA_DumpService.h"
-#include "classes/NVRHBA_FCPort.h"
 #include "foundation/NVR_Common.h"
 #include "services/NVRHBA_DumpService_Provider.h"
 #include "services/NVR_Dump.h"
 #include "services/NVR_MethodWrapper.h"
 #include "services/NVR_PortVirtualization.h"
 #include "simulator/nvrsim.h"
-#include "tests/agent/Simulated_Host.h"
+#include "tests/services/Service_Host.h"
 #include "tests/support/short_memory.h"
 
 namespace {
@@ -35,11 +34,10 @@ using testing::IsSupersetOf;
 
 namespace {
 
-class MemoryShortage : public SimulatedHost {
+class MemoryShortage : public ServiceHost {
 protected:
     MemoryShortage()
-    {
-        scenario(R"(
+        : ServiceHost(R"(
 [[adapter]]
 [[adapter.port]]
 dump_directory = "/var/log"
@@ -55,17 +53,10 @@ identity = "vm-two"
 wwpn = "2B020000C9A000FF"
 [[target]]
 luns = 3
-)");
-        EXPECT_EQ(load(), 0);
-        refresh();
-        EXPECT_EQ(string2HBAName(&port, first_wwpn), 1);
+)")
+    {
         EXPECT_EQ(string2HBAName(&vport.wwpn, "2B010000C9A000FF"), 1);
         words();
-    }
-    ~MemoryShortage() override
-    {
-        settle();
-        unload();
     }
 
     /// The result of `step` while lists of that size are short; its words go to `told`.
@@ -79,9 +70,7 @@ luns = 3
         told = words();
         return result;
     }
-    HBA_WWN port = {};
     RM_VPORTENTRY vport = {};
-    std::vector<std::string> told;
 };
 
 } // namespace
@@ -89,10 +78,10 @@ luns = 3
 TEST_F(MemoryShortage, LeavesTheBootCodeUnread)
 {
     uint32 state = 7;
-    EXPECT_EQ(without(2048, [&] { return NVR_MethodWrapper::nvrcimGetBootBiosState(port, &state); }), 1u);
+    EXPECT_EQ(without(2048, [&] { return NVR_MethodWrapper::nvrcimGetBootBiosState(first_name, &state); }), 1u);
     EXPECT_EQ(told.back(), "ERROR: GetHBAAttributes: Unable to allocate buffer");
     EXPECT_EQ(state, 7u);
-    EXPECT_EQ(NVR_MethodWrapper::nvrcimGetBootBiosState(port, &state), 0u);
+    EXPECT_EQ(NVR_MethodWrapper::nvrcimGetBootBiosState(first_name, &state), 0u);
 }
 
 TEST_F(MemoryShortage, LeavesVirtualPortsUnlisted)
@@ -100,20 +89,20 @@ TEST_F(MemoryShortage, LeavesVirtualPortsUnlisted)
     VPort_List list;
     // The room for one, and for both.
     for (const std::size_t size : {4 + 24, 4 + 2 * 24}) {
-        EXPECT_EQ(without(size, [&] { return NVR_MethodWrapper::ListVPorts(port, &list); }), 1);
+        EXPECT_EQ(without(size, [&] { return NVR_MethodWrapper::ListVPorts(first_name, &list); }), 1);
         EXPECT_EQ(told.back(), "FMCMD_ListVPorts: Unable to allocate buffer");
     }
-    EXPECT_EQ(NVR_MethodWrapper::ListVPorts(port, &list), 0);
+    EXPECT_EQ(NVR_MethodWrapper::ListVPorts(first_name, &list), 0);
     EXPECT_EQ(list.count, 2u);
     const std::size_t targets = offsetof(RM_TARGETLIST, entry) + sizeof(HBA_FCPSCSIENTRY);
-    EXPECT_EQ(without(targets, [&] { return NVR_MethodWrapper::ListVPortTargets(port, port); }), 1);
+    EXPECT_EQ(without(targets, [&] { return NVR_MethodWrapper::ListVPortTargets(first_name, first_name); }), 1);
     EXPECT_EQ(told.back(), "FMCMD_VportTargets: Unable to allocate buffer");
 }
 
 TEST_F(MemoryShortage, LeavesVirtualMachinesUnlisted)
 {
     std::vector<RM_VMINFO> machines;
-    const auto list = [&] { return NVR_MethodWrapper::ListVMfromVPort(port, vport, &machines); };
+    const auto list = [&] { return NVR_MethodWrapper::ListVMfromVPort(first_name, vport, &machines); };
     EXPECT_EQ(without(4 + 512, list), 1);
     EXPECT_EQ(told.back(), "FMCMD_ListVMS: Unable to allocate buffer.");
     EXPECT_EQ(without(4 + 2 * 512, list), 1);
@@ -126,7 +115,7 @@ TEST_F(MemoryShortage, LeavesVirtualMachinesUnlisted)
 TEST_F(MemoryShortage, LeavesDumpsUnlisted)
 {
     NVRHBA_DumpService_Provider provider;
-    auto* target = static_cast<NVRHBA_FCPort*>(agent().m_NVRHBA_FCPort_map[0]);
+    NVRHBA_FCPort* target = port();
     const auto list = [&] {
         Property<Array<String>> names{};
         Property<uint32> result{};

@@ -3,7 +3,6 @@
 #include "agent/Clock.h"
 #include "agent/beacon.h"
 #include "agent/instance_table.h"
-#include "classes/NVRHBA_FCPort.h"
 #include "classes/NVRHBA_PortController.h"
 #include "classes/NVRHBA_SoftwareInstallationService.h"
 #include "services/NVRHBA_BootBIOSService_Provider.h"
@@ -12,7 +11,7 @@
 #include "services/NVR_MethodWrapper.h"
 #include "services/service_method.h"
 #include "simulator/nvrsim.h"
-#include "tests/agent/Simulated_Host.h"
+#include "tests/services/Service_Host.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -41,21 +40,10 @@ Property<String> text_value(const char* value)
 
 constexpr char no_wwpn_port[] = "NVRHBA_FCHBAWWNService_Provider invald port ...return";
 
-class ServiceMethods : public SimulatedHost {
+class ServiceMethods : public ServiceHost {
 protected:
-    ServiceMethods()
-    {
-        EXPECT_EQ(load(), 0);
-        refresh();
-        words();
-    }
-    ~ServiceMethods() override
-    {
-        settle();
-        unload();
-    }
+    ServiceMethods() : ServiceHost("[[adapter]]\n[[target]]\nluns = 2\n") {}
 
-    NVRHBA_FCPort* port() { return agent().m_NVRHBA_FCPort_map[0]; }
     const Instance* wwn_service() { return agent().m_NVRHBA_FCHBAWWNService_map[0]; }
     const Instance* boot_service() { return agent().m_NVRHBA_BootBIOSService_map[0]; }
 

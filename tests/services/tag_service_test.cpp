@@ -4,14 +4,13 @@
 #include <unistd.h>
 
 #include "classes/NVRHBA_DumpData.h"
-#include "classes/NVRHBA_FCPort.h"
 #include "classes/NVRHBA_FCTagService.h"
 #include "classes/NVRHBA_PortController.h"
 #include "services/ApexConfig.h"
 #include "services/NVRHBA_FCTagService_Provider.h"
 #include "services/tag_tables.h"
 #include "simulator/nvrsim.h"
-#include "tests/agent/Simulated_Host.h"
+#include "tests/services/Service_Host.h"
 #include "tests/support/private_host.h"
 
 using namespace cimple;
@@ -24,20 +23,13 @@ using testing::StartsWith;
 
 namespace {
 
-class TagMethods : public SimulatedHost {
+class TagMethods : public ServiceHost {
 protected:
     explicit TagMethods(const std::string& adapter_keys = "",
                         const std::string& port_keys = "dump_directory = \"/var/log\"\n")
+        : ServiceHost("[[adapter]]\n" + adapter_keys + "[[adapter.port]]\n" + port_keys +
+                      "[[adapter.tag]]\nsource = \"10000000C9A00001\"\ntarget = \"50060E8005A10000\"\ntag = 5\n")
     {
-        scenario("[[adapter]]\n" + adapter_keys + "[[adapter.port]]\n" + port_keys +
-                 "[[adapter.tag]]\nsource = \"10000000C9A00001\"\ntarget = \"50060E8005A10000\"\ntag = 5\n");
-        EXPECT_EQ(load(), 0);
-        refresh();
-    }
-    ~TagMethods() override
-    {
-        settle();
-        unload();
     }
 
     enum Way { get_flag, set_flag, get_table, set_table };
@@ -67,12 +59,10 @@ protected:
     }
     uint32 call(Way way) { return call(way, service(), port()); }
     Instance* service() { return agent().m_NVRHBA_FCTagService_map[0]; }
-    Instance* port() { return agent().m_NVRHBA_FCPort_map[0]; }
 
     NVRHBA_FCTagService_Provider provider;
     Property<uint32> state{};
     Property<String> uri;
-    std::vector<std::string> told;
 };
 
 constexpr auto ways = {0, 1, 2, 3};
