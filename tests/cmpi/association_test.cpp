@@ -150,6 +150,17 @@ TEST_F(Associations, AnAssociatorThatIsGoneIsPassedOver)
     EXPECT_THAT(returned().instances, IsEmpty());
 }
 
+TEST_F(Associations, AnAssociatorThatIsGoneLeavesTheOthers)
+{
+    broker.found = {{{"root/test", "TEST_Part", {}}, {{"Label", fake::string("whole")}}}};
+    for (const CMPIrc gone : {CMPI_RC_ERR_NOT_FOUND, CMPI_RC_OK}) { // with OK: no instance and no reason
+        returned() = {};
+        broker.gone = {"p1", gone};
+        EXPECT_EQ(associators(one), CMPI_RC_OK);
+        EXPECT_THAT(returned().instances, SizeIs(1));
+    }
+}
+
 class AssociationLog : public Runtime_Log, public Associations {};
 
 TEST_F(AssociationLog, AClassThatTheModuleDoesNotHaveHasNoResult)
@@ -333,6 +344,25 @@ TEST_F(Pairs, AnInstanceThatIsPairedWithItselfHasNoFarEnd)
 {
     provider.instances = [] { return std::vector<Instance*>{pair("one", "one")}; };
     EXPECT_THAT(associated_with("one"), IsEmpty());
+}
+
+TEST_F(Pairs, AnEndThatIsNullIsNeitherNearNorFar)
+{
+    const auto half = [](const char* left, const char* right) {
+        TEST_Pair* made = create_as<TEST_Pair>();
+        for (const auto& [end, name] : {std::pair(&made->Left, left), std::pair(&made->Right, right)})
+            if (name) {
+                *end = create_as<TEST_Base>();
+                (*end)->Name.set(String(name));
+            }
+        return made;
+    };
+    provider.instances = [&] {
+        return std::vector<Instance*>{half("one", nullptr), half(nullptr, "one"), half(nullptr, nullptr),
+                                      half("one", "two")};
+    };
+    EXPECT_THAT(associated_with("one"), testing::ElementsAre("two"));
+    EXPECT_THAT(associated_with("two"), testing::ElementsAre("one"));
 }
 
 class PlainClass : public Bridge_Test {};

@@ -436,7 +436,13 @@ void fill_services(Broker& broker)
     };
     broker.bft.getInstance = [](const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op, const char**,
                                 CMPIStatus* rc) -> CMPIInstance* {
-        note(mb, ctx, {"getInstance", path_content(op), {}, {}, {}});
+        const Path asked = path_content(op);
+        note(mb, ctx, {"getInstance", asked, {}, {}, {}});
+        const auto& gone = of(mb).gone;
+        if (!gone.id.empty() && find(asked.keys, "Id").text == gone.id) {
+            report(rc, gone.code);
+            return nullptr;
+        }
         const bool has_one = of(mb).answer == CMPI_RC_OK && !of(mb).found.empty();
         report(rc, has_one ? CMPI_RC_OK : CMPI_RC_ERR_NOT_FOUND);
         return has_one ? make_instance(of(mb), of(mb).found.front(), true) : nullptr;

@@ -115,6 +115,11 @@ public:
     // Up-calls: status and answer; what was asked is kept.
     CMPIrc answer = CMPI_RC_OK;
     std::vector<Instance> found;
+    /// getInstance gives none for the object whose key "Id" this is, with that status, which may be OK.
+    struct {
+        std::string id;
+        CMPIrc code = CMPI_RC_ERR_NOT_FOUND;
+    } gone;
     Value method_answer;
     Values method_out;
     struct Up_Call {

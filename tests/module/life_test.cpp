@@ -5,6 +5,8 @@
 #include <cstring>
 #include <dirent.h>
 #include <fstream>
+#include <set>
+#include <sstream>
 #include <string>
 #include <thread>
 #include <unistd.h>
@@ -97,6 +99,32 @@ TEST(Life, FourFactoriesAndThreeCleanupsLeaveTheProviderLoaded)
         EXPECT_THAT(rig.words(), contains_in_order({name + "_Provider::unload()", "ProviderAgent::releaseRef[1]",
                                                     "Entering the function ~ProviderAgent()", unloaded}));
     });
+}
+
+// 119 providers are of one make; each speaks under its own name and that of its own file.
+TEST(Life, EachProviderOfTheFamilySaysItsOwnNameInItsOwnFile)
+{
+    Rig rig({host::Manner::strict(), "small"});
+    ask_all(rig);
+    rig.stop();
+    std::set<std::string> enumerated, gone;
+    std::istringstream trace(read_file(trace_path));
+    for (std::string line; std::getline(trace, line);) {
+        const auto file = line.find("[derivedObjects/"), end = line.find(':', file);
+        if (file == std::string::npos) continue;
+        const std::string provider = line.substr(file + 16, end - file - 16); // <Class>_Provider
+        const std::string words = line.substr(line.find("] ", end) + 2);
+        if (words == provider + "::enum_instances()")
+            enumerated.insert(provider);
+        else if (words == provider + "::unload()")
+            gone.insert(provider);
+        else
+            ADD_FAILURE() << line;
+    }
+    EXPECT_EQ(enumerated.size(), 119u);
+    EXPECT_EQ(gone, enumerated);
+    for (const std::string& provider : enumerated)
+        EXPECT_TRUE(module_schema()->find(provider.substr(0, provider.rfind("_Provider")))) << provider;
 }
 
 TEST(Life, TheAgentLivesUntilTheLastProviderGoes)
