@@ -34,7 +34,7 @@ public:
 private:
     uint32 m_capacity = 1024;
     sint32 m_lastIndex = -1;
-    sint32 m_flag = 1;
+    [[maybe_unused]] sint32 m_flag = 1;
     std::vector<NVR_CIMLogEntry> m_entries;
 };
 

@@ -73,6 +73,22 @@ TEST(Scenario, WhatIsWrongIsToldWithFileLineAndReason)
     EXPECT_EQ(0u, refusal("a = 1\n[[adapter\n").find("bad.toml:2: ")) << "syntax";
 }
 
+TEST(Scenario, HeaderThatBeginsWithNoNameIsRefused)
+{
+    EXPECT_EQ("bad.toml:1: Error while parsing key: expected bare key starting character or string delimiter, saw '#'",
+              refusal("[#"));
+}
+
+TEST(Scenario, LetterBeyondAsciiOutsideOfQuotesIsRefused)
+{
+    EXPECT_EQ("bad.toml:2: Error while parsing key-value pair: expected '=', saw '\xc5\x80'", refusal("\nt\xc5\x80"));
+    EXPECT_EQ("bad.toml:2: Error while parsing decimal integer: expected digit, saw '\xc5\x80'",
+              refusal("\nt = 1\xc5\x80"));
+    EXPECT_EQ(
+        "bad.toml:2: Error while parsing root table: expected keys, tables, whitespace or comments, saw '\xc3\xa9'",
+        refusal("\n\xc3\xa9t\xc3\xa9 = 1"));
+}
+
 TEST(Scenario, RefusedOneLeavesNoAdaptersAndTheLibraryDown)
 {
     ASSERT_EQ(0, nvrsim_load_text("[[adapter]]", "good"));
