@@ -673,16 +673,11 @@ TEST_F(Alerts, WithoutMemoryEnablingLeavesNothingThatCannotBeTakenBack)
 {
     settle();
     int status = -1;
-    const long refused = refuse_each_allocation(
-        [&] {
-            auto handler = client.handler();
-            status = provider->enable_indications(std::move(handler));
-        },
-        [&](bool) {
-            nvrsim_clear_log();
-            EXPECT_EQ(disable(), 0);
-            EXPECT_EQ(nvrsim_callbacks(), 0u);
-        });
+    const long refused = refuse_each_allocation([&] { status = enable(); },
+                                                [&](bool) {
+                                                    EXPECT_EQ(disable(), 0);
+                                                    EXPECT_EQ(nvrsim_callbacks(), 0u);
+                                                });
     EXPECT_GT(refused, 5);
     EXPECT_EQ(status, 0);
     EXPECT_EQ(nvrsim_callbacks(), 2u) << "no port is taken for one that is registered";
@@ -699,9 +694,11 @@ TEST_F(Alerts, APortThatTwoAdaptersListIsToldOnce)
     ASSERT_EQ(agent().m_pData->getAdapters().size(), 2u);
     ASSERT_EQ(enable(), 0);
     EXPECT_EQ(nvrsim_callbacks(), 1u);
-    call_back(first_wwpn, link_down);
+    event("0", link_down);
     client.wait_for(1);
+    nvrsim_drain_events();
     EXPECT_EQ(disable(), 0);
+    EXPECT_EQ(client.count(), 1u);
     EXPECT_EQ(nvrsim_callbacks(), 0u);
 }
 
