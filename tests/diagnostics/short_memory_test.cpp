@@ -113,7 +113,7 @@ TEST_F(Short_Memory, AClearedLogCostsNoRecordOfAnotherTest)
     NVRHBA_DiagnosticsLog_Provider provider;
     const Ref<NVRHBA_DiagnosticsLog> log(create_as<NVRHBA_DiagnosticsLog>());
     log->InstanceID.set(internal_name);
-    Property<uint32> answer;
+    Property<uint32> answer = {0, 1};
     const auto act = [&] {
         answer = {77, 1};
         provider.ClearLog(log.get(), answer);

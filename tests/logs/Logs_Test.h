@@ -79,7 +79,7 @@ protected:
     template <class Call>
     cimple::uint32 answered(Call call)
     {
-        cimple::Property<cimple::uint32> value;
+        cimple::Property<cimple::uint32> value = {0, 1};
         m_result = call(value);
         settle();
         return value.null ? unset : value.value;

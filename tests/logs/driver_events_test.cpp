@@ -176,7 +176,7 @@ TEST_F(DriverEvents, WithoutMemoryTheLogShowsWhatWasRead)
     Property<uint16> enabled;
     enabled.set(uint16{2});
     CIM_ConcreteJob* job = nullptr;
-    Property<uint32> answer;
+    Property<uint32> answer = {0, 1};
     long thrown = 0;
     const long refused = refuse_each_allocation(
         [&] { provider.RequestStateChange(log.get(), enabled, job, {}, answer); },

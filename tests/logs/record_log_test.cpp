@@ -220,7 +220,7 @@ TEST_F(RecordLog, LevelsAndModesOutOfRangeChangeNothing)
 
 TEST_F(RecordLog, ArgumentsThatAreNotGivenAreOutOfRange)
 {
-    const Property<uint16> none{};
+    const Property<uint16> none = {0, 1};
     Property<uint16> given{};
     given.set(uint16{5});
     const auto ask = [&](const Property<uint16>& level, const Property<uint16>& mode) {

@@ -19,11 +19,21 @@ bool refuses()
 
 } // namespace
 
+// All that meet in one operator delete: a sanitizer has its own for each.
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept
+{
+    return refuses() ? nullptr : std::malloc(size ? size : 1);
+}
+
 void* operator new(std::size_t size)
 {
-    if (refuses()) throw std::bad_alloc();
-    if (void* block = std::malloc(size ? size : 1)) return block;
+    if (void* block = operator new(size, std::nothrow)) return block;
     throw std::bad_alloc();
+}
+
+void operator delete(void* block, const std::nothrow_t&) noexcept
+{
+    std::free(block);
 }
 
 void operator delete(void* block) noexcept
