@@ -126,8 +126,8 @@ public:
     void add(const Registration& registration);
     /// Registers every class of the schema for which the file exports factories, `<Class>_Provider_Create_<Kind>MI`
     /// or `<Class>_Create_<Kind>MI`; no code of the module runs. Classes are registered in `name_space`, and those of
-    /// profile registration also in "root/pg_interop". Result: how many classes; 0 with `error` filled if the file
-    /// cannot be read as a shared object.
+    /// profile registration also in "root/pg_interop" and "root/interop". Result: how many classes; 0 with `error`
+    /// filled if the file cannot be read as a shared object.
     std::size_t add_module(const std::string& file, const std::string& name_space = "root/norvane",
                            std::string* error = nullptr);
     /// Puts an instance into the server itself (namespace and class from its path; keys are taken from its properties

@@ -4,11 +4,13 @@
 #include "host/ProviderCall.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace host {
 namespace {
 
-constexpr const char* interop_name_space = "root/pg_interop";
+/// Clients know the interop namespace by either name.
+constexpr const char* interop_name_spaces[] = {"root/pg_interop", "root/interop"};
 
 /// Classes of profile registration are asked for in the interop namespace as well.
 bool is_for_interop(const Class_Record& record)
@@ -60,7 +62,9 @@ std::size_t Modules::add_module(const std::string& file, const std::string& name
         if (found == kinds.end()) found = kinds.find(record->name);
         if (found == kinds.end()) continue;
         Registration registration{record->name, found->first, file, found->second, {name_space}, false};
-        if (is_for_interop(*record)) registration.name_spaces.push_back(interop_name_space);
+        if (is_for_interop(*record))
+            registration.name_spaces.insert(registration.name_spaces.end(), std::begin(interop_name_spaces),
+                                            std::end(interop_name_spaces));
         add(registration);
         ++count;
     }

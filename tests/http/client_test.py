@@ -264,6 +264,7 @@ class WithWbemcli(unittest.TestCase):
         profiles = wbemcli("ein", url("root/pg_interop:CIM_RegisteredProfile"))
         self.assertEqual(sorted(bare(profiles)),
                          sorted(nvrcim("-n", "root/pg_interop", "names", "CIM_RegisteredProfile")["paths"]))
+        self.assertEqual(len(wbemcli("ein", url("root/interop:CIM_RegisteredProfile"))), len(profiles))
         of_adapters = [line for line in profiles if line.endswith('"NVR:Storage HBA"')]
         self.assertEqual(len(of_adapters), 1, profiles)
         conforming = wbemcli("ain", "-ac", "CIM_ElementConformsToProfile", object_url(of_adapters[0]))
