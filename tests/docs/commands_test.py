@@ -172,5 +172,36 @@ class Commands(unittest.TestCase):
             self.assertIn("Norvane Provider v", trace.read_text(encoding="utf-8", errors="replace"))
 
 
+class LogWords(unittest.TestCase):
+    MODULE = (BUILD / "lib/libnorvane_fc_provider.so").read_bytes()
+
+    def pieces(self, words):
+        """How many texts of the module the words are made of, longest first; none if some are not the module's."""
+        count = 0
+        while words:
+            size = next((size for size in range(len(words), 2, -1) if words[:size].encode() in self.MODULE), None)
+            if not size:
+                return None
+            words, count = words[size:], count + 1
+        return count
+
+    def test_the_words_to_look_for_are_those_that_the_module_logs(self):
+        quoted = []
+        for name in ("troubleshooting.md", "configuration.md"):
+            page = re.sub(r"^```.*?^```", "", (SOURCE / "docs" / name).read_text(encoding="utf-8"), flags=re.M | re.S)
+            quoted += [" ".join(words.split()) for words in re.findall(r'"([^"]{5,})"', page)]
+        self.assertGreater(len(quoted), 25)
+        for words in quoted:
+            # What differs from case to case stands as "..." or within brackets.
+            for part in re.split(r"\.\.\.|\[|\]", words):
+                with self.subTest(words=words):
+                    pieces = self.pieces(part)
+                    self.assertIsNotNone(pieces)
+                    self.assertLessEqual(pieces, 1 + len(part) // 12)
+
+    def test_other_words_are_found_out(self):
+        self.assertGreater(self.pieces("The adapter has gone fishing") or 99, 3)
+
+
 if __name__ == "__main__":
     unittest.main()

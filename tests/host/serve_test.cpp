@@ -419,6 +419,38 @@ TEST_F(Serve, TakesNoSubscriptionThatLeadsNowhere)
                                                          "</VALUE.NAMEDINSTANCE></IPARAMVALUE>")));
 }
 
+TEST_F(Serve, MakesASubscriptionOnceForClientsAtTheSameTime)
+{
+    const std::string filter = body_of(created(
+        "CIM_IndicationFilter", text_property("Name", "f") + text_property("Query", "SELECT * FROM TEST_Alert") +
+                                    text_property("SourceNamespace", "root/test")));
+    const std::string handler = body_of(created(
+        "CIM_ListenerDestination", text_property("Name", "h") + text_property("Destination", "http://localhost:1/")));
+    const std::string make =
+        created("CIM_IndicationSubscription", end_property("Filter", filter) + end_property("Handler", handler));
+    std::string name = body_of(make);
+    name = name.substr(name.find("<INSTANCENAME"));
+    name.resize(name.rfind("</INSTANCENAME>") + 15);
+    const std::string take_back =
+        intrinsic("DeleteInstance", "<IPARAMVALUE NAME=\"InstanceName\">" + name + "</IPARAMVALUE>");
+    EXPECT_EQ(0, code_of(take_back));
+    std::atomic<int> made{0}, taken_back{0};
+    std::vector<std::thread> clients;
+    for (int i = 0; i < 4; ++i)
+        clients.emplace_back([&] {
+            for (int k = 0; k < 50; ++k) {
+                made += code_of(make) == 0;
+                taken_back += code_of(take_back) == 0;
+            }
+        });
+    for (std::thread& client : clients)
+        client.join();
+    taken_back += code_of(take_back) == 0;
+    EXPECT_EQ(made, taken_back);
+    EXPECT_GT(made, 0);
+    EXPECT_EQ(6, code_of(take_back));
+}
+
 TEST_F(Serve, KeepsNoMoreFiltersThanItHasRoomFor)
 {
     int kept = 0;
