@@ -176,10 +176,10 @@ TEST_F(DriverParams, OfAPortThatIsNotLocalAreNone)
 TEST_F(DriverParams, OfANameThatIsNoneAreNone)
 {
     refresh();
-    for (const bool global : {false, true})
+    for (const bool is_global : {false, true})
         for (const char* name : {"", "10000000C9A0000", "10000000C9A0000G", "10:00:00:00:C9:A0:00:01"}) {
             words();
-            EXPECT_EQ(nvrcimGetDriverParam(agent(), name, global), 1u);
+            EXPECT_EQ(nvrcimGetDriverParam(agent(), name, is_global), 1u);
             EXPECT_THAT(words(), ElementsAre("NVR_MethodWrapper::nvrcimGetDriverParam()", "INVALID WWN")) << name;
         }
 }
