@@ -3,8 +3,8 @@
 /// A value of one thread. The library's count is not believed beyond the room that it had.
 #pragma once
 
+#include <memory>
 #include <new>
-#include <optional>
 #include <vector>
 
 #include "foundation/Library_List.h"
@@ -45,8 +45,9 @@ public:
 private:
     bool give(uint32 room)
     {
+        m_list.reset();
         try {
-            m_list.emplace(room);
+            m_list = std::make_unique<Library_List<List>>(room);
         } catch (const std::bad_alloc&) {
             return false;
         }
@@ -54,7 +55,7 @@ private:
         return true;
     }
 
-    std::optional<Library_List<List>> m_list;
+    std::unique_ptr<Library_List<List>> m_list; // null before fill
 };
 
 } // namespace cimple
