@@ -421,3 +421,18 @@ TEST(FailingCalls, ASlowLibraryStopsNobodyFromAskingForProfiles)
     EXPECT_EQ(rig.refreshes(), 0u);
     slow.join();
 }
+
+// The module is loaded, asked and unloaded by such a library, and afterwards by a sound one.
+TEST(FailingCalls, ALibraryThatThrowsAtItsStartOrEndIsOutlived)
+{
+    Rig rig({host::Manner::strict(), "small"});
+    for (const char* call : {"RM_InitLib", "HBA_LoadLibrary", "HBA_FreeLibrary", "CPQFC_*", "*"}) {
+        add_fault("call = \"" + std::string(call) + "\", throws = true");
+        rig.enumerate("NVRHBA_FCPort"); // answered, with what or why not
+        rig.restart();
+        clear_faults();
+        EXPECT_EQ(rig.enumerate("NVRHBA_FCPort").instances.size(), 1u) << call;
+        rig.restart();
+    }
+    EXPECT_EQ(nvrsim_open_handles(), 0u);
+}

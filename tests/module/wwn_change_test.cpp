@@ -53,30 +53,42 @@ Words restoring(unsigned type)
           "RestoreWWN operation initiated."}});
 }
 
+/// Has the library give each code; `told` makes the words of a call out of those of its activation.
+void expect_codes(const std::string& call, const std::vector<Code_Row>& rows, Called (*ask)(Wwn& wwn),
+                  Words (*told)(const Words& activation))
+{
+    Rig rig;
+    Wwn wwn(rig);
+    for (const Code_Row& row : rows) {
+        clear_faults();
+        add_fault(fault(call, "value = " + std::to_string(row.code)));
+        const Called called = ask(wwn);
+        EXPECT_THAT(called, returned(0)) << row.code;
+        expect_status(called, row.status);
+        EXPECT_EQ(called.words, told(row.words)) << row.code;
+    }
+}
+
 } // namespace
 
 TEST(WwnServiceChange, TellsEachActivationCode)
 {
-    Rig rig;
-    Wwn wwn(rig);
-    const Code_Row rows[] = {{5, {reboot, until_power_down}, 5},
-                             {6, {reboot}, 6},
-                             {7, {reset, until_power_down}, 7},
-                             {8, {reset}, 8},
-                             {0, {}, untold},
-                             {1, {}, untold},
-                             {4, {}, untold},
-                             {9, {}, untold},
-                             {97, {}, untold},
-                             {65541, {}, untold}};
-    for (const Code_Row& row : rows) {
-        clear_faults();
-        add_fault(fault("RM_ChangeWWN", "value = " + std::to_string(row.code)));
-        const Called called = wwn.change(0);
-        EXPECT_THAT(called, returned(0)) << row.code;
-        expect_status(called, row.status);
-        EXPECT_EQ(called.words, joined({changing(0), changed(row.words)})) << row.code;
-    }
+    expect_codes(
+        "RM_ChangeWWN",
+        {{5, {reboot, until_power_down}, 5},
+         {6, {reboot}, 6},
+         {7, {reset, until_power_down}, 7},
+         {8, {reset}, 8},
+         {0, {}, untold},
+         {1, {}, untold},
+         {4, {}, untold},
+         {9, {}, untold},
+         {97, {}, untold},
+         {65541, {}, untold}},
+        [](Wwn& wwn) { return wwn.change(0); },
+        [](const Words& activation) {
+            return joined({changing(0), changed(activation)});
+        });
 }
 
 TEST(WwnServiceChange, PassesEachStatusOfTheLibraryOn)
@@ -377,25 +389,21 @@ TEST(WwnServiceDuplicates, AreNotReadBehindTheList)
 
 TEST(WwnServiceRestore, TellsEachActivationCode)
 {
-    Rig rig;
-    Wwn wwn(rig);
-    const Code_Row rows[] = {{1, {"WWNs already active. No Restore needed"}, 1},
-                             {5, {restored, reboot, until_power_down}, 5},
-                             {6, {restored, reboot}, 6},
-                             {7, {restored, "Reset the HBA to activate the new setting", until_power_down}, 7},
-                             {8, {restored, "Please reset the HBA to activate the new setting"}, 8},
-                             {0, {}, untold},
-                             {2, {}, untold},
-                             {9, {}, untold},
-                             {65537, {}, untold}};
-    for (const Code_Row& row : rows) {
-        clear_faults();
-        add_fault(fault("RM_RestoreWWN", "value = " + std::to_string(row.code)));
-        const Called called = wwn.restore(1);
-        EXPECT_THAT(called, returned(0)) << row.code;
-        expect_status(called, row.status);
-        EXPECT_EQ(called.words, joined({restoring(1), row.words, {gate_refreshing}})) << row.code;
-    }
+    expect_codes(
+        "RM_RestoreWWN",
+        {{1, {"WWNs already active. No Restore needed"}, 1},
+         {5, {restored, reboot, until_power_down}, 5},
+         {6, {restored, reboot}, 6},
+         {7, {restored, "Reset the HBA to activate the new setting", until_power_down}, 7},
+         {8, {restored, "Please reset the HBA to activate the new setting"}, 8},
+         {0, {}, untold},
+         {2, {}, untold},
+         {9, {}, untold},
+         {65537, {}, untold}},
+        [](Wwn& wwn) { return wwn.restore(1); },
+        [](const Words& activation) {
+            return joined({restoring(1), activation, {gate_refreshing}});
+        });
 }
 
 TEST(WwnServiceRestore, TakesEveryRefusalOfTheLibraryForDone)

@@ -152,11 +152,14 @@ TEST_F(MemoryShortage, EndsTheBuildOfTheDumpClassesWithTheWordsOfWhatIsMissing)
                            });
     EXPECT_EQ(status, 0u);
     EXPECT_EQ(the_agent.m_NVRHBA_ElementDumpData_map.size(), 1u);
-    EXPECT_THAT(last_words,
-                IsSupersetOf({"Failed to create NVRHBA_DumpService", "Failed to create NVRHBA_HostedDumpService",
-                              "Failed to create NVRHBA_DumpServiceAffectsElement",
-                              "Failed to create NVRHBA_DumpData for fc port",
-                              "Failed to create NVRHBA_ElementDumpData for fc port"}));
+    EXPECT_THAT(
+        last_words,
+        IsSupersetOf(
+            {"Failed to create NVRHBA_DumpService", "Failed to create NVRHBA_HostedDumpService",
+             "Failed to create NVRHBA_DumpServiceAffectsElement", "Failed to create NVRHBA_DumpData for fc port",
+             "Failed to create NVRHBA_ElementDumpData for fc port", "Insert Failed : m_NVRHBA_DumpService_map",
+             "Insert Failed : m_NVRHBA_HostedDumpService_map", "Insert Failed : m_NVRHBA_DumpServiceAffectsElement_map",
+             "Insert Failed : m_NVRHBA_DumpData_map", "Insert Failed : m_NVRHBA_ElementDumpData_map"}));
 }
 
 TEST_F(MemoryShortage, EndsTheBuildOfTheVirtualPortsWithTheWordsOfWhatIsMissing)
@@ -167,7 +170,12 @@ TEST_F(MemoryShortage, EndsTheBuildOfTheVirtualPortsWithTheWordsOfWhatIsMissing)
     refuse_each_allocation([&] { NVR_PortVirtualization::CreatePortVirtualizationClasses(the_agent); },
                            [&](bool) { last_words.insert(words().back()); });
     EXPECT_EQ(the_agent.m_NVRHBA_ElementAllocatedFromPool_map.size(), 2u);
-    EXPECT_THAT(last_words, IsSupersetOf({"Failed to create ResourcePool", "Failed to create HostedResourcePool",
-                                          "Failed to create VirtualFCPort", "Failed to create VPortHostedDependency",
-                                          "Failed to create ElementAllocatedFromPool"}));
+    EXPECT_THAT(
+        last_words,
+        IsSupersetOf({"Failed to create ResourcePool", "Failed to create HostedResourcePool",
+                      "Failed to create VirtualFCPort", "Failed to create VPortHostedDependency",
+                      "Failed to create ElementAllocatedFromPool", "Insert Failed : m_NVRHBA_ResourcePool_map",
+                      "Insert Failed : m_NVRHBA_HostedResourcePool_map", "Insert Failed : m_NVRHBA_VirtualFCPort_map",
+                      "Insert Failed : m_NVRHBA_VPortHostedDependency_map",
+                      "Insert Failed : m_NVRHBA_ElementAllocatedFromPool_map"}));
 }
