@@ -1,6 +1,8 @@
 // What the services say and answer when memory runs out, piece by piece.
 #include <cstdlib>
+#include <filesystem>
 #include <set>
+#include <unistd.h>
 
 #include "classes/NVRHBA_DumpService.h"
 #include "foundation/NVR_Common.h"
@@ -10,6 +12,8 @@
 #include "services/NVR_PortVirtualization.h"
 #include "simulator/nvrsim.h"
 #include "tests/services/Service_Host.h"
+#include "tests/support/curl_libraries.h"
+#include "tests/support/private_host.h"
 #include "tests/support/short_memory.h"
 
 namespace {
@@ -30,6 +34,7 @@ void* __wrap_calloc(std::size_t count, std::size_t size)
 
 using namespace cimple;
 using namespace nvrtest;
+using testing::Contains;
 using testing::IsSupersetOf;
 
 namespace {
@@ -178,4 +183,38 @@ TEST_F(MemoryShortage, EndsTheBuildOfTheVirtualPortsWithTheWordsOfWhatIsMissing)
                       "Insert Failed : m_NVRHBA_HostedResourcePool_map", "Insert Failed : m_NVRHBA_VirtualFCPort_map",
                       "Insert Failed : m_NVRHBA_VPortHostedDependency_map",
                       "Insert Failed : m_NVRHBA_ElementAllocatedFromPool_map"}));
+}
+
+// Whatever of it is refused, the file is closed and the library given back.
+TEST_F(MemoryShortage, LeavesATransferWhereItIs)
+{
+    const std::string folder = "/var/log/here", uri = "file:///var/log/served/image";
+    make_folder(folder);
+    make_folder("/var/log/served");
+    write_file("/var/log/served/image", "the image");
+    ASSERT_EQ(::chdir(folder.c_str()), 0);
+    install_curl();
+    const String address = uri.c_str();
+    std::set<std::string> last_words;
+    bool fetched = false;
+    words();
+    refuse_each_allocation(
+        [&] {
+            uint32 slot = 0;
+            fetched = false;
+            NVR_MethodWrapper::downloadFileUsingCurl(address, slot, fetched);
+        },
+        [&](bool) {
+            last_words.insert(words().back());
+            for (const auto& descriptor : std::filesystem::directory_iterator("/proc/self/fd")) {
+                std::error_code gone;
+                const std::string open = std::filesystem::read_symlink(descriptor, gone);
+                EXPECT_NE(open.rfind(folder, 0), 0u) << open;
+            }
+        });
+    EXPECT_TRUE(fetched);
+    EXPECT_EQ(read_file(folder + "/image"), "the image");
+    // Without a place for the address the transfer ends in silence.
+    EXPECT_THAT(last_words, Contains("initialized the curl library to download from internet"));
+    EXPECT_EQ(::chdir("/"), 0);
 }
