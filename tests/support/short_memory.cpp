@@ -46,6 +46,27 @@ void operator delete(void* block, std::size_t) noexcept
     std::free(block);
 }
 
+// Of arrays too.
+void* operator new[](std::size_t size, const std::nothrow_t&) noexcept
+{
+    return operator new(size, std::nothrow);
+}
+
+void* operator new[](std::size_t size)
+{
+    return operator new(size);
+}
+
+void operator delete[](void* block) noexcept
+{
+    std::free(block);
+}
+
+void operator delete[](void* block, std::size_t) noexcept
+{
+    std::free(block);
+}
+
 namespace nvrtest {
 
 void refuse_allocation(long number)
