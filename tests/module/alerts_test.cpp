@@ -234,6 +234,7 @@ TEST_P(Alerts, AStopWaitsForTheDeliveryUnderWay)
     ASSERT_EQ(nvrsim_event(first_port, link_down, 0), 1);
     gate.wait_for_arrival();
     ASSERT_EQ(nvrsim_event(first_port, link_up, 0), 1);
+    rig.settle(); // a server that cleans up little waits for no refresh, whose thread is attached too
     std::atomic<bool> stopped{false};
     std::thread stops([&] {
         rig.stop();
