@@ -267,28 +267,29 @@ TEST_F(Lifecycle, AThreadThatCannotBeCreatedLeavesEmptyAnswersAndTheNextCallTrie
 TEST_F(Lifecycle, AThreadThatCannotBeCreatedKeepsTheOrderOfTheLocks)
 {
     ASSERT_EQ(load(), 0);
-    agent().m_bRefreshSANData = false;
+    ProviderAgent& the_agent = agent(); // to ask for it takes a lock too
+    the_agent.m_bRefreshSANData = false;
     refresh();
-    ASSERT_FALSE(agent().m_bIsSANMapsReady);
+    ASSERT_FALSE(the_agent.m_bIsSANMapsReady);
     std::promise<void> has_maps;
     std::thread enumeration;
     {
-        const Agent_Locks locks(agent(), cimple::Words::silent);
+        const Agent_Locks locks(the_agent, cimple::Words::silent);
         enumeration = std::thread([&] {
-            Auto_Mutex maps(agent().m_SANMapsReadyMutex);
+            Auto_Mutex maps(the_agent.m_SANMapsReadyMutex);
             has_maps.set_value();
-            Auto_Mutex data(agent().m_DataMutex);
+            Auto_Mutex data(the_agent.m_DataMutex);
         });
         has_maps.get_future().wait();
         no_more_threads = true;
-        agent().m_bAdapterRefreshPending.ask();
-        EXPECT_EQ(agent().BuildCimpleInfo(), 0);
-        EXPECT_FALSE(agent().m_bDataFetchRunning);
+        the_agent.m_bAdapterRefreshPending.ask();
+        EXPECT_EQ(the_agent.BuildCimpleInfo(), 0);
+        EXPECT_FALSE(the_agent.m_bDataFetchRunning);
     }
     enumeration.join();
     // Once the lock is free, the flag goes up, and whoever waited would not wait on.
-    agent().BuildCimpleInfo();
-    EXPECT_TRUE(agent().m_bIsSANMapsReady);
+    the_agent.BuildCimpleInfo();
+    EXPECT_TRUE(the_agent.m_bIsSANMapsReady);
     no_more_threads = false;
     settle();
     unload();
