@@ -103,14 +103,7 @@ void make_absent(MI_Table_Set* set)
     set->adapter = nullptr;
 }
 
-// One more, unless nobody is counted any longer.
-bool count_in(std::atomic<uint32>& count)
-{
-    uint32 found = count.load(std::memory_order_relaxed);
-    while (found != 0)
-        if (count.compare_exchange_weak(found, found + 1, std::memory_order_relaxed)) return true;
-    return false;
-}
+thread_local Running_Call* innermost_call = nullptr;
 
 } // namespace
 
@@ -120,7 +113,7 @@ bool count_in(std::atomic<uint32>& count)
 CMPI_Adapter::CMPI_Adapter(MI_Table_Set* tables, const Registration* registration, const CMPIBroker* broker)
     : registration(registration), proc(registration->proc), provider(nullptr), broker(broker), static_data(tables),
       load_count(0), allow_unload(true), meta_class(nullptr), indications_enabled(false), lock(true),
-      filters_lock(false), m_users(1), m_calls(1)
+      filters_lock(false), m_users(1)
 {
     call(OP_CREATE_PROVIDER, &provider);
 }
@@ -150,17 +143,22 @@ CMPI_Adapter::~CMPI_Adapter()
 
 bool CMPI_Adapter::hold()
 {
-    return count_in(m_users);
+    uint32 users = m_users.load(std::memory_order_relaxed);
+    while (users != 0)
+        if (m_users.compare_exchange_weak(users, users + 1, std::memory_order_relaxed)) return true;
+    return false;
 }
 
-bool CMPI_Adapter::begin_call()
+void CMPI_Adapter::unload()
 {
-    return count_in(m_calls);
-}
-
-void CMPI_Adapter::end_call()
-{
-    if (m_calls.fetch_sub(1, std::memory_order_acq_rel) == 1) call(OP_UNLOAD, provider);
+    {
+        const Undisturbed undisturbed; // nobody else would unload it
+        Auto_Mutex locked(m_calls_mutex);
+        while (m_calls > Running_Call::own(*this))
+            m_call_ended.wait(m_calls_mutex);
+        m_unloaded = true;
+    }
+    call(OP_UNLOAD, provider);
 }
 
 void CMPI_Adapter::give_back()
@@ -193,14 +191,30 @@ void Adapter_Use::give_back()
     if (CMPI_Adapter* adapter = release()) adapter->give_back();
 }
 
+Running_Call::Running_Call(CMPI_Adapter& adapter) : m_outer(innermost_call)
+{
+    Auto_Mutex locked(adapter.m_calls_mutex);
+    if (adapter.m_unloaded) return;
+    adapter.m_calls++;
+    m_adapter = &adapter;
+    innermost_call = this;
+}
+
 Running_Call::~Running_Call()
 {
     if (!m_adapter) return;
-    const Undisturbed undisturbed;
-    guarded([&] {
-        m_adapter->end_call();
-        return CMPI_RC_OK;
-    });
+    innermost_call = m_outer;
+    Auto_Mutex locked(m_adapter->m_calls_mutex);
+    m_adapter->m_calls--;
+    m_adapter->m_call_ended.broadcast();
+}
+
+uint32 Running_Call::own(const CMPI_Adapter& adapter)
+{
+    uint32 count = 0;
+    for (const Running_Call* call = innermost_call; call; call = call->m_outer)
+        count += call->m_adapter == &adapter;
+    return count;
 }
 
 // --- Factory
@@ -290,7 +304,7 @@ CMPIStatus cleanup(const MI* mi, const CMPIContext* context, CMPIBoolean termina
             log_return("cleanup decrement", CMPI_RC_OK);
             return CMPI_RC_OK;
         }
-        adapter->end_call();
+        adapter->unload();
         log_return("cleanup unload", CMPI_RC_OK);
         adapter.give_back();
         return CMPI_RC_OK;

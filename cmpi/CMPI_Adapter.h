@@ -91,11 +91,10 @@ public:
     /// Counts a user out; the last one destroys the adapter.
     void give_back();
 
-    /// Counts a call of the provider in. False if the provider has been unloaded.
-    bool begin_call();
-    /// Counts a call out, and at the last clean-up the table. The last of them all unloads the provider, on its thread
-    /// and in its context: no call runs in a provider that has been unloaded. Throws what the unload throws.
-    void end_call();
+    /// Waits until no other thread's call runs in the provider, and unloads it: whoever comes later finds it unloaded.
+    /// Once, after the adapter has left its table. No lock may be held that a call needs. Throws what the unload
+    /// throws.
+    void unload();
 
 private:
     ~CMPI_Adapter();
@@ -109,9 +108,14 @@ private:
             return const_cast<void*>(static_cast<const void*>(pointer));
     }
 
+    friend class Running_Call;
+
     std::atomic<uint32> m_users;
-    std::atomic<uint32> m_calls; // and one of the table's
-    bool m_started = false;      // wholly built: only such an adapter has an end to tell of
+    Mutex m_calls_mutex{false}; // innermost; guards the next three
+    Cond m_call_ended;
+    uint32 m_calls = 0; // that run
+    bool m_unloaded = false;
+    bool m_started = false; // wholly built: only such an adapter has an end to tell of
 };
 
 /// One count of an adapter: of a table set's for the length of a call, or none.
@@ -139,15 +143,18 @@ private:
 /// A call of an adapter's provider, for a scope within the thread's context; or none, if the provider is unloaded.
 class Running_Call {
 public:
-    explicit Running_Call(CMPI_Adapter& adapter) : m_adapter(adapter.begin_call() ? &adapter : nullptr) {}
+    explicit Running_Call(CMPI_Adapter& adapter);
     ~Running_Call();
     Running_Call(const Running_Call&) = delete;
     Running_Call& operator=(const Running_Call&) = delete;
 
     explicit operator bool() const { return m_adapter != nullptr; }
+    /// How many of this thread are calls of that adapter, one inside the other.
+    static uint32 own(const CMPI_Adapter& adapter);
 
 private:
-    CMPI_Adapter* m_adapter;
+    CMPI_Adapter* m_adapter = nullptr;
+    Running_Call* m_outer;
 };
 
 /// Holds a table set's mutex for a scope.

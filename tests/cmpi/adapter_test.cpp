@@ -314,15 +314,20 @@ TEST_F(Adapter, TheProviderOutlivesACleanUpWhileARequestRuns)
     };
     std::thread request([&] { EXPECT_EQ(names(mi), CMPI_RC_OK); });
     started.get_future().wait();
-    EXPECT_EQ(clean(), CMPI_RC_OK);
-    EXPECT_EQ(provider.unloaded, 0); // under the request that runs in it
-    EXPECT_EQ(provider.destroyed, 0);
-    EXPECT_EQ(tables.adapter, nullptr);
-
+    std::thread last([&] { EXPECT_EQ(clean(), CMPI_RC_OK); });
+    const auto in_table = [&] {
+        Tables_Lock locked(&tables);
+        return tables.adapter != nullptr;
+    };
+    while (in_table())
+        std::this_thread::yield();
     create('I'); // a new one, beside the old
     EXPECT_EQ(provider.created, 2);
+    EXPECT_EQ(provider.unloaded, 0); // under the request that runs in it
+    EXPECT_EQ(provider.destroyed, 0);
     go.set_value();
     request.join();
+    last.join();
     EXPECT_EQ(provider.unloaded, 1);
     EXPECT_EQ(provider.destroyed, 1);
     EXPECT_EQ(tables.magic, 0x5DE2B131u);

@@ -1,4 +1,5 @@
 // The module's life in a server: counters of factories and cleanups, what stays behind an unload, and what does not.
+#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <cstdlib>
@@ -189,7 +190,7 @@ TEST(Life, ACallAfterTheLastCleanupIsAnsweredPolitely)
     EXPECT_EQ(rig.count_words(unloaded), 1u);
 }
 
-TEST(Life, TheLastCleanupUnderARequestUnloadsBehindIt)
+TEST(Life, TheLastCleanupWaitsForARequest)
 {
     Rig rig;
     Entries entries;
@@ -203,12 +204,14 @@ TEST(Life, TheLastCleanupUnderARequestUnloadsBehindIt)
             std::this_thread::yield();
         for (int of_ours_and_the_server = 0; of_ours_and_the_server < 5; of_ours_and_the_server++)
             EXPECT_EQ(ports->ft->cleanup(ports, context, 1).rc, CMPI_RC_OK);
-        EXPECT_THAT(rig.words(), Not(Contains(released)));
         request.join();
         EXPECT_THAT(answer, succeeded());
         EXPECT_EQ(answer.instances.size(), 4u);
     });
-    EXPECT_THAT(rig.words(), Contains(released).Times(1));
+    const std::vector<std::string> words = rig.words();
+    const auto end = std::find(words.begin(), words.end(), "PERF: updateAdapterMaps: cleanExit");
+    EXPECT_THAT(std::vector(words.begin(), end), Not(Contains(released)));
+    EXPECT_THAT(std::vector(end, words.end()), Contains(released).Times(1));
     rig.stop();
     EXPECT_EQ(rig.count_words(unloaded), 1u);
     EXPECT_EQ(nvrsim_open_handles(), 0u);
