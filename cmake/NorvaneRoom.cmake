@@ -16,7 +16,8 @@ function(norvane_test_headers)
 endfunction()
 
 # norvane_test(NAME SOURCES... [LINK libs...] [TIMEOUT s] [MANNERS name...]): a GoogleTest program; each test runs in a
-# process of its own, since much of what is tested lives once a process. Under a sanitizer it may take five times as long.
+# process of its own, since much of what is tested lives once a process. Under a sanitizer, or with coverage, it may take
+# five times as long.
 # Its tests run once more in each of MANNERS, but for those that have a parameter (most often a manner) or start a server
 # that takes its manner as an argument, and those that read the module's file. The thread sanitizer sees them in one manner.
 function(norvane_test name)
@@ -24,7 +25,7 @@ function(norvane_test name)
   if(NOT TEST_TIMEOUT)
     set(TEST_TIMEOUT 60)
   endif()
-  if(NORVANE_SANITIZE)
+  if(NORVANE_SANITIZE OR NORVANE_COVERAGE)
     math(EXPR TEST_TIMEOUT "${TEST_TIMEOUT} * 5")
   endif()
   add_executable(${name} ${TEST_SOURCES})

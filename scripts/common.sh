@@ -13,7 +13,8 @@ packages="g++ cmake ninja-build ccache binutils libhbaapi-dev libhbaapi2 librapi
     libcurl4 python3 python3-pyftpdlib openssl lintian dpkg-dev rpm
     libmicrohttpd-dev libpugixml-dev libcurl4-openssl-dev sblim-wbemcli graphviz"
 
-# What fuzz/run needs beside them: clang with libFuzzer, and llvm-symbolizer. No check is built by clang.
+# What fuzz/run and scripts/coverage need beside them: clang with its run-time libraries, and LLVM's tools. No check is
+# built by clang.
 # shellcheck disable=SC2034
 clang_packages="clang llvm libclang-rt-14-dev"
 

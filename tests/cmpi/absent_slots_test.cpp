@@ -20,7 +20,7 @@ protected:
             return std::vector<Instance*>{thing};
         };
         provider.on[OP_CREATE_INSTANCE] = provider.on[OP_MODIFY_INSTANCE] = [](void**) { return 0; };
-        provider.on[OP_INVOKE_METHOD] = [this](void** words) {
+        provider.on[OP_INVOKE_METHOD] = [](void** words) {
             up_calls();
             auto* call = static_cast<TEST_Thing_Echo*>(words[2]);
             call->Reply.set(String("r"));
