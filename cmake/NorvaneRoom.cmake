@@ -19,7 +19,7 @@ endfunction()
 # process of its own, since much of what is tested lives once a process. Under a sanitizer, or with coverage, it may take
 # five times as long.
 # Its tests run once more in each of MANNERS, but for those that have a parameter (most often a manner) or start a server
-# that takes its manner as an argument, and those that read the module's file. The thread sanitizer sees them in one manner.
+# that takes its manner as an argument, and those that read the module's file. The sanitizers see them in one manner.
 function(norvane_test name)
   cmake_parse_arguments(TEST "" "TIMEOUT" "SOURCES;LINK;ENVIRONMENT;MANNERS" ${ARGN})
   if(NOT TEST_TIMEOUT)
@@ -35,7 +35,7 @@ function(norvane_test name)
   endif()
   gtest_discover_tests(${name} TEST_PREFIX "${name}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST
     PROPERTIES TIMEOUT ${TEST_TIMEOUT} ENVIRONMENT "${TEST_ENVIRONMENT}")
-  if(NORVANE_SANITIZE STREQUAL "thread")
+  if(NORVANE_SANITIZE)
     set(TEST_MANNERS "")
   endif()
   foreach(manner IN LISTS TEST_MANNERS)

@@ -15,6 +15,12 @@
 
 namespace cimple {
 
+namespace {
+
+using Mapping = std::unique_ptr<HBA_FCPTARGETMAPPING, decltype(&std::free)>;
+
+} // namespace
+
 Port::Port(Adapter* adapter) : m_adapter(adapter) {}
 
 Port::~Port() noexcept(false)
@@ -79,7 +85,7 @@ void FCPort::rescanTargets(Adapter* adapter)
     HBA_FCPTARGETMAPPING* mapping = nullptr;
     const uint32 status = getTargetMapping(handle, &mapping);
     if (!mapping) return;
-    const std::unique_ptr<HBA_FCPTARGETMAPPING, decltype(&std::free)> owner(mapping, &std::free);
+    const Mapping owner(mapping, &std::free);
     if (mapping->NumberOfEntries == 0) {
         NVR_LOG("HBA_GetFcpTargetMapping_t() found no target mappings");
         return;
@@ -102,24 +108,23 @@ uint32 FCPort::getTargetMapping(HBA_HANDLE handle, HBA_FCPTARGETMAPPING** mappin
     constexpr uint32 max_capacity = 1u << 20; // the library may name any number; for more there is no memory
     uint32 capacity = 256;
     uint32 status = HBA_STATUS_ERROR;
-    HBA_FCPTARGETMAPPING* buffer = nullptr;
+    Mapping buffer(nullptr, &std::free);
     *mapping = nullptr;
     for (int attempts = 0; attempts < 3; attempts++) {
         NVR_LOG("To retry the HBA_GetFcpTargetMapping command");
         if (buffer) {
             NVR_LOG("Deleting the allocated memory");
-            std::free(buffer);
-            buffer = nullptr;
+            buffer.reset();
         }
         if (capacity <= max_capacity)
-            buffer = static_cast<HBA_FCPTARGETMAPPING*>(
-                std::calloc(1, offsetof(HBA_FCPTARGETMAPPING, entry) + capacity * sizeof(HBA_FCPSCSIENTRY)));
+            buffer.reset(static_cast<HBA_FCPTARGETMAPPING*>(
+                std::calloc(1, offsetof(HBA_FCPTARGETMAPPING, entry) + capacity * sizeof(HBA_FCPSCSIENTRY))));
         if (!buffer) {
             NVR_LOG("Could not allocate memory..break ");
             return status;
         }
         buffer->NumberOfEntries = capacity;
-        status = HBA_GetFcpTargetMapping(handle, buffer);
+        status = HBA_GetFcpTargetMapping(handle, buffer.get());
         if (status == HBA_STATUS_OK) {
             NVR_LOG("All Ok ...break ");
             if (buffer->NumberOfEntries > capacity) buffer->NumberOfEntries = capacity;
@@ -132,12 +137,12 @@ uint32 FCPort::getTargetMapping(HBA_HANDLE handle, HBA_FCPTARGETMAPPING** mappin
             capacity = buffer->NumberOfEntries;
             NVR_LOG("Increasing the buffer to = %d", static_cast<int>(capacity));
         } else {
-            std::free(buffer);
+            buffer.reset();
             NVR_LOG("Error hbaStatus=%d", static_cast<int>(status));
             return status;
         }
     }
-    *mapping = buffer;
+    *mapping = buffer.release();
     NVR_LOG("Successful target info fetched"); // also behind three attempts without success
     return status;
 }

@@ -235,6 +235,7 @@ TEST_F(DriverParams, OfAPortThatNobodyPublishesEndTheirList)
     scenario("[[adapter]]\nports = 2\n");
     refresh();
     agent().m_NVRHBA_DriverServiceElementSettingData_map.clear();
+    const Ref<Instance> gone(agent().m_NVRHBA_FCPort_map[0]);
     agent().m_NVRHBA_FCPort_map.remove_at(0);
     EXPECT_THAT(read_again(local, 1).back(), "Data Structure is corrupted...");
     EXPECT_EQ(agent().m_NVRHBA_DriverParams_map.size(), 1u) << "the first parameter is there, without its port";
