@@ -393,7 +393,8 @@ TEST_P(EveryService, TakesTurnsWithAllOthers)
         EXPECT_EQ(clients[i].get(), rounds) << name_of(all[i]);
     host.rig.settle();
     const std::size_t turned = turns(host.rig.lines_from(before));
-    EXPECT_LE(turned, rounds * all.size());
+    // What a method says behind the locks may come after another's beginning: two stretches a call at most.
+    EXPECT_LE(turned, 2 * rounds * all.size());
     EXPECT_GT(turned, 1u);
     EXPECT_THAT(host.rig.server().report().violations, IsEmpty());
 }
