@@ -127,9 +127,9 @@ std::vector<const host::Manner*> every_manner();
                              [](const auto& info) { return nvrtest::manner_label(*info.param); })
 /// For tests whose threads meet.
 #define NVR_THREADS_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(nvrtest::every_manner(), suite)
-/// For tests that ask one thing after the other: the thread sanitizer, which takes ten times as long, sees them in the
-/// strict manner alone.
-#ifdef __SANITIZE_THREAD__
+/// For tests that ask one thing after the other: the sanitizers, under which they take up to ten times as long, see them
+/// in the strict manner alone.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
 #define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(std::vector{&host::Manner::strict()}, suite)
 #else
 #define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(nvrtest::every_manner(), suite)
