@@ -20,7 +20,19 @@ uint64_t processor_nanoseconds()
 
 } // namespace
 
-Call::Call(Call_Id id, const Subject& subject) : m_simulator(Simulator::instance()), m_lock(m_simulator.mutex), m_id(id)
+Call::Under_Way::Under_Way(Simulator& simulator, Call_Id id)
+    : m_simulator(std::strncmp(to_text(id), "RM_", 3) == 0 ? &simulator : nullptr)
+{
+    if (m_simulator) m_simulator->mostAtOnce = std::max(m_simulator->mostAtOnce, ++m_simulator->underWay);
+}
+
+Call::Under_Way::~Under_Way()
+{
+    if (m_simulator) --m_simulator->underWay;
+}
+
+Call::Call(Call_Id id, const Subject& subject)
+    : m_simulator(Simulator::instance()), m_lock(m_simulator.mutex), m_id(id), m_underWay(m_simulator, id)
 {
     if (m_simulator.timesCalls) m_start = processor_nanoseconds();
     resolve(subject);

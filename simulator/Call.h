@@ -90,9 +90,22 @@ private:
     void resolve(const Subject& subject);
     bool matches(const Fault& fault, const char* name, const Subject& subject) const;
 
+    // Counts a call of the management library for as long as it is under way; made and ended under the lock.
+    class Under_Way {
+    public:
+        Under_Way(Simulator& simulator, Call_Id id);
+        ~Under_Way();
+        Under_Way(const Under_Way&) = delete;
+        Under_Way& operator=(const Under_Way&) = delete;
+
+    private:
+        Simulator* m_simulator; // null: of another library
+    };
+
     Simulator& m_simulator;
     std::unique_lock<std::mutex> m_lock;
     const Call_Id m_id;
+    const Under_Way m_underWay;
     Fault m_fault; // a copy: the list may change during a delay
     Adapter* m_adapter = nullptr;
     Port* m_port = nullptr;

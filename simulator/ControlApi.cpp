@@ -9,6 +9,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <cstring>
+#include <utility>
 
 using namespace nvrsim;
 
@@ -112,6 +113,13 @@ NVRSIM_EXPORT uint64_t nvrsim_calls(const char* operation)
     for (size_t i = 0; i < static_cast<size_t>(Call_Id::count); ++i)
         if (!operation || std::strcmp(operation, to_text(static_cast<Call_Id>(i))) == 0) calls += simulator.counters[i];
     return calls;
+}
+
+NVRSIM_EXPORT size_t nvrsim_most_at_once(void)
+{
+    Simulator& simulator = Simulator::instance();
+    std::lock_guard<std::mutex> lock(simulator.mutex);
+    return std::exchange(simulator.mostAtOnce, simulator.underWay);
 }
 
 NVRSIM_EXPORT void nvrsim_time_calls(int on)

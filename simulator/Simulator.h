@@ -49,6 +49,8 @@ struct Simulator {
     uint64_t counters[static_cast<size_t>(Call_Id::count)] = {};
     std::deque<Log_Entry> log; // the newest; bounded
     uint64_t refreshes = 0;
+    size_t underWay = 0;   // calls of the management library
+    size_t mostAtOnce = 0; // of them, since that was last asked
     bool timesCalls = false;
     uint64_t callNanoseconds = 0; // processor time of calls while they are timed
 

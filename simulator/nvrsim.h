@@ -34,6 +34,9 @@ size_t nvrsim_faults(char* buffer, size_t size);
 
 /* Calls of one operation since the load, e.g. "RM_GetVPD"; 0 for an unknown name. With a null name, of all. */
 uint64_t nvrsim_calls(const char* operation);
+/* The most calls of the management library (RM_...) that were under way at once, since the load or since this was last
+ * asked. Only a delay lets one begin while another goes on. */
+size_t nvrsim_most_at_once(void);
 /* Whether calls are timed from now on (they are not at first: it costs more than some calls), and the processor time in
  * seconds that timed ones have taken since: what a caller measures can be told from what the libraries cost. */
 void nvrsim_time_calls(int on);

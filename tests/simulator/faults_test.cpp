@@ -97,6 +97,23 @@ TEST_F(Faults, ADelayIsOverWhenTheFaultsAreCleared)
     EXPECT_EQ(0u, driver_type(port0));
 }
 
+TEST_F(Faults, CallsThatAreUnderWayAtOnceAreCounted)
+{
+    EXPECT_EQ(0u, driver_type(port0));
+    EXPECT_EQ(1u, nvrsim_most_at_once());
+    EXPECT_EQ(0u, nvrsim_most_at_once());
+    fault("call = 'RM_GetDriverType', delay_ms = 60000, times = 2");
+    std::thread first([] { driver_type(port0); });
+    std::thread second([] { driver_type(port0); });
+    while (nvrsim_calls("RM_GetDriverType") < 3)
+        std::this_thread::yield();
+    nvrsim_clear_faults(); // which ends the delays
+    first.join();
+    second.join();
+    EXPECT_EQ(2u, nvrsim_most_at_once());
+    EXPECT_EQ(0u, nvrsim_most_at_once());
+}
+
 TEST_F(Faults, GarbageIsTheSameEachTimeAndStaysInTheBuffer)
 {
     fault("call = 'RM_GetHBAAttributes', damage = 'garbage'");
