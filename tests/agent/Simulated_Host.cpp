@@ -173,6 +173,12 @@ SimulatedHost::Instances SimulatedHost::san(const Instance_Map& map)
     return all;
 }
 
+Ref<Instance> LoadedHost::only(const Instances& all, const Instance_Map& map)
+{
+    EXPECT_EQ(all.size(), 1u);
+    return all.size() == 1 ? all[0] : Ref<Instance>(create(map.meta_class(), true));
+}
+
 std::vector<std::string> SimulatedHost::words()
 {
     CLogger::Hold hold;

@@ -84,6 +84,26 @@ private:
     long m_fetching = 0; // fetch threads that the forgotten words left running
 };
 
+/// Such a host with one provider loaded.
+class LoadedHost : public SimulatedHost {
+protected:
+    LoadedHost() { EXPECT_EQ(load(), 0); }
+    ~LoadedHost() override
+    {
+        settle();
+        unload();
+    }
+
+    /// The only instance of a map of the adapter side, or of the SAN's; otherwise a failure and an empty one.
+    Ref<Instance> only(const cimple::Instance_Map& map) { return only(plain(map), map); }
+    Ref<Instance> onlySAN(const cimple::Instance_Map& map) { return only(san(map), map); }
+    /// A host of one adapter with one port of these keys.
+    static void port(const std::string& keys) { scenario("[[adapter]]\n[[adapter.port]]\n" + keys); }
+
+private:
+    static Ref<Instance> only(const Instances& all, const cimple::Instance_Map& map);
+};
+
 /// The value of a property as text: arrays as "{a,b}", null as "null".
 std::string value(const Instance* instance, const char* property);
 /// The same of a key of the end that a reference names.

@@ -18,23 +18,7 @@ using testing::SizeIs;
 
 namespace {
 
-class AdapterUpdate : public SimulatedHost {
-protected:
-    AdapterUpdate() { EXPECT_EQ(load(), 0); }
-    ~AdapterUpdate() override
-    {
-        settle();
-        unload();
-    }
-
-    /// The only instance of a map.
-    Ref<Instance> only(const Instance_Map& map)
-    {
-        const Instances all = plain(map);
-        EXPECT_EQ(all.size(), 1u);
-        return all.empty() ? Ref<Instance>(create(map.meta_class(), true)) : all[0];
-    }
-};
+using AdapterUpdate = LoadedHost;
 
 std::string host_name()
 {

@@ -18,16 +18,8 @@ using testing::SizeIs;
 
 namespace {
 
-class DriverParams : public SimulatedHost {
+class DriverParams : public LoadedHost {
 protected:
-    DriverParams() { EXPECT_EQ(load(), 0); }
-    ~DriverParams() override
-    {
-        settle();
-        unload();
-    }
-
-    void port(const std::string& keys) { scenario("[[adapter]]\n[[adapter.port]]\n" + keys); }
     Instances globals() { return plain(agent().m_NVRHBA_DriverParamGlobal_map); }
     Instances locals() { return plain(agent().m_NVRHBA_DriverParams_map); }
 

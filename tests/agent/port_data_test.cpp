@@ -14,22 +14,8 @@ using testing::SizeIs;
 
 namespace {
 
-class PortData : public SimulatedHost {
+class PortData : public LoadedHost {
 protected:
-    PortData() { EXPECT_EQ(load(), 0); }
-    ~PortData() override
-    {
-        settle();
-        unload();
-    }
-
-    void port(const std::string& keys) { scenario("[[adapter]]\n[[adapter.port]]\n" + keys); }
-    Ref<Instance> only(const Instance_Map& map)
-    {
-        const Instances all = plain(map);
-        EXPECT_EQ(all.size(), 1u);
-        return all.size() == 1 ? all[0] : Ref<Instance>(create(map.meta_class(), true));
-    }
     Ref<Instance> transceiver(const std::string& keys)
     {
         port("transceiver = { " + keys + " }\n");

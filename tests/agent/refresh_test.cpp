@@ -22,15 +22,7 @@ constexpr const char* already_running = "PERF: ---DataFetch_Handler thread alrea
 constexpr const char* building_adapters = "PERF: Building Adapter Data...";
 constexpr const char* building_targets = "PERF: Building SAN Data...";
 
-class Refresh : public SimulatedHost {
-protected:
-    Refresh() { EXPECT_EQ(load(), 0); }
-    ~Refresh() override
-    {
-        settle();
-        unload();
-    }
-};
+using Refresh = LoadedHost;
 
 long count(const std::vector<std::string>& words, const char* word)
 {

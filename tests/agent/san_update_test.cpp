@@ -39,26 +39,13 @@ Instance* first(const Instance_Map& map)
 
 constexpr const char* target_wwpn = "50060E8005A10000";
 
-class SANUpdate : public SimulatedHost {
+class SANUpdate : public LoadedHost {
 protected:
-    SANUpdate() { EXPECT_EQ(load(), 0); }
-    ~SANUpdate() override
-    {
-        settle();
-        unload();
-    }
-
-    Ref<Instance> only(const Instance_Map& map)
-    {
-        const Instances all = san(map);
-        EXPECT_EQ(all.size(), 1u);
-        return all.size() == 1 ? all[0] : Ref<Instance>(create(map.meta_class(), true));
-    }
     /// The only volume, disk, ... of a scenario of one unit.
     Ref<Instance> only_unit(const Instance_Map& map, const std::string& keys)
     {
         scenario(unit(keys));
-        return only(map);
+        return onlySAN(map);
     }
     std::vector<std::string> all(const Instance_Map& map, const char* property)
     {
@@ -123,7 +110,7 @@ TEST_F(SANUpdate, AnEndpointShowsTheTargetBehindThePort)
 {
     scenario(unit("number = 5\nserial = \"S0001\"\nos_device_name = \"/dev/sdx\"\n"));
     refresh();
-    expect_rows(only(agent().m_NVRHBA_SCSIProtocolEndpoint_map).get(),
+    expect_rows(onlySAN(agent().m_NVRHBA_SCSIProtocolEndpoint_map).get(),
                 {
                     {"TargetWWPN", target_wwpn},
                     {"TargetWWNN", "50060E8005A1FF00"},
@@ -312,12 +299,12 @@ TEST_F(SANUpdate, AUnitIsTiedToTheHostTheEndpointAndTheInitiator)
     };
     for (const auto& row : rows) {
         SCOPED_TRACE(row.units.meta_class()->name);
-        const std::string id = value(only(row.units).get(), "DeviceID");
-        const Ref<Instance> device = only(row.devices);
+        const std::string id = value(onlySAN(row.units).get(), "DeviceID");
+        const Ref<Instance> device = onlySAN(row.devices);
         expect_rows(device.get(), {});
         EXPECT_EQ(end(device.get(), "GroupComponent", "Name"), host);
         EXPECT_EQ(end(device.get(), "PartComponent", "DeviceID"), id);
-        const Ref<Instance> path = only(row.paths);
+        const Ref<Instance> path = onlySAN(row.paths);
         expect_rows(path.get(), {});
         EXPECT_EQ(end(path.get(), "LogicalUnit", "DeviceID"), id);
         EXPECT_EQ(end(path.get(), "Target", "Name"), std::string(first_wwpn) + ":" + target_wwpn + ":" + row.lun);
@@ -417,7 +404,7 @@ TEST_F(SANUpdate, AnEUIIsPrintedAnew)
     EXPECT_EQ(update(), 0u);
     const std::vector<std::string> told = update_words();
     EXPECT_EQ(std::count(told.begin(), told.end(), "Entered"), 2);
-    expect_rows(only(agent().m_NVRHBA_StorageVolume_map).get(),
+    expect_rows(onlySAN(agent().m_NVRHBA_StorageVolume_map).get(),
                 {{"Name", "0102030405060708090A0B0C"}, {"NameFormat", "10"}, {"NameNamespace", "3"}});
 }
 
