@@ -1,7 +1,6 @@
 // What holds for every method of every service: whom it is meant for, in what case it is called, what becomes of a
 // library that throws, whether it asks for a refresh, and that it shares the agent with all others.
 #include <algorithm>
-#include <filesystem>
 #include <future>
 #include <set>
 
@@ -10,7 +9,7 @@
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Expected.h"
 #include "tests/module/support/Firmware.h"
-#include "tests/support/private_host.h"
+#include "tests/module/support/Service_Methods.h"
 #include "tests/support/simulator.h"
 
 using namespace nvrtest;
@@ -19,103 +18,7 @@ using testing::IsEmpty;
 
 namespace {
 
-constexpr char image_path[] = "/var/log/an.image";
-constexpr char table_path[] = "/var/log/a.table";
-constexpr char dump_folder[] = "/var/log/dumps";
-
-struct Method {
-    const char* service;
-    const char* name;
-    /// All but the Target, so that a call is done.
-    Arguments others;
-    /// The return values without a Target, for one of another class, for one that is no port of the host, and for a
-    /// port that is not local.
-    unsigned no_target, no_port, unknown, not_local;
-    /// A refresh is asked for when it is done.
-    bool refreshes;
-    /// What it does in the end.
-    const char* library_call;
-};
-
-std::vector<Method> methods()
-{
-    const char* const names = "NVRHBA_FCHBAWWNService";
-    const char* const firmware = "NVRHBA_SoftwareInstallationService";
-    const char* const params = "NVRHBA_FCHBADriverParamService";
-    const char* const boot = "NVRHBA_BootBIOSService";
-    const char* const tags = "NVRHBA_FCTagService";
-    const char* const dumps = "NVRHBA_DumpService";
-    const auto type = [](std::uint16_t value) { return host::Named_Value{"Type", Value::uint16(value)}; };
-    std::vector<Value> bytes;
-    for (const char byte : image(new_version, 10))
-        bytes.push_back(Value::uint8(static_cast<std::uint8_t>(byte)));
-    const Arguments image_bytes = {{"Image", Value::array(CMPI_uint8, bytes)},
-                                   {"InstallOptions", options_value({32768})},
-                                   {"InstallOptionsValues", texts_value({"a.copy"})}};
-    const Arguments new_names = {
-        {"NewWWPN", Value::string("10000000C9A0F001")}, {"NewWWNN", Value::string("20000000C9A0F001")}, type(1)};
-    return {
-        {names, "ChangeWWN", new_names, 32968, 32968, 32968, 0, true, "RM_ChangeWWN"},
-        {names, "RestoreWWN", {type(0)}, 32968, 32968, 32968, 0, true, "RM_RestoreWWN"},
-        {names, "ReadWWN", {type(2)}, 32968, 32968, 32968, 0, false, "RM_ReadWWN"},
-        {names, "GetWWNCapability", {}, 32968, 32968, 32968, 0, false, "RM_GetWWNCapability"},
-        {firmware,
-         "InstallFromURI",
-         {{"URI", Value::string(image_path)}},
-         4097,
-         32968,
-         32968,
-         40001,
-         true,
-         "RM_DownloadFirmware"},
-        {firmware, "InstallFromByteStream", image_bytes, 4097, 32968, 32968, 40001, true, "RM_DownloadFirmware"},
-        {firmware, "ResetHBA", {}, 32968, 32968, 32968, 40001, true, "RM_ResetHBA"},
-        {firmware,
-         "SetPortEnabled",
-         {{"PortEnabled", Value::boolean(true)}},
-         32968,
-         32968,
-         32968,
-         0,
-         false,
-         "RM_SetPortEnabled"},
-        {params,
-         "SetDriverParameter",
-         {{"strParam", Value::string("lun-queue-depth")}, {"strValue", Value::string("64")}},
-         32968,
-         32968,
-         32968,
-         40001,
-         false,
-         "RM_SetDriverParam"},
-        {boot, "EnableBootBIOS", {}, 32968, 32968, 32968, 40001, false, "RM_SetBootBiosState"},
-        {boot, "DisableBootBIOS", {}, 32968, 32968, 32968, 40001, false, "RM_SetBootBiosState"},
-        {boot, "GetBootBIOSStatus", {}, 32968, 32968, 32968, 40001, false, "RM_GetAttributeValue"},
-        {tags, "GetGlobalFlag", {}, 4097, 4097, 32968, 0, false, "CPQFC_QoSGetGlobalFlag"},
-        {tags, "SetGlobalFlag", {{"State", Value::uint32(1)}}, 4097, 4097, 32968, 0, false, "CPQFC_QoSSetGlobalFlag"},
-        {tags,
-         "GetConfigTable",
-         {{"URI", Value::string("a.table")}},
-         4097,
-         4097,
-         32968,
-         0,
-         false,
-         "CPQFC_QoSGetConfig"},
-        {tags,
-         "SetConfigTable",
-         {{"URI", Value::string(table_path)}},
-         4097,
-         4097,
-         32968,
-         0,
-         false,
-         "CPQFC_QoSSetConfig"},
-        {dumps, "GenerateDump", {}, 32968, 32968, 32968, 40001, false, "RM_GenerateDump"},
-        {dumps, "GetDumpFileNames", {}, 32968, 32968, 32968, 40001, false, "RM_GetDumpFileNames"},
-        {dumps, "DeleteDump", {}, 32968, 32968, 32968, 40001, false, "RM_DeleteDumpFiles"},
-    };
-}
+using Method = Service_Method;
 
 std::string name_of(const Method& method)
 {
@@ -126,7 +29,7 @@ std::string name_of(const Method& method)
 class Host {
 public:
     explicit Host(const host::Manner& manner = host::Manner::strict(), const char* settings = "")
-        : rig((prepare(), Rig_Options{manner, scenario, settings}))
+        : rig((prepare_service_files(), Rig_Options{manner, std::string(serving_adapter) + "[[adapter]]\n", settings}))
     {
     }
 
@@ -141,23 +44,6 @@ public:
     }
     std::size_t ports() { return rig.enumerate("NVRHBA_FCPort").instances.size(); }
 
-private:
-    static void prepare()
-    {
-        for (const char* folder : {firmware_folder, dump_folder})
-            std::filesystem::create_directories(folder);
-        std::filesystem::current_path(firmware_folder);
-        write_image(image_path);
-        write_file(table_path,
-                   "<ApexConfig><theSystem><ApexVersion/><CreationDate/><HostName/><Adapter/></theSystem>"
-                   "<Configuration><numberOfEntries>1</numberOfEntries><Row><src_wwpn>10000000C9A00001</src_wwpn>"
-                   "<tgt_wwpn>50060E8005A10000</tgt_wwpn><tag>1</tag></Row></Configuration></ApexConfig>");
-    }
-    static constexpr char scenario[] =
-        "[[adapter]]\n[[adapter.port]]\ndump_directory = \"/var/log/dumps\"\n[[adapter.tag]]\n"
-        "source = \"10000000C9A00001\"\ntarget = \"50060E8005A10000\"\ntag = 5\n[[adapter]]\n";
-
-public:
     Rig rig;
 };
 
@@ -166,12 +52,12 @@ public:
 TEST(EveryServiceTable, HasEachMethodThatIsServed)
 {
     std::set<std::string> known;
-    for (const Method& method : methods())
+    for (const Method& method : service_methods())
         known.insert(name_of(method));
     for (const auto& row : expected_rows("unsupported_methods.txt"))
         known.insert(row.at(0) + ' ' + row.at(1));
     std::set<std::string> services;
-    for (const Method& method : methods())
+    for (const Method& method : service_methods())
         services.insert(method.service);
     for (const std::string& service : services)
         for (const host::Method_Record& method : module_schema()->find(service)->methods)
@@ -188,7 +74,7 @@ TEST_P(EveryService, IsMeantForPortsOfTheHost)
 {
     Host host(*GetParam());
     const Value null = Value::null_of(CMPI_ref), foreign = no_port(host.rig), unknown = unknown_port(host.rig);
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         const std::uint64_t before = calls(method.library_call);
         EXPECT_THAT(host.call(method, method.name, nullptr), returned(method.no_target)) << name_of(method);
         EXPECT_THAT(host.call(method, null), returned(method.no_target)) << name_of(method);
@@ -210,7 +96,7 @@ TEST_P(EveryService, IsMeantForPortsOfTheHost)
 // Some ask the library whether the port is local; for the others it has to say so itself.
 TEST_P(EveryService, AsksWhetherThePortIsLocalOrDoesNot)
 {
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         Host host(*GetParam());
         const Value target = port(host.rig);
         host.rig.settle();
@@ -226,7 +112,7 @@ TEST_P(EveryService, AsksWhetherThePortIsLocalOrDoesNot)
 
 TEST_P(EveryService, TakesItsMethodsInAnyCase)
 {
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         Host host(*GetParam());
         std::string lower = method.name, upper = method.name;
         std::transform(lower.begin(), lower.end(), lower.begin(), [](unsigned char c) { return std::tolower(c); });
@@ -243,7 +129,7 @@ TEST_P(EveryService, TakesItsMethodsInAnyCase)
 // An adapter that has gone shows whether somebody asked for a refresh: until then the port is published.
 TEST_P(EveryService, HasTheNextEnumerationShowWhatItChanged)
 {
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         Host host(*GetParam());
         ASSERT_EQ(host.ports(), 2u);
         set_port(1, "present", 0);
@@ -256,7 +142,7 @@ TEST_P(EveryService, HasTheNextEnumerationShowWhatItChanged)
 
 TEST(EveryServiceInstall, WithAResetAsksForNoRefresh)
 {
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         if (std::string(method.name).find("Install") != 0) continue;
         Host host;
         ASSERT_EQ(host.ports(), 2u);
@@ -281,7 +167,7 @@ TEST(EveryServiceStatuses, OfTheQuestionForLocalPortsAreOne)
     Host host;
     ASSERT_EQ(host.ports(), 2u);
     host.rig.settle(); // a refresh makes some of the calls too
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         if (method.not_local == 0) continue;
         const std::uint64_t before = calls(method.library_call);
         for (unsigned status = 1; status <= 260; status++) {
@@ -296,7 +182,7 @@ TEST(EveryServiceStatuses, OfTheQuestionForLocalPortsAreOne)
 TEST(EveryServiceStatuses, OfEachStepOfAnInstallComeBackBehindFortyThousand)
 {
     Host host;
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         if (std::string(method.name).find("Install") != 0) continue;
         const bool from_uri = method.name == std::string("InstallFromURI");
         for (const char* call : {"RM_ImportHBAFileA", "RM_VerifyFirmwareA", "RM_DownloadFirmware"})
@@ -314,7 +200,7 @@ TEST(EveryServiceStatuses, OfEachStepOfAnInstallComeBackBehindFortyThousand)
 // nothing stays locked or on the disk, and the next call is done.
 TEST(EveryServiceThrown, IsOutlived)
 {
-    for (const Method& method : methods()) {
+    for (const Method& method : service_methods()) {
         Host host(host::Manner::strict(), refreshing_settings);
         const Value target = port(host.rig);
         for (const char* thrower : {"*", "RM_*"})
@@ -341,7 +227,7 @@ TEST_P(EveryService, TakesTurnsWithAllOthers)
         return call == "RM_ChangeWWN" || call == "RM_RestoreWWN" || call == "RM_SetPortEnabled";
     };
     const Value first = port(host.rig, 0), second = port(host.rig, 1);
-    const std::vector<Method> all = methods();
+    const std::vector<Method> all = service_methods();
     std::vector<host::Path> paths;
     for (const Method& method : all)
         paths.push_back(Service(host.rig, method.service).path());

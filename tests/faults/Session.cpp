@@ -1,0 +1,343 @@
+#include "tests/faults/Session.h"
+
+#include <condition_variable>
+#include <mutex>
+#include <stdexcept>
+
+#include "host/PathText.h"
+#include "simulator/nvrsim.h"
+#include "tests/module/support/Firmware.h"
+#include "tests/module/support/Instance_Text.h"
+#include "tests/module/support/Quiet_Output.h"
+#include "tests/module/support/Service_Methods.h"
+#include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
+
+namespace nvrtest {
+
+namespace {
+
+using host::Value;
+
+constexpr char name_space[] = "root/norvane";
+constexpr char alert_class[] = "NVRHBA_AlertIndication";
+constexpr char system_log[] = "/var/log/messages";
+
+// Small, and with all that the module reads: a tagged port with dumps and a virtual port, one with a loopback plug.
+const std::string scenario = std::string(serving_adapter) + R"(
+[[adapter.port.vport]]
+[[adapter]]
+[[adapter.port]]
+loopback_plug = true
+[[target]]
+luns = 1
+[[target.lun]]
+number = 1
+device_type = 1
+)";
+constexpr std::size_t plugged = 1;
+constexpr char target_name[] = "50060E8005A10000";
+const char* const ports[] = {first_port, second_port};
+
+Rig_Options rig_options()
+{
+    prepare_service_files();
+    write_file(system_log, "Nov 21 kernel: tsfc one\nNov 21 kernel: other\nNov 21 kernel: tsfc two\n");
+    Rig_Options options;
+    options.manner = host::Manner::strict();
+    options.scenario = scenario;
+    options.settings = refreshing_settings;
+    return options;
+}
+
+// A path as the module writes it.
+host::Path path_of(const std::string& text)
+{
+    const host::Path_Parse parsed = host::parse_path(text, module_schema().get(), name_space);
+    if (!parsed.ok) throw std::runtime_error(text + ": " + parsed.error);
+    return parsed.path;
+}
+
+// Of a class with a system's keys; `key` is the last one.
+host::Path path_in_system(const std::string& class_name, const std::string& key, const std::string& value)
+{
+    return path_of(class_name + '.' + key + "=\"" + value +
+                   "\",SystemCreationClassName=\"CIM_ComputerSystem\",SystemName=\"" + rig_host_name +
+                   "\",CreationClassName=\"" + class_name + '"');
+}
+
+host::Path path_with_id(const std::string& class_name, const std::string& id)
+{
+    return path_of(class_name + ".InstanceID=\"" + id + '"');
+}
+
+Value reference_to(const char* class_name, const char* device_id)
+{
+    return Value::reference(path_in_system(class_name, "DeviceID", device_id));
+}
+
+// Instances change by their key and what is set.
+host::Instance change(host::Path path, const std::string& property, const Value& value)
+{
+    host::Instance instance;
+    for (const host::Named_Value& key : path.keys)
+        instance.set(key.name, key.value);
+    instance.path = std::move(path);
+    instance.set(property, value);
+    return instance;
+}
+
+// Of the one instance that such a service has.
+std::string name_of(const std::string& service)
+{
+    return service == "NVRHBA_SoftwareInstallationService" ? "NVRHBA_FCSoftwareInstallationService" : service;
+}
+
+bool is_of_the_moment(const std::string& class_name)
+{
+    for (const char* name : {alert_class, "NVRHBA_LogEntry", "NVRHBA_RecordLogManagesRecord"})
+        if (class_name == name) return true;
+    return false;
+}
+
+// Counts what is delivered.
+class Sink {
+public:
+    host::Indication_Sink to_here()
+    {
+        return [this](const host::Indication&) {
+            std::lock_guard<std::mutex> lock(m_mutex);
+            m_count++;
+            m_came.notify_all();
+        };
+    }
+    void wait_for(int count)
+    {
+        std::unique_lock<std::mutex> lock(m_mutex);
+        m_came.wait(lock, [&] { return m_count >= count; });
+    }
+
+private:
+    std::mutex m_mutex;
+    std::condition_variable m_came;
+    int m_count = 0;
+};
+
+} // namespace
+
+const std::vector<Session::Part>& Session::parts()
+{
+    static const std::vector<Part> all = {
+        {"load", &Session::load},
+        {"enumerations", &Session::enumerate_all},
+        {"traversals", &Session::traverse_all},
+        {"services", &Session::call_services},
+        {"modifications", &Session::modify_instances},
+        {"diagnostics", &Session::run_diagnostics},
+        {"logs", &Session::steer_logs},
+        {"alerts", &Session::receive_alerts},
+        {"refresh", &Session::refresh},
+        {"unload", &Session::unload},
+    };
+    return all;
+}
+
+const Session::Part& Session::part(const std::string& name)
+{
+    for (const Part& one : parts())
+        if (name == one.name) return one;
+    throw std::runtime_error("the session has no part " + name);
+}
+
+Session::Session(std::function<void(const std::string&)> before_request)
+    : m_before_request(std::move(before_request)), m_rig(rig_options())
+{
+}
+
+std::string Session::published()
+{
+    clear_faults();
+    load_scenario(scenario);
+    if (m_before_request) m_before_request("a refresh of the sound host");
+    m_rig.refresh();
+    std::string text;
+    for (const std::string& name : m_rig.classes()) {
+        if (m_before_request) m_before_request("enumerate " + name + " of the sound host");
+        if (name == alert_class) continue;
+        const host::Answer answer = m_rig.enumerate(name);
+        if (!answer.ok()) throw std::runtime_error(name + " does not answer: " + answer.status.message);
+        if (!is_of_the_moment(name)) text += to_lines(name, answer.instances);
+    }
+    m_rig.settle();
+    return text;
+}
+
+host::Answer Session::ask(const std::string& what, const std::function<host::Answer(host::Host&)>& request)
+{
+    if (m_before_request) m_before_request(what);
+    host::Answer answer = request(m_rig.server());
+    if (!answer.ok())
+        m_failures.push_back(what + ": " + std::to_string(answer.status.code) + ' ' + answer.status.message);
+    m_rig.settle();
+    return answer;
+}
+
+void Session::call(const host::Path& path, const std::string& method, const std::vector<host::Named_Value>& arguments)
+{
+    const std::string what = path.class_name + '.' + method;
+    const host::Answer answer = ask(what, [&](host::Host& server) { return server.call(path, method, arguments); });
+    if (answer.ok() && answer.value != Value::uint32(0))
+        m_failures.push_back(what + " returned " + answer.value.to_text());
+}
+
+// The first request comes while nothing has been read, the next one while its refresh reads the SAN.
+void Session::load()
+{
+    if (m_before_request) m_before_request("the first request");
+    for (const char* name : {"NVRHBA_PortController", "NVRHBA_StorageVolume"}) {
+        const host::Answer answer = m_rig.enumerate(name);
+        if (!answer.ok()) m_failures.push_back(std::string("first ") + name + ": " + answer.status.message);
+    }
+    m_rig.settle();
+}
+
+void Session::enumerate_all()
+{
+    for (const std::string& name : m_rig.classes()) {
+        if (name == alert_class) continue;
+        ask("enumerate " + name, [&](host::Host& server) { return server.enumerate(name_space, name); });
+    }
+}
+
+// From the first instance of each class, along all associations at once, and from one that is not there.
+void Session::traverse_all()
+{
+    const Quiet_Output quiet;
+    std::vector<host::Path> sources = {path_in_system("NVRHBA_FCPort", "DeviceID", "nobody")};
+    for (const host::Registration& registration : m_rig.server().registrations()) {
+        if (!(registration.kinds & host::instance_kind) || registration.kinds & host::association_kind) continue;
+        const std::string& name = registration.class_name;
+        const host::Answer names =
+            ask("names of " + name, [&](host::Host& server) { return server.names(name_space, name); });
+        if (names.paths.empty()) continue;
+        const host::Path& first = names.paths.front();
+        ask("get " + name, [&](host::Host& server) { return server.get(first); });
+        sources.push_back(first);
+    }
+    for (const host::Path& source : sources) {
+        const std::string from = " from " + source.class_name;
+        ask("associators" + from, [&](host::Host& server) { return server.associators(source); });
+        ask("associator names" + from, [&](host::Host& server) { return server.associator_names(source); });
+        ask("references" + from, [&](host::Host& server) { return server.references(source); });
+        ask("reference names" + from, [&](host::Host& server) { return server.reference_names(source); });
+    }
+}
+
+void Session::call_services()
+{
+    for (const Service_Method& method : service_methods()) {
+        Arguments arguments = method.others;
+        arguments.push_back({"Target", reference_to("NVRHBA_FCPort", first_port)});
+        call(path_in_system(method.service, "Name", name_of(method.service)), method.name, arguments);
+    }
+}
+
+void Session::modify_instances()
+{
+    const auto modify = [&](const host::Path& path, const std::string& property, const Value& value) {
+        ask("modify " + path.class_name, [&](host::Host& server) {
+            return server.modify(change(path, property, value), std::vector<std::string>{property});
+        });
+    };
+    const host::Path port = path_in_system("NVRHBA_FCPort", "DeviceID", first_port);
+    modify(port, "LocationIndicator", Value::uint16(2));
+    modify(port, "LocationIndicator", Value::uint16(3));
+    modify(path_with_id("NVRHBA_DumpData", std::string("NVRHBA_DumpData::") + first_port), "RetentionCount",
+           Value::uint32(7));
+    const host::Path time_out = path_with_id("NVRHBA_ProviderConfigSetting", "Norvane HBA Provider:cachetimeout");
+    modify(time_out, "current", Value::uint32(7));
+    modify(time_out, "current", Value::uint32(10));
+}
+
+void Session::run_diagnostics()
+{
+    for (const char* name : {"Beacon", "Status", "Reset", "Self", "External Loopback", "Host Loopback",
+                             "Internal Loopback", "Ping", "Echo"}) {
+        const std::string test = std::string("NVR:FCHBA ") + name + " Test";
+        const bool needs_plug = std::string(name) == "External Loopback";
+        host::Instance settings;
+        settings.path = path_of("NVRHBA_FCHBADiagnosticSettingData");
+        settings.set("InstanceID", Value::string(test));
+        settings.set("LoopControlParameter", texts_value({"3"}));
+        settings.set("TargetDevice", Value::string(target_name));
+        call(path_in_system("NVRHBA_FCHBADiagnosticTest", "Name", test), "RunDiagnosticService",
+             {{"ManagedElement", reference_to("NVRHBA_PortController", ports[needs_plug ? plugged : 0])},
+              {"DiagnosticSettings", Value::instance(settings)}});
+        call(path_in_system("NVRHBA_HelpService", "Name", test), "GetHelp",
+             {{"RequestedDocument", Value::string(test)},
+              {"Format", Value::uint16(1)},
+              {"RequestedDelivery", Value::uint16(1)}});
+    }
+    for (const char* name : {"NVRHBA_ConcreteJob", "NVRHBA_DiagnosticCompletionRecord", "NVRHBA_LogManagesRecord"})
+        ask(std::string("enumerate ") + name, [&](host::Host& server) { return server.enumerate(name_space, name); });
+    call(path_with_id("NVRHBA_DiagnosticsLog", "NVR:FCHBA Echo Test"), "ClearLog", {});
+}
+
+void Session::steer_logs()
+{
+    const std::string host_name = rig_host_name;
+    const host::Path driver_log = path_with_id("NVRHBA_RecordLog", "NVR: FC Driver Record Log:" + host_name);
+    const host::Path provider_log = path_with_id("NVRHBA_RecordLog", "NVRHBA:ProviderLog:" + host_name);
+    const auto state = [](std::uint16_t value) {
+        return std::vector<host::Named_Value>{{"RequestedState", Value::uint16(value)}};
+    };
+    call(driver_log, "RequestStateChange", state(2));
+    ask("the driver's lines",
+        [](host::Host& server) { return server.enumerate(name_space, "NVRHBA_FCDriverLogEntry"); });
+    call(driver_log, "ClearLog", {});
+    call(provider_log, "SetLogParams",
+         {{"LogLevel", Value::uint16(5)}, {"LogMode", Value::uint16(2)}, {"TracePath", Value::string(trace_path)}});
+    call(provider_log, "RequestStateChange", state(3));
+    call(provider_log, "RequestStateChange", state(2));
+}
+
+void Session::receive_alerts()
+{
+    if (m_before_request) m_before_request("subscribe");
+    Sink sink;
+    int id = 0;
+    const host::Status subscribed = m_rig.server().subscribe(name_space, alert_class, sink.to_here(), id);
+    if (!subscribed.ok()) m_failures.push_back("subscribe: " + subscribed.message);
+    m_rig.server().settle();
+    m_rig.settle();
+    // As many as there are callbacks for the port: it may have none when its registration failed.
+    constexpr std::uint32_t link_up = 514;
+    if (m_before_request) m_before_request("alerts");
+    const int each = nvrsim_event("0", link_up, 0);
+    if (each != 1) m_failures.push_back("the port has " + std::to_string(each) + " callbacks");
+    nvrsim_link("0", 0);
+    nvrsim_link("0", 1);
+    nvrsim_drain_events();
+    if (subscribed.ok()) {
+        sink.wait_for(3 * each);
+        if (m_before_request) m_before_request("unsubscribe");
+        const host::Status unsubscribed = m_rig.server().unsubscribe(id);
+        if (!unsubscribed.ok()) m_failures.push_back("unsubscribe: " + unsubscribed.message);
+    }
+    m_rig.server().settle();
+    m_rig.settle();
+}
+
+void Session::refresh()
+{
+    if (m_before_request) m_before_request("a refresh");
+    m_rig.refresh();
+}
+
+void Session::unload()
+{
+    if (m_before_request) m_before_request("the unload");
+    m_rig.stop();
+}
+
+} // namespace nvrtest

@@ -1,0 +1,70 @@
+/// The life of the module as a script: whatever can be made to fail may fail at any place of it.
+///
+///     Session session;
+///     for (const Session::Part& part : Session::parts())
+///         session.run(part);
+///
+/// From the load to the unload, everything is asked for once that a client can ask for: all classes, all traversals,
+/// each method, each diagnostic test, alerts, a refresh. No answer is needed for the script to go on: what is not there
+/// is asked for by the name that it has on a sound host. Between two requests no refresh runs, so that two sessions
+/// make the same library calls in the same order.
+///
+/// For programs with a private host that link support/Test_Clock.cpp. One at a time, on one thread.
+#pragma once
+
+#include <functional>
+#include <string>
+#include <vector>
+
+#include "tests/module/support/Rig.h"
+
+namespace nvrtest {
+
+class Session {
+public:
+    struct Part {
+        const char* name;
+        void (Session::*run)();
+    };
+    /// In order; the first loads the module, the last one unloads it.
+    static const std::vector<Part>& parts();
+    /// The words for a part, to find one by.
+    static const Part& part(const std::string& name);
+
+    /// A host with simulated hardware and a server. Nothing of the module is loaded before the first part.
+    /// `before_request` hears what is about to be asked, on the thread that asks.
+    explicit Session(std::function<void(const std::string&)> before_request = {});
+
+    void run(const Part& part) { (this->*part.run)(); }
+
+    /// What clients read after the next refresh of the host as it was at first: hardware as the scenario has it, no
+    /// faults. Every class's instances as text, without what depends on the time or on what happened before: log
+    /// entries, the records of diagnostics. Throws std::runtime_error if a class does not answer.
+    std::string published();
+
+    /// Requests that did not succeed so far, with their statuses; none on a sound host.
+    const std::vector<std::string>& failures() const { return m_failures; }
+    Rig& rig() { return m_rig; }
+
+private:
+    void load();
+    void enumerate_all();
+    void traverse_all();
+    void call_services();
+    void modify_instances();
+    void run_diagnostics();
+    void steer_logs();
+    void receive_alerts();
+    void refresh();
+    void unload();
+
+    host::Answer ask(const std::string& what, const std::function<host::Answer(host::Host&)>& request);
+    /// The same for a method that returns 0 when it is done.
+    void call(const host::Path& path, const std::string& method, const std::vector<host::Named_Value>& arguments);
+
+    const std::function<void(const std::string&)> m_before_request;
+    Rig m_rig;
+    std::vector<std::string> m_failures;
+};
+
+} // namespace nvrtest
