@@ -1,5 +1,7 @@
 #include "simulator/Events.h"
 
+#include <pthread.h>
+
 namespace nvrsim {
 
 Events& Events::instance()
@@ -64,6 +66,8 @@ size_t Events::registered()
 
 void Events::deliver()
 {
+    // So that whoever counts threads can tell it from the caller's: it stays until the process ends.
+    pthread_setname_np(pthread_self(), "nvrsim-events");
     std::unique_lock<std::mutex> lock(m_mutex);
     for (;;) {
         m_changed.wait(lock, [&] { return !m_queue.empty(); });

@@ -41,6 +41,8 @@ public:
     /// faults. Every class's instances as text, without what depends on the time or on what happened before: log
     /// entries, the records of diagnostics. Throws std::runtime_error if a class does not answer.
     std::string published();
+    /// One class of it, without the refresh.
+    std::string published(const std::string& class_name);
 
     /// Requests that did not succeed so far, with their statuses; none on a sound host.
     const std::vector<std::string>& failures() const { return m_failures; }
@@ -50,6 +52,7 @@ private:
     void load();
     void enumerate_all();
     void traverse_all();
+    void traverse(const host::Path& source, const std::string& through);
     void call_services();
     void modify_instances();
     void run_diagnostics();

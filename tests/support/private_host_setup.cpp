@@ -6,6 +6,7 @@
 #include <cstring>
 #include <dirent.h>
 #include <fcntl.h>
+#include <filesystem>
 #include <sched.h>
 #include <stdexcept>
 #include <sys/mount.h>
@@ -122,6 +123,22 @@ void enter_private_host(char** argv)
     check(::setenv(root_variable, root.c_str(), 1) == 0, "set the environment");
     ::execv(program.c_str(), argv);
     check(false, "start anew");
+}
+
+void separate_private_host()
+{
+    check(::unshare(CLONE_NEWNS) == 0, "a mount namespace of our own");
+    const std::string root = private_root() + "/own";
+    check(::mkdir(root.c_str(), 0755) == 0 || errno == EEXIST, "mkdir " + root);
+    check(::mount("tmpfs", root.c_str(), "tmpfs", 0, "mode=0755") == 0, "mount on " + root);
+    make_folder(root + "/etc");
+    for (const auto& entry : std::filesystem::directory_iterator("/etc"))
+        if (entry.is_symlink() || entry.is_regular_file())
+            std::filesystem::copy(entry, root + entry.path().string(), std::filesystem::copy_options::copy_symlinks);
+    bind_over(root + "/etc", "/etc");
+    make_private_folder(root, "log", "/var/log");
+    make_private_folder(root, "shm", "/dev/shm");
+    make_private_folder(root, "lib", private_root() + "/lib");
 }
 
 std::string private_root()

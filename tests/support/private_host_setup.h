@@ -9,6 +9,10 @@ namespace nvrtest {
 /// machine does not allow it.
 void enter_private_host(char** argv);
 
+/// For a process that was forked in a private host and is to have one for itself: /etc as it is there now, the other
+/// folders empty, under the same names. Before the first thread of the process.
+void separate_private_host();
+
 /// The folder that carries the host's own parts. Throws outside of one.
 std::string private_root();
 

@@ -67,6 +67,7 @@ void Elf_File::read_symbols(std::size_t at, std::size_t size, std::size_t string
         const int visibility = ELF64_ST_VISIBILITY(symbol.st_other);
         if (symbol.st_shndx == SHN_UNDEF || (visibility != STV_DEFAULT && visibility != STV_PROTECTED)) continue;
         m_exported.push_back(text(strings + symbol.st_name));
+        m_symbols.push_back({m_exported.back(), at + i * sizeof(Elf64_Sym)});
     }
 }
 
@@ -86,6 +87,19 @@ bool Elf_File::is_read_only_data(std::uint64_t offset) const
 {
     return std::any_of(m_read_only.begin(), m_read_only.end(),
                        [=](const Range& range) { return range.from <= offset && offset < range.to; });
+}
+
+std::string Elf_File::without(const std::string& name) const
+{
+    const auto symbol =
+        std::find_if(m_symbols.begin(), m_symbols.end(), [&](const Symbol& one) { return one.name == name; });
+    if (symbol == m_symbols.end()) throw std::runtime_error("the file does not define " + name);
+    auto changed = record<Elf64_Sym>(symbol->at);
+    changed.st_shndx = SHN_UNDEF;
+    changed.st_value = 0;
+    std::string bytes = m_bytes;
+    bytes.replace(symbol->at, sizeof changed, reinterpret_cast<const char*>(&changed), sizeof changed);
+    return bytes;
 }
 
 } // namespace nvrtest

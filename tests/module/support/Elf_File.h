@@ -22,6 +22,8 @@ public:
     const std::vector<std::string>& needed() const { return m_needed; }
     /// True if an address of the loaded file lies in what is made read-only when relocation is done.
     bool is_read_only_data(std::uint64_t offset) const;
+    /// The file's bytes, but that it does not define this name any more. Its own code finds what bore it all the same.
+    std::string without(const std::string& name) const;
 
 private:
     void read_dynamic(std::size_t at, std::size_t size);
@@ -37,7 +39,12 @@ private:
         std::int64_t tag;
         std::uint64_t value;
     };
+    struct Symbol {
+        std::string name;
+        std::size_t at; // of its record
+    };
     std::string m_bytes;
+    std::vector<Symbol> m_symbols; // that it defines
     std::vector<Range> m_read_only;
     std::vector<Entry> m_dynamic;
     std::vector<std::string> m_exported, m_needed;

@@ -59,6 +59,17 @@ std::shared_ptr<const host::Schema> module_schema()
     return schema;
 }
 
+const std::vector<host::Registration>& module_registrations()
+{
+    static const std::vector<host::Registration> all = [] {
+        host::Host server(module_schema());
+        std::string error;
+        if (server.add_module(NVR_MODULE, name_space, &error) == 0) throw std::runtime_error(error);
+        return server.registrations();
+    }();
+    return all;
+}
+
 Rig::Rig(const Rig_Options& options) : m_options(options), m_trace_path(trace_path)
 {
     name_host();
@@ -89,8 +100,8 @@ void Rig::start()
     host::Host_Options options;
     options.manner = m_options.manner;
     m_server = std::make_unique<host::Host>(module_schema(), options);
-    std::string error;
-    if (m_server->add_module(NVR_MODULE, name_space, &error) == 0) throw std::runtime_error(error);
+    for (const host::Registration& registration : module_registrations())
+        m_server->add(registration);
 }
 
 void Rig::stop()

@@ -102,6 +102,9 @@ private:
 /// The schema of the module's classes, read once.
 std::shared_ptr<const host::Schema> module_schema();
 
+/// Its registrations, which the module's file tells, read once.
+const std::vector<host::Registration>& module_registrations();
+
 /// Objects that the module made and did not give back, but for strings: those in arrays live until their call returns.
 std::uint64_t left_beside_strings(const host::Report& report);
 
@@ -127,8 +130,8 @@ std::vector<const host::Manner*> every_manner();
                              [](const auto& info) { return nvrtest::manner_label(*info.param); })
 /// For tests whose threads meet.
 #define NVR_THREADS_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(nvrtest::every_manner(), suite)
-/// For tests that ask one thing after the other: the sanitizers, under which they take up to ten times as long, see them
-/// in the strict manner alone.
+/// For tests that ask one thing after the other: the sanitizers, under which they take up to ten times as long, see
+/// them in the strict manner alone.
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
 #define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(std::vector{&host::Manner::strict()}, suite)
 #else

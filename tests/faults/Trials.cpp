@@ -1,0 +1,386 @@
+#include "tests/faults/Trials.h"
+
+#include <dirent.h>
+#include <fstream>
+#include <functional>
+#include <sstream>
+#include <stdexcept>
+#include <thread>
+
+#include "foundation/management_api.h"
+#include "simulator/nvrsim.h"
+#include "tests/faults/Session.h"
+#include "tests/module/support/Elf_File.h"
+#include "tests/module/support/Instance_Text.h"
+#include "tests/support/private_host.h"
+#include "tests/support/private_host_setup.h"
+#include "tests/support/simulator.h"
+
+namespace nvrtest {
+
+namespace {
+
+// Longer than any request takes on a busy machine.
+constexpr std::chrono::seconds patience{10}, delay{2};
+
+const std::vector<std::string> all_libraries = {"HBAAPI", "lrmapi", "rmapi", "tssdm"};
+
+#define NVR_NAME(result, name, missing, parameters, arguments) #name,
+const std::vector<std::string> management_names = {NVR_MANAGEMENT_OPERATIONS(NVR_NAME)};
+const std::vector<std::string> plain_names = {NVR_PLAIN_MANAGEMENT_OPERATIONS(NVR_NAME)};
+const std::vector<std::string> hba_names = {NVR_HBA_OPERATIONS(NVR_NAME)};
+const std::vector<std::string> tag_names = {NVR_CPQFC_OPERATIONS(NVR_NAME)};
+#undef NVR_NAME
+const std::vector<std::vector<std::string>> all_names = {management_names, plain_names, hba_names, tag_names};
+
+std::size_t open_files()
+{
+    std::size_t count = 0;
+    DIR* entries = opendir("/proc/self/fd");
+    while (readdir(entries))
+        count++;
+    closedir(entries);
+    return count;
+}
+
+// All but the one on which the simulator delivers its events.
+std::size_t threads()
+{
+    std::size_t count = 0;
+    DIR* entries = opendir("/proc/self/task");
+    while (const dirent* entry = readdir(entries)) {
+        std::string name;
+        std::getline(std::ifstream(std::string("/proc/self/task/") + entry->d_name + "/comm"), name);
+        count += !name.empty() && name != "nvrsim-events"; // none: it has just ended
+    }
+    closedir(entries);
+    return count;
+}
+
+/// The life of one trial, from what a process is before it to what is left.
+class Trial {
+public:
+    explicit Trial(Run_Watch& watch)
+        : m_watch(watch), m_files(open_files()), m_threads(threads()),
+          m_session(std::make_unique<Session>([&](const std::string& what) { m_watch.step(what); }))
+    {
+    }
+
+    Session& session() { return *m_session; }
+    void expect(bool is_so, const std::string& otherwise)
+    {
+        if (!is_so) m_watch.complain(otherwise);
+    }
+
+    /// All parts but the unload.
+    void run_to_unload()
+    {
+        for (const Session::Part& part : Session::parts())
+            if (part.name != std::string("unload")) m_session->run(part);
+    }
+    std::string published() { return m_session->published(); }
+    void expect_published(const std::string& sound, const std::string& published, const std::string& when)
+    {
+        const std::string lines = difference(sound, published);
+        expect(lines.empty(), when + " it does not publish what it should:\n" + lines.substr(0, 3000));
+    }
+    /// What still has a callback then may call it.
+    void unload()
+    {
+        m_session->run(Session::part("unload"));
+        constexpr std::uint32_t link_up = 514;
+        nvrsim_event("0", link_up, 0);
+        nvrsim_drain_events();
+    }
+
+    /// After the unload: what the server lent is given back.
+    void expect_nothing_lent()
+    {
+        const host::Report report = m_session->rig().server().report();
+        expect(left_beside_strings(report) == 0, "objects of the server are left: " + report.to_text());
+        for (const std::string& violation : report.violations)
+            expect(false, "the server was asked for what it forbids: " + violation);
+    }
+    /// `is_whole`: all classes are asked for, else some that show what a load finds.
+    void load_again(const Sound_Session& sound, bool is_whole)
+    {
+        m_session->rig().restart();
+        const char* const when = "after the second load";
+        if (is_whole)
+            expect_published(sound.published, published(), when);
+        else
+            for (const char* name : {"NVRHBA_FCPort", "NVRHBA_DumpData", "NVRHBA_StorageVolume"})
+                expect_published(lines_of_class(sound.published, name), m_session->published(name), when);
+        unload();
+    }
+    /// At the very end.
+    void expect_nothing_left(bool may_keep_callbacks = false)
+    {
+        m_session.reset();
+        m_watch.step("the end of the threads");
+        while (threads() > m_threads)
+            std::this_thread::yield();
+        expect(open_files() <= m_files, "a descriptor stays open");
+        expect(nvrsim_callbacks() == 0 || may_keep_callbacks, "a callback stays registered");
+    }
+
+private:
+    Run_Watch& m_watch;
+    const std::size_t m_files, m_threads;
+    std::unique_ptr<Session> m_session;
+};
+
+std::map<std::string, std::uint64_t> counts()
+{
+    std::map<std::string, std::uint64_t> made;
+    for (const auto& names : all_names)
+        for (const std::string& name : names)
+            if (const std::uint64_t count = calls(name)) made[name] = count;
+    return made;
+}
+
+// "CALL N M" a line, then "handles N", then what is published.
+std::string describe(const Sound_Session& sound)
+{
+    std::ostringstream text;
+    for (const auto& [name, count] : sound.calls)
+        text << name << ' ' << count.until_unload << ' ' << count.in_unload << '\n';
+    text << "handles " << sound.handles << " 0\n" << sound.published;
+    return text.str();
+}
+
+Sound_Session understand(const std::string& text)
+{
+    Sound_Session sound;
+    std::istringstream stream(text);
+    std::string name;
+    std::uint64_t first = 0, second = 0;
+    while (stream >> name >> first >> second && name != "handles")
+        sound.calls[name] = {first, second};
+    sound.handles = first;
+    stream.ignore(1);
+    std::ostringstream rest;
+    rest << stream.rdbuf();
+    sound.published = rest.str();
+    return sound;
+}
+
+Sound_Session measure(Run_Watch& watch)
+{
+    Sound_Session sound;
+    Trial trial(watch);
+    trial.run_to_unload();
+    for (const auto& [name, count] : counts())
+        sound.calls[name].until_unload = count;
+    sound.handles = nvrsim_open_handles();
+    sound.published = trial.published();
+    const auto before = counts();
+    trial.unload();
+    for (const auto& [name, count] : counts()) {
+        const auto earlier = before.find(name);
+        sound.calls[name].in_unload = count - (earlier == before.end() ? 0 : earlier->second);
+    }
+    for (const std::string& failure : trial.session().failures())
+        trial.expect(false, failure);
+    trial.expect_nothing_lent();
+    trial.load_again(sound, true);
+    trial.expect_nothing_left();
+    return sound;
+}
+
+// A call that gives a handle out, or takes it back, and fails at it may lose it.
+bool may_lose(const std::string& call, std::initializer_list<const char*> calls)
+{
+    for (const char* one : calls)
+        if (call == one) return true;
+    return false;
+}
+
+void try_call(const Sound_Session& sound, const std::string& call, std::uint64_t ordinal, const char* fault,
+              Run_Watch& watch)
+{
+    const std::uint64_t until_unload = sound.calls.at(call).until_unload;
+    const bool is_in_unload = ordinal > until_unload;
+    const auto arm = [&](std::uint64_t from) {
+        add_fault("call = \"" + call + "\", from = " + std::to_string(from) + ", times = 1, " + fault);
+    };
+    Trial trial(watch);
+    if (!is_in_unload) arm(ordinal);
+    trial.run_to_unload();
+    if (!is_in_unload) trial.expect(fault_hits() == 1, "the session does not make this call");
+    trial.expect(nvrsim_open_handles() <= sound.handles ||
+                     may_lose(call, {"HBA_OpenAdapter", "HBA_CloseAdapter", "CPQFC_OpenAdapter"}),
+                 "an adapter stays open");
+    trial.expect_published(sound.published, trial.published(), "after a refresh");
+    if (is_in_unload) arm(ordinal - until_unload);
+    trial.unload();
+    if (is_in_unload) trial.expect(fault_hits() == 1, "the unload does not make this call");
+    trial.expect_nothing_lent();
+    clear_faults();
+    trial.load_again(sound, is_in_unload);
+    trial.expect_nothing_left(may_lose(call, {"HBA_RegisterForAdapterPortEvents", "HBA_RemoveCallback"}));
+}
+
+// --- What is missing
+
+/// Libraries as an administrator may have installed them.
+struct Installation {
+    const char* name;
+    std::vector<std::string> libraries;
+    const char* variant; ///< of the simulator; null: as they are
+    /// Which names are looked up where, in the first place.
+    struct Lookup {
+        const char* library;
+        const char* prefix;
+        const std::vector<std::string>& names;
+    };
+    std::vector<Lookup> lookups;
+};
+
+const std::vector<Installation>& installations()
+{
+    static const std::vector<Installation> all = {
+        {"first-choice",
+         {"HBAAPI", "lrmapi", "tssdm"},
+         nullptr,
+         {{"lrmapi", "L", management_names},
+          {"lrmapi", "", plain_names},
+          {"HBAAPI", "", hba_names},
+          {"tssdm", "", tag_names}}},
+        {"second-choice",
+         {"rmapi"},
+         "rmapi-both-names",
+         {{"rmapi", "L", management_names},
+          {"rmapi", "", plain_names},
+          {"rmapi", "", hba_names},
+          {"rmapi", "", tag_names}}},
+        {"second-choice-by-its-own-names", {"rmapi"}, "rmapi-only", {{"rmapi", "", management_names}}},
+    };
+    return all;
+}
+
+void install(const Installation& installation)
+{
+    if (installation.variant)
+        compose_variant(installation.variant);
+    else
+        compose_libraries(installation.libraries);
+}
+
+void hide(const std::string& library, const std::string& symbol)
+{
+    const std::string path = library_folder() + "/lib" + library + ".so";
+    const std::string bytes = Elf_File(path).without(symbol);
+    write_file(path, bytes);
+}
+
+void try_without(const Sound_Session& sound, const std::function<void()>& make_incomplete, bool may_keep_callbacks,
+                 Run_Watch& watch)
+{
+    Trial trial(watch);
+    make_incomplete();
+    trial.run_to_unload();
+    compose_libraries(all_libraries);
+    (void)trial.published(); // what is bound already stays as it is
+    trial.unload();
+    trial.expect_nothing_lent();
+    trial.load_again(sound, true);
+    trial.expect_nothing_left(may_keep_callbacks);
+}
+
+} // namespace
+
+std::uint64_t Sound_Session::all_calls() const
+{
+    std::uint64_t sum = 0;
+    for (const auto& one : calls)
+        sum += one.second.until_unload + one.second.in_unload;
+    return sum;
+}
+
+Sound_Session Sound_Session::hold()
+{
+    const Run_Result result = do_run(
+        {"the session without a failure", patience, [](Run_Watch& watch) { watch.tell(describe(measure(watch))); }});
+    if (!result.failure.empty()) throw std::runtime_error("the session without a failure fails:\n" + result.failure);
+    return understand(result.told);
+}
+
+const std::vector<Failure_Kind>& failure_kinds()
+{
+    static const std::vector<Failure_Kind> all = {
+        {"status-1", "status = 1", false},
+        {"status-7", "status = 7", false},
+        {"status-8", "status = 8", false},
+        {"status-9", "status = 9", false},
+        {"status-191", "status = 191", false},
+        {"null", "damage = \"null\"", false},
+        {"ones", "damage = \"ones\"", false},
+        {"garbage", "damage = \"garbage\"", false},
+        {"unterminated", "damage = \"unterminated\"", false},
+        {"count-0", "value = 0", false},
+        {"count-300", "value = 300", false},
+        {"count-huge", "value = 4294967295", false},
+        {"more-than-there-is", "value = 4294967295, status = 7", false},
+        {"throws", "throws = true", false},
+        {"vanishes", "vanish = true", false},
+        {"slow", "delay_ms = 2000", true},
+    };
+    return all;
+}
+
+std::vector<Run> library_call_trials(const Sound_Session& sound)
+{
+    std::vector<Run> trials;
+    for (const bool is_slow : {false, true})
+        for (const auto& [call, count] : sound.calls)
+            for (std::uint64_t ordinal = 1; ordinal <= count.until_unload + count.in_unload; ordinal++)
+                for (const Failure_Kind& kind : failure_kinds()) {
+                    if (kind.is_slow != is_slow) continue;
+                    trials.push_back({call + '#' + std::to_string(ordinal) + ':' + kind.name,
+                                      is_slow ? patience + delay : patience,
+                                      [&sound, call = call, ordinal, fault = kind.fault](Run_Watch& watch) {
+                                          try_call(sound, call, ordinal, fault, watch);
+                                      }});
+                }
+    return trials;
+}
+
+std::size_t sleeping_trials(const Sound_Session& sound)
+{
+    return sound.all_calls();
+}
+
+std::vector<Run> missing_symbol_trials(const Sound_Session& sound)
+{
+    std::vector<Run> trials;
+    const auto add = [&](const std::string& name, const std::function<void()>& make_incomplete) {
+        const bool may_keep_callbacks = name.find("HBA_RemoveCallback") != std::string::npos;
+        trials.push_back({name, patience, [&sound, make_incomplete, may_keep_callbacks](Run_Watch& watch) {
+                              try_without(sound, make_incomplete, may_keep_callbacks, watch);
+                          }});
+    };
+    for (const Installation& installation : installations())
+        for (const Installation::Lookup& lookup : installation.lookups)
+            for (const std::string& name : lookup.names) {
+                const std::string symbol = lookup.prefix + name;
+                add(std::string(installation.name) + ':' + lookup.library + '-' + symbol,
+                    [&installation, library = lookup.library, symbol] {
+                        install(installation);
+                        hide(library, symbol);
+                    });
+            }
+    for (unsigned bits = 0; bits < 1u << all_libraries.size(); bits++) {
+        std::vector<std::string> libraries;
+        std::string name = "installed";
+        for (std::size_t i = 0; i < all_libraries.size(); i++)
+            if (bits >> i & 1) {
+                libraries.push_back(all_libraries[i]);
+                name += '-' + all_libraries[i];
+            }
+        add(name, [libraries] { compose_libraries(libraries); });
+    }
+    return trials;
+}
+
+} // namespace nvrtest

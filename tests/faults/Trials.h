@@ -1,0 +1,53 @@
+/// What can fail about the libraries, each once: every call of a session in every way, every symbol and library that
+/// the module looks for.
+///
+/// A trial is a whole session with that failure, and then: each class answers, on threads of their own; a refresh of
+/// the sound host publishes what it does in a session without a failure; nothing stays behind after the unload, no
+/// thread, descriptor, handle or callback; a second load publishes the same again.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "tests/faults/Runs.h"
+
+namespace nvrtest {
+
+/// What a session without a failure does.
+struct Sound_Session {
+    struct Calls {
+        std::uint64_t until_unload = 0, in_unload = 0;
+    };
+    std::map<std::string, Calls> calls; ///< by the name of the operation
+    std::size_t handles = 0;            ///< open at the end of the script, of the libraries
+    std::string published;
+
+    std::uint64_t all_calls() const;
+    /// Held in a process of its own. Throws std::runtime_error if it is not sound.
+    static Sound_Session hold();
+};
+
+/// The ways in which a call fails.
+struct Failure_Kind {
+    const char* name;
+    /// The inside of a fault's table, but for call and place.
+    const char* fault;
+    bool is_slow;
+};
+const std::vector<Failure_Kind>& failure_kinds();
+
+/// A trial for each call of the session and each kind, named CALL#N:KIND: the Nth call of that name fails. Those that
+/// wait come last. The session must outlive them.
+std::vector<Run> library_call_trials(const Sound_Session& sound);
+/// How many of them, at the end, mostly sleep.
+std::size_t sleeping_trials(const Sound_Session& sound);
+
+/// A trial for each name that the module may look up, named LIBRARIES:LIBRARY-SYMBOL, where LIBRARIES are those that
+/// are installed; and one for each set of libraries, named LIBRARIES. In each the libraries are made whole while the
+/// module is loaded, and found by the next load.
+std::vector<Run> missing_symbol_trials(const Sound_Session& sound);
+
+} // namespace nvrtest

@@ -1,0 +1,133 @@
+// Everything that the libraries can do wrong, once: see README.md.
+#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <cstdio>
+#include <exception>
+#include <iostream>
+#include <random>
+#include <stdexcept>
+#include <string>
+#include <sys/mman.h>
+#include <vector>
+
+#include <CLI/CLI.hpp>
+
+#include "tests/faults/Trials.h"
+#include "tests/module/support/Rig.h"
+#include "tests/support/private_host_setup.h"
+
+namespace {
+
+using namespace nvrtest;
+
+struct Wanted {
+    bool is_all = false, is_list = false, is_absent = false;
+    std::size_t sample = 0, skip = 0;
+    std::uint64_t seed = 1;
+    std::string only;
+    unsigned at_once = 2;
+};
+
+// In an order by the seed, those behind the skipped ones. The same on every machine, unlike std::shuffle.
+std::vector<Run> sample_of(std::vector<Run> runs, const Wanted& wanted)
+{
+    std::mt19937_64 chance(wanted.seed);
+    for (std::size_t i = 0; i < runs.size(); i++)
+        std::swap(runs[i], runs[i + chance() % (runs.size() - i)]);
+    const std::size_t from = std::min(wanted.skip, runs.size()), to = std::min(from + wanted.sample, runs.size());
+    return {runs.begin() + static_cast<std::ptrdiff_t>(from), runs.begin() + static_cast<std::ptrdiff_t>(to)};
+}
+
+// Result: how many failed.
+std::size_t make(const std::vector<Run>& runs, unsigned at_once, const std::string& what)
+{
+    struct Counts {
+        std::atomic<std::size_t> done, failed;
+    };
+    void* memory = ::mmap(nullptr, sizeof(Counts), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+    if (memory == MAP_FAILED) throw std::runtime_error("no shared memory");
+    Counts& counts = *new (memory) Counts{};
+    const auto start = std::chrono::steady_clock::now();
+    do_runs(runs, at_once, [&](std::size_t index, const Run_Result& result) {
+        counts.done++;
+        if (!result.failure.empty()) {
+            counts.failed++;
+            std::printf("FAILED  nvr_faults --only '%s'\n%s\n", runs[index].name.c_str(), result.failure.c_str());
+        }
+        if (counts.done % 1000 == 0)
+            std::printf("%zu of %zu, %zu failed\n", counts.done.load(), runs.size(), counts.failed.load());
+    });
+    const auto seconds = std::chrono::duration_cast<std::chrono::seconds>(std::chrono::steady_clock::now() - start);
+    const std::size_t failed = counts.failed;
+    std::printf("%s: %zu runs, %zu failed, in %lld s\n", what.c_str(), counts.done.load(), failed,
+                static_cast<long long>(seconds.count()));
+    ::munmap(memory, sizeof(Counts));
+    return failed;
+}
+
+int run_only(const std::vector<Run>& runs, const std::string& name)
+{
+    for (const Run& run : runs) {
+        if (run.name != name) continue;
+        const Run_Result result = do_run(run, true);
+        std::printf("%s\n%s", result.failure.empty() ? "outlived" : "FAILED", result.failure.c_str());
+        return result.failure.empty() ? 0 : 1;
+    }
+    throw std::runtime_error("there is no run " + name + ": see --list");
+}
+
+int run(const Wanted& wanted)
+{
+    module_registrations(); // read once for all runs, as is the schema
+    const Sound_Session sound = Sound_Session::hold();
+    const std::vector<Run> calls = library_call_trials(sound), missing = missing_symbol_trials(sound);
+    std::printf("%llu library calls of %zu operations in a session, %zu kinds of failure: %zu runs; "
+                "%zu runs without a symbol or a library\n",
+                static_cast<unsigned long long>(sound.all_calls()), sound.calls.size(), failure_kinds().size(),
+                calls.size(), missing.size());
+    std::vector<Run> all = wanted.is_absent ? std::vector<Run>() : calls;
+    all.insert(all.end(), missing.begin(), missing.end());
+    if (wanted.is_list)
+        for (const Run& run : all)
+            std::printf("%s\n", run.name.c_str());
+    if (!wanted.only.empty()) return run_only(all, wanted.only);
+    if (wanted.sample > 0)
+        return make(sample_of(all, wanted), wanted.at_once, "a sample by the seed " + std::to_string(wanted.seed)) > 0;
+    if (!wanted.is_all && !wanted.is_absent) return 0;
+    std::size_t failed = make(missing, wanted.at_once, "without a symbol or a library");
+    if (wanted.is_all) {
+        const auto slow = calls.end() - static_cast<std::ptrdiff_t>(sleeping_trials(sound));
+        failed += make({calls.begin(), slow}, wanted.at_once, "a call that fails");
+        failed += make({slow, calls.end()}, 4 * wanted.at_once, "a call that takes two seconds");
+    }
+    return failed > 0;
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    CLI::App app("Holds a session of the module once for each library call in it and each way in which that can fail, "
+                 "and for each symbol and library that can be missing.");
+    Wanted wanted;
+    CLI::Option* all = app.add_flag("--all", wanted.is_all, "All of them");
+    app.add_flag("--absent", wanted.is_absent, "Of what is missing alone")->excludes(all);
+    CLI::Option* sample = app.add_option("--sample", wanted.sample, "So many of them")->excludes(all);
+    app.add_option("--seed", wanted.seed, "Which, with --sample")->needs(sample)->capture_default_str();
+    app.add_option("--skip", wanted.skip, "Behind so many others of that seed")->needs(sample);
+    app.add_option("--only", wanted.only, "This one, with what it prints");
+    app.add_flag("--list", wanted.is_list, "Print their names");
+    app.add_option("--at-once", wanted.at_once, "Up to so many at a time")
+        ->check(CLI::Range(1, 64))
+        ->capture_default_str();
+    CLI11_PARSE(app, argc, argv);
+    std::setvbuf(stdout, nullptr, _IOLBF, 0);
+    try {
+        nvrtest::enter_private_host(argv);
+        return run(wanted);
+    } catch (const std::exception& error) {
+        std::cerr << "nvr_faults: " << error.what() << '\n';
+        return 2;
+    }
+}
