@@ -35,11 +35,11 @@ public:
     /// `before_request` hears what is about to be asked, on the thread that asks.
     explicit Session(std::function<void(const std::string&)> before_request = {});
 
-    void run(const Part& part) { (this->*part.run)(); }
+    void run(const Part& part);
 
     /// What clients read after the next refresh of the host as it was at first: hardware as the scenario has it, no
-    /// faults. Every class's instances as text, without what depends on the time or on what happened before: log
-    /// entries, the records of diagnostics. Throws std::runtime_error if a class does not answer.
+    /// faults. Every class's instances as text, but for the entries of the module's log and their ties, which tell of
+    /// the past. Throws std::runtime_error if a class does not answer.
     std::string published();
     /// One class of it, without the refresh.
     std::string published(const std::string& class_name);

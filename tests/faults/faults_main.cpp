@@ -55,7 +55,7 @@ std::size_t make(const std::vector<Run>& runs, unsigned at_once, const std::stri
             counts.failed++;
             std::printf("FAILED  nvr_faults --only '%s'\n%s\n", runs[index].name.c_str(), result.failure.c_str());
         }
-        if (counts.done % 1000 == 0)
+        if (counts.done % 100 == 0)
             std::printf("%zu of %zu, %zu failed\n", counts.done.load(), runs.size(), counts.failed.load());
     });
     const auto seconds = std::chrono::duration_cast<std::chrono::seconds>(std::chrono::steady_clock::now() - start);

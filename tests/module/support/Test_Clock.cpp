@@ -9,12 +9,25 @@
 
 namespace nvrtest {
 
-static std::atomic<long long> ahead{0};  // seconds
-static std::atomic<long long> asleep{0}; // microseconds
+static std::atomic<long long> ahead{0};      // seconds
+static std::atomic<long long> asleep{0};     // microseconds
+static std::atomic<long long> stopped_at{0}; // microseconds; 0: it goes
+
+static long long machine_time()
+{
+    timespec now;
+    clock_gettime(CLOCK_REALTIME, &now);
+    return now.tv_sec * 1000000LL + now.tv_nsec / 1000;
+}
 
 void advance_clock(std::chrono::seconds by)
 {
     ahead += by.count();
+}
+
+void stop_clock()
+{
+    stopped_at = machine_time();
 }
 
 std::chrono::microseconds slept()
@@ -26,10 +39,9 @@ std::chrono::microseconds slept()
 
 extern "C" __attribute__((visibility("default"))) int gettimeofday(timeval* time, void* zone) noexcept
 {
-    timespec now;
-    clock_gettime(CLOCK_REALTIME, &now);
-    time->tv_sec = now.tv_sec + nvrtest::ahead.load();
-    time->tv_usec = now.tv_nsec / 1000;
+    const long long stopped = nvrtest::stopped_at, now = stopped ? stopped : nvrtest::machine_time();
+    time->tv_sec = now / 1000000 + nvrtest::ahead.load();
+    time->tv_usec = now % 1000000;
     if (zone) *static_cast<struct timezone*>(zone) = {0, 0};
     return 0;
 }

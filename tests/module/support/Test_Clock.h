@@ -12,6 +12,9 @@ namespace nvrtest {
 /// From now on the time of day is later by so much more. Any thread.
 void advance_clock(std::chrono::seconds by);
 
+/// From now on time passes only by advance_clock: how long something takes decides nothing any more. Any thread.
+void stop_clock();
+
 /// How long all sleeps so far would have lasted. They leave the time of day alone. Any thread.
 std::chrono::microseconds slept();
 
