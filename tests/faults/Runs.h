@@ -41,7 +41,7 @@ private:
 
 struct Run {
     std::string name;
-    /// How long a step may take.
+    /// How long a step may take; up to the first one it is a minute.
     std::chrono::milliseconds patience;
     std::function<void(Run_Watch&)> work;
 };
