@@ -117,15 +117,15 @@ public:
     NVR_SysLogger m_sysLogger;
     NvrConfigFile m_config;
 
-    Mutex m_DataMutex{false};
+    Mutex m_DataMutex{false, "m_DataMutex", Lock_Place::data};
     std::atomic<bool> m_bIsAdapterDataReady{false};
-    Mutex m_AdapterDataReadyMutex{false};
+    Mutex m_AdapterDataReadyMutex{false, "m_AdapterDataReadyMutex", Lock_Place::adapter_data_ready};
     Cond m_AdapterDataReadyCond;
     std::atomic<bool> m_bIsAdapterMapsReady{false};
-    Mutex m_AdapterMapsReadyMutex{false};
+    Mutex m_AdapterMapsReadyMutex{false, "m_AdapterMapsReadyMutex", Lock_Place::adapter_maps_ready};
     Cond m_AdapterMapsReadyCond;
     std::atomic<bool> m_bIsSANMapsReady{false};
-    Mutex m_SANMapsReadyMutex{false};
+    Mutex m_SANMapsReadyMutex{false, "m_SANMapsReadyMutex", Lock_Place::san_maps_ready};
     Cond m_SANMapsReadyCond;
 
     String m_osName;
@@ -289,7 +289,7 @@ public:
 
     Datetime m_loadedTime;    // when the last refresh ended
     Thread m_dataFetchThread; // empty: none was started, or it was joined
-    Mutex m_DataFetchMutex{false};
+    Mutex m_DataFetchMutex{false, "m_DataFetchMutex", Lock_Place::innermost};
     std::atomic<bool> m_bDataFetchRunning{false};
     std::atomic<uint32> m_SANWaiters{0}; // SAN enumerations that wait for their maps
     Ref<Instance> m_pBaseServerProfile;

@@ -26,7 +26,7 @@ void enumerateActive(ProviderAgent& agent, const Instance_Map& source, const Enu
 template <void (ProviderAgent::*refresh)()>
 void enumerateActive(ProviderAgent& agent, const Instance_Map& source, const Enum_Handler& handler)
 {
-    static Immortal<Mutex> refresh_mutex(true);
+    static Immortal<Mutex> refresh_mutex(true, "refresh_mutex", Lock_Place::live_values);
     enumerateActive(agent, source, handler, refresh, *refresh_mutex);
 }
 

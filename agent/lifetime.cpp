@@ -10,7 +10,7 @@ namespace cimple {
 
 namespace {
 
-Mutex lifetime_mutex(false);
+Mutex lifetime_mutex(false, "lifetime_mutex", Lock_Place::lifetime);
 ProviderAgent* the_agent = nullptr;
 std::atomic<sint32> reference_count{0};
 std::atomic<sint32> refused_count{0}; // loads that were answered 30 and will be unloaded all the same
@@ -109,6 +109,7 @@ void ProviderAgent::releaseRef()
     }
     releasing--;
     if (used || releasing > 0) return;
+    const Unreachable_Locks the_agents; // no call and no thread is left that could hold one
     delete the_agent;
     the_agent = nullptr;
 }

@@ -15,7 +15,8 @@ namespace cimple {
 
 namespace {
 
-Mutex mutex(false); // held while the two files are written, and for moments
+// Held while the two files are written, and for moments.
+Mutex mutex(false, "settings_at_exit", Lock_Place::innermost);
 NvrConfigFile* living = nullptr;
 std::atomic<pid_t> owner{0};
 bool registered = false;

@@ -112,8 +112,9 @@ thread_local Running_Call* innermost_call = nullptr;
 
 CMPI_Adapter::CMPI_Adapter(MI_Table_Set* tables, const Registration* registration, const CMPIBroker* broker)
     : registration(registration), proc(registration->proc), provider(nullptr), broker(broker), static_data(tables),
-      load_count(0), allow_unload(true), meta_class(nullptr), indications_enabled(false), lock(true),
-      filters_lock(false), m_users(1)
+      load_count(0), allow_unload(true), meta_class(nullptr), indications_enabled(false),
+      lock(true, registration->provider_name, Lock_Place::observed),
+      filters_lock(false, "filters_lock", Lock_Place::innermost), m_users(1)
 {
     call(OP_CREATE_PROVIDER, &provider);
 }
@@ -182,7 +183,7 @@ const Meta_Class* CMPI_Adapter::find_class(const char* name) const
 Adapter_Use::Adapter_Use(MI_Table_Set* tables)
 {
     if (!tables) return;
-    Tables_Lock locked(tables);
+    Auto_Mutex locked(tables->mutex);
     if (tables->adapter && tables->adapter->hold()) m_adapter = tables->adapter;
 }
 
@@ -246,7 +247,7 @@ extern "C" int cimple_cmpi_adapter(char, MI_Table_Set* tables, Registration* reg
     const int found_errno = errno;
     try {
         Adapter_Use unfinished; // goes after the lock: no provider is destroyed under it
-        Tables_Lock locked(tables);
+        Auto_Mutex locked(tables->mutex);
         if (tables->adapter) {
             ++tables->adapter->load_count;
         } else {
@@ -274,7 +275,7 @@ namespace {
 // One load less. True for the last: the adapter has left its table then, and lives on the counts of its users.
 bool count_down(MI_Table_Set* set, CMPI_Adapter* adapter)
 {
-    Tables_Lock locked(set);
+    Auto_Mutex locked(set->mutex);
     if (set->adapter != adapter) return false; // another clean-up was the last one meanwhile
     if (adapter->load_count != 1) {
         --adapter->load_count;

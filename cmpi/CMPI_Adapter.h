@@ -1,6 +1,6 @@
 /// What stands behind the CMPI calls of one provider: its MI tables, its provider object, its lock, its life.
 ///
-/// An MI_Table_Set is the static record of a provider, valid when all zero: it finds the adapter for calls that come
+/// An MI_Table_Set is the static record of a provider, made before any code of ours runs: it finds the adapter for calls that come
 /// through `hdl`. The adapter lives from the first factory call to the last clean-up, and on until no call runs in it
 /// and no thread context made from it is left. Any thread; `lock` makes one request after the other, `mutex` of the set
 /// guards what factories and clean-ups share.
@@ -42,8 +42,8 @@ struct MI_Table_Set {
     char indication_name[name_size];
     char association_name[name_size];
     /// Covers `adapter` and the adapter's `load_count`; taken to find the adapter and to count a call in. Held through
-    /// construction, never through an unload, a destruction or an operation. All zero is an unlocked mutex.
-    pthread_mutex_t mutex;
+    /// construction, never through an unload, a destruction or an operation.
+    Mutex mutex{false, "MI_Table_Set", Lock_Place::observed};
 };
 
 /// One heap object a provider, made by cimple_cmpi_adapter.
@@ -111,7 +111,7 @@ private:
     friend class Running_Call;
 
     std::atomic<uint32> m_users;
-    Mutex m_calls_mutex{false}; // innermost; guards the next three
+    Mutex m_calls_mutex{false, "m_calls_mutex", Lock_Place::innermost}; // innermost; guards the next three
     Cond m_call_ended;
     uint32 m_calls = 0; // that run
     bool m_unloaded = false;
@@ -155,18 +155,6 @@ public:
 private:
     CMPI_Adapter* m_adapter = nullptr;
     Running_Call* m_outer;
-};
-
-/// Holds a table set's mutex for a scope.
-class Tables_Lock {
-public:
-    explicit Tables_Lock(MI_Table_Set* tables) : m_mutex(&tables->mutex) { pthread_mutex_lock(m_mutex); }
-    ~Tables_Lock() { pthread_mutex_unlock(m_mutex); }
-    Tables_Lock(const Tables_Lock&) = delete;
-    Tables_Lock& operator=(const Tables_Lock&) = delete;
-
-private:
-    pthread_mutex_t* m_mutex;
 };
 
 /// The one factory behind all entry stubs. `tag` is ignored ('C' by custom). `kind` is 'I' instance, 'M' method,

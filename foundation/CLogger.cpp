@@ -25,7 +25,7 @@ thread_local bool holds_dispatch_mutex = false;
 
 Mutex& dispatch_mutex()
 {
-    static Immortal<Mutex> mutex(false);
+    static Immortal<Mutex> mutex(false, "dispatch_mutex", Lock_Place::log);
     return *mutex;
 }
 

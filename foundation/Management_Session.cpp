@@ -20,7 +20,8 @@ namespace {
 
 // What all instances share. The names carry the process id, so that each process guards its own copy of the library.
 struct Session {
-    Mutex mutex{false};     // guards the rest; never held while waiting for the guard
+    // Guards the rest; never held while waiting for the guard.
+    Mutex mutex{false, "Management_Session", Lock_Place::innermost};
     sem_t* guard = nullptr; // null: not open
     int openings = 0;       // of the guard by this process, each of which needs a close
     sem_t* done = nullptr;  // made by the initialiser, used by nobody, left behind

@@ -43,10 +43,10 @@ private:
     Alert_Queue() = default;
     bool isEmpty();
 
-    Mutex m_IndicationQueueMutex{false};
+    Mutex m_IndicationQueueMutex{false, "m_IndicationQueueMutex", Lock_Place::innermost};
     std::deque<indication_data> m_IndicationQueue;
     bool m_takes = false; // under the queue's mutex
-    Mutex m_IndicationSignalMutex{false};
+    Mutex m_IndicationSignalMutex{false, "m_IndicationSignalMutex", Lock_Place::alert_signal};
     Cond m_IndicationSignalCond;
     std::atomic<bool> m_bIndicationCleanUp{true}; // written under the signal's mutex
 };

@@ -14,9 +14,9 @@ namespace {
 
 /// Held through each enabling and each clean-up, also while the latter waits for the worker. Before
 /// m_IndicationProviderMutex.
-Mutex change_mutex(false);
+Mutex change_mutex(false, "change_mutex", Lock_Place::alert_changes);
 
-Mutex m_IndicationProviderMutex(false);
+Mutex m_IndicationProviderMutex(false, "m_IndicationProviderMutex", Lock_Place::alerts);
 
 /// The worker's hold of m_IndicationProviderMutex, with its words.
 class Spoken_Lock {

@@ -6,6 +6,8 @@
 
 #include <pthread.h>
 
+#include "runtime/Lock_Order.h"
+
 namespace cimple {
 
 struct MutexRep {
@@ -14,9 +16,10 @@ struct MutexRep {
 
 class Mutex {
 public:
-    /// `recursive`: the owner may lock it again.
-    explicit constexpr Mutex(bool recursive = true) noexcept
-        : _rep(recursive ? MutexRep{PTHREAD_RECURSIVE_MUTEX_INITIALIZER_NP} : MutexRep{PTHREAD_MUTEX_INITIALIZER})
+    /// `recursive`: the owner may lock it again. `name` and `place` are those of the lock order (runtime/Lock_Order.h).
+    constexpr Mutex(bool recursive, const char* name, Lock_Place place) noexcept
+        : m_order(name, place, recursive),
+          _rep(recursive ? MutexRep{PTHREAD_RECURSIVE_MUTEX_INITIALIZER_NP} : MutexRep{PTHREAD_MUTEX_INITIALIZER})
     {
     }
     Mutex(const Mutex&) = delete;
@@ -33,6 +36,7 @@ public:
 
 private:
     friend class Cond;
+    [[no_unique_address]] Ordered_Lock m_order; // empty where nothing is checked
     MutexRep _rep;
 };
 

@@ -26,7 +26,8 @@ constexpr int number_of_levels = 5;
 constexpr int closed = -1;
 constexpr std::size_t longest_line = 1024; // of the configuration file
 
-Mutex log_mutex(false); // guards what follows
+// Guards what follows.
+Mutex log_mutex(false, "log_mutex", Lock_Place::log);
 bool log_asked = false; // opened, or found closed, once and for all
 std::FILE* log_file = nullptr;
 int log_lock_file = -1;

@@ -361,7 +361,7 @@ TEST(ContextDeathTest, AContextLeftOnTheStackFailsAnAssertion)
 
 TEST(MutexLock, ARecursiveMutexMayBeTakenAgain)
 {
-    Mutex mutex(true);
+    Mutex mutex(true, "a recursive one", Lock_Place::observed);
     mutex.lock();
     mutex.lock();
     EXPECT_EQ(mutex.try_lock(), 0);
@@ -378,7 +378,7 @@ TEST(MutexLock, ARecursiveMutexMayBeTakenAgain)
 TEST(MutexLock, APlainMutexMayNot)
 {
     EXPECT_EQ(EBUSY, 16);
-    Mutex mutex(false);
+    Mutex mutex(false, "a plain one", Lock_Place::observed);
     EXPECT_EQ(mutex.try_lock(), 0);
     EXPECT_EQ(mutex.try_lock(), EBUSY);
     mutex.unlock();
@@ -389,7 +389,7 @@ TEST(MutexLock, APlainMutexMayNot)
 TEST(MutexLock, OtherFailuresOfTryLockAreMinusOne)
 {
     const System_Fault fault(System_Fault::try_lock, EINVAL);
-    Mutex mutex;
+    Mutex mutex{true, "one", Lock_Place::observed};
     EXPECT_EQ(mutex.try_lock(), -1);
 }
 
@@ -398,7 +398,7 @@ TEST(MutexDeathTest, AFailingLockStopsTheProcess)
     EXPECT_DEATH(
         {
             const System_Fault fault(System_Fault::lock, EINVAL);
-            Mutex mutex;
+            Mutex mutex(true, "one", Lock_Place::observed);
             mutex.lock();
         },
         "pthread_mutex_lock\\(&\\(\\(MutexRep\\*\\)_rep\\)->mutex\\) == 0");
@@ -407,7 +407,7 @@ TEST(MutexDeathTest, AFailingLockStopsTheProcess)
 TEST(Condition, WaitersAreWokenOneByOneAndTogether)
 {
     struct Shared {
-        Mutex mutex;
+        Mutex mutex{true, "one", Lock_Place::observed};
         Cond cond;
         int tokens = 0;
         int woken = 0;
