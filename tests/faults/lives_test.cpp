@@ -1,0 +1,147 @@
+// The module opened, loaded, asked, unloaded and closed a thousand times in one process, which is then as it was.
+//
+// Closing does not take it out of the process (docs/architecture.md): each opening finds the same module at the same
+// place. NVR_LIVES=10000 in the environment makes them so many.
+#include <algorithm>
+#include <chrono>
+#include <cstdlib>
+#include <cstring>
+#include <dirent.h>
+#include <dlfcn.h>
+#include <fstream>
+#include <malloc.h>
+#include <string>
+#include <thread>
+#include <unistd.h>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include "simulator/nvrsim.h"
+#include "tests/module/support/Entries.h"
+#include "tests/module/support/Rig.h"
+#include "tests/module/support/Test_Clock.h"
+#include "tests/support/private_host.h"
+#include "tests/support/simulator.h"
+
+using namespace nvrtest;
+using testing::IsEmpty;
+
+namespace {
+
+constexpr char scan[] = "HBA_GetNumberOfAdapters";
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr unsigned usual_lives = 50, first_lives = 10;
+#else
+constexpr unsigned usual_lives = 1000;
+constexpr unsigned first_lives = 300; // until the server that asks holds all that it will
+#endif
+
+unsigned number_of_lives()
+{
+    const char* asked = std::getenv("NVR_LIVES");
+    return asked ? static_cast<unsigned>(std::atoi(asked)) : usual_lives;
+}
+
+// Those with `part` in them.
+std::vector<std::string> names_in(const char* folder, const std::string& part = {})
+{
+    std::vector<std::string> names;
+    DIR* entries = opendir(folder);
+    while (const dirent* entry = readdir(entries))
+        if (strstr(entry->d_name, part.c_str())) names.push_back(entry->d_name);
+    closedir(entries);
+    std::sort(names.begin(), names.end());
+    return names;
+}
+
+/// What a process holds of its system.
+struct Holdings {
+    std::vector<std::string> files = names_in("/proc/self/fd");
+    std::size_t threads = names_in("/proc/self/task").size();
+    std::vector<std::string> shared_memory = names_in("/dev/shm", '_' + std::to_string(getpid()));
+    std::size_t mappings = 0; ///< that have a file
+    std::size_t bytes = mallinfo2().uordblks + mallinfo2().hblkhd;
+    std::size_t resident = 0; ///< kilobytes
+
+    Holdings()
+    {
+        std::ifstream maps("/proc/self/maps");
+        for (std::string line; std::getline(maps, line);)
+            mappings += line.find('/') != std::string::npos;
+        std::ifstream status("/proc/self/statm");
+        std::size_t size = 0;
+        status >> size >> resident;
+        resident *= static_cast<std::size_t>(sysconf(_SC_PAGESIZE)) / 1024;
+    }
+};
+
+/// One life of the module, from its opening to its closing; the place of its code.
+void* live(Rig& rig, unsigned life)
+{
+    Entries entries;
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        const auto ask = [&](CMPIInstanceMI* mi, const char* class_name) {
+            CMPIStatus status;
+            CMPIObjectPath* path = broker->eft->newObjectPath(broker, "root/norvane", class_name, &status);
+            mi->ft->enumerateInstanceNames(mi, context, nullptr, path);
+            path->ft->release(path);
+        };
+        CMPIInstanceMI* disks = entries.instances("NVRHBA_StorageVolume", broker, context);
+        CMPIInstanceMI* settings = entries.instances("NVRHBA_ProviderConfigSetting", broker, context);
+        CMPIIndicationMI* alerts = entries.indications("NVRHBA_AlertIndication", broker, context);
+        ASSERT_TRUE(disks && settings && alerts);
+        const std::uint64_t scans = calls(scan);
+        ask(disks, "NVRHBA_StorageVolume"); // waits for the refresh that it starts
+        EXPECT_EQ(calls(scan), scans + 1);
+        if (life % 3 == 0) {
+            EXPECT_EQ(alerts->ft->enableIndications(alerts, context).rc, CMPI_RC_OK);
+            EXPECT_EQ(nvrsim_callbacks(), 1u);
+        }
+        if (life % 2 == 0) { // the end comes while a refresh runs
+            advance_clock(std::chrono::minutes(31));
+            ask(settings, "NVRHBA_ProviderConfigSetting");
+        }
+        EXPECT_EQ(alerts->ft->cleanup(alerts, context, 1).rc, CMPI_RC_OK);
+        EXPECT_EQ(settings->ft->cleanup(settings, context, 1).rc, CMPI_RC_OK);
+        EXPECT_EQ(disks->ft->cleanup(disks, context, 1).rc, CMPI_RC_OK);
+    });
+    // The refresh asked for profiles, so that the server has a provider of the module loaded too.
+    while (rig.server().is_loaded(NVR_MODULE))
+        rig.server().unload_idle();
+    return dlsym(entries.handle(), "cimple_module");
+}
+
+} // namespace
+
+TEST(Lives, AThousandLeaveTheProcessAsItWas)
+{
+    Rig rig({host::Manner::strict(), "small", refreshing_settings});
+    remove(dmp_path); // and no line is written
+    void* place = nullptr;
+    for (unsigned life = 0; life < first_lives; life++)
+        place = live(rig, life);
+    rig.restart(); // a server of its own keeps what it logged of the module
+    const Holdings before;
+    const unsigned lives = number_of_lives();
+    for (unsigned life = 0; life < lives; life++) {
+        ASSERT_EQ(live(rig, life), place) << "life " << life;
+        ASSERT_EQ(nvrsim_open_handles(), 0u) << "life " << life;
+        ASSERT_EQ(nvrsim_callbacks(), 0u) << "life " << life;
+    }
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
+    EXPECT_EQ(left_beside_strings(rig.server().report()), 0u) << rig.server().report().to_text();
+    EXPECT_EQ(rig.server().report().contexts_not_detached, 0u);
+    rig.restart();
+    const Holdings after;
+    EXPECT_EQ(after.files, before.files);
+    EXPECT_EQ(after.threads, before.threads);
+    EXPECT_EQ(after.shared_memory, before.shared_memory);
+    EXPECT_EQ(after.mappings, before.mappings);
+#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+    EXPECT_LT(after.bytes, before.bytes + 16 * lives); // half of what the smallest block a life is
+    EXPECT_LT(after.resident, before.resident + 2 * lives);
+#endif
+    RecordProperty("bytes", std::to_string(static_cast<long>(after.bytes - before.bytes)));
+    RecordProperty("kilobytes resident", std::to_string(static_cast<long>(after.resident - before.resident)));
+}

@@ -1,0 +1,360 @@
+// All that clients do, on eight threads at once: nobody waits for ever, and nothing is different afterwards.
+//
+// NVR_ROUNDS=1000 in the environment makes the rounds so many.
+#include <array>
+#include <atomic>
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <functional>
+#include <mutex>
+#include <random>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include "simulator/nvrsim.h"
+#include "tests/faults/Session.h"
+#include "tests/module/support/Entries.h"
+#include "tests/module/support/Firmware.h"
+#include "tests/module/support/Instance_Text.h"
+#include "tests/module/support/Quiet_Output.h"
+#include "tests/module/support/Service_Methods.h"
+#include "tests/module/support/Test_Clock.h"
+#include "tests/support/simulator.h"
+#include "tests/support/trace.h"
+
+using namespace nvrtest;
+using host::Value;
+using testing::IsEmpty;
+using namespace std::chrono_literals;
+
+namespace {
+
+constexpr char name_space[] = "root/norvane";
+constexpr char settings_class[] = "NVRHBA_ProviderConfigSetting";
+constexpr unsigned number_of_clients = 8;
+constexpr std::uint32_t link_up = 514;
+
+// What a call may take while no library is slow; the sanitizers' builds are.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr auto patience = 50s;
+constexpr unsigned usual_rounds = 1;
+#else
+constexpr auto patience = 10s;
+constexpr unsigned usual_rounds = 3;
+#endif
+
+unsigned rounds()
+{
+    const char* asked = std::getenv("NVR_ROUNDS");
+    return asked ? static_cast<unsigned>(std::atoi(asked)) : usual_rounds;
+}
+
+/// Ends the process, with the call's name, where a call waits too long. What clients tell it orders nothing between
+/// them, so that the thread sanitizer sees them as they are.
+class Watchdog {
+public:
+    Watchdog() : m_thread([this] { watch(); }) {}
+    ~Watchdog()
+    {
+        m_over = true;
+        m_thread.join();
+    }
+    Watchdog(const Watchdog&) = delete;
+    Watchdog& operator=(const Watchdog&) = delete;
+
+    /// `what` is a literal.
+    template <class Call>
+    auto during(unsigned client, const char* what, Call call)
+    {
+        struct Turn {
+            Turn(Watched& watched, const char* what) : m_watched(watched)
+            {
+                m_watched.what.store(what, std::memory_order_relaxed);
+                m_watched.since.store(now(), std::memory_order_relaxed);
+            }
+            ~Turn() { m_watched.since.store(0, std::memory_order_relaxed); }
+            Watched& m_watched;
+        } turn(m_watched[client], what);
+        return call();
+    }
+
+private:
+    struct Watched {
+        std::atomic<std::int64_t> since{0}; // 0: in no call
+        std::atomic<const char*> what{nullptr};
+    };
+    static std::int64_t now() { return std::chrono::steady_clock::now().time_since_epoch().count(); }
+    void watch()
+    {
+        while (!m_over) {
+            for (const Watched& one : m_watched) {
+                const std::int64_t since = one.since.load(std::memory_order_relaxed);
+                if (since == 0 || std::chrono::steady_clock::duration(now() - since) < patience) continue;
+                std::fprintf(stderr, "A call waits for ever: %s\n", one.what.load(std::memory_order_relaxed));
+                std::abort();
+            }
+            std::this_thread::sleep_for(50ms);
+        }
+    }
+
+    std::array<Watched, number_of_clients> m_watched;
+    std::atomic<bool> m_over{false};
+    std::thread m_thread;
+};
+
+/// Runs `body` on as many threads as there are clients, and waits for them.
+void on_all_clients(const std::function<void(unsigned)>& body)
+{
+    std::vector<std::thread> threads;
+    for (unsigned client = 0; client < number_of_clients; client++)
+        threads.emplace_back(body, client);
+    for (std::thread& thread : threads)
+        thread.join();
+}
+
+/// Clients of one host, who do one thing after the other as dice say.
+class Clients {
+public:
+    Clients(Rig& rig, Watchdog& watchdog) : m_rig(rig), m_watchdog(watchdog), m_classes(rig.classes())
+    {
+        m_ports = rig.names("NVRHBA_FCPort").paths;
+        m_controllers = rig.names("NVRHBA_PortController").paths;
+        m_tests = rig.names("NVRHBA_FCHBADiagnosticTest").paths;
+        m_logs = rig.names("NVRHBA_DiagnosticsLog").paths;
+        m_settings = rig.names(settings_class).paths;
+        for (const Service_Method& method : service_methods())
+            m_methods.push_back({rig.names(method.service).paths.at(0), method.name, method.others});
+    }
+
+    void act(unsigned client, unsigned seed)
+    {
+        Dice dice(seed);
+        for (unsigned i = 0; i < 25; i++)
+            (this->*actions[dice() % actions.size()])(client, dice);
+    }
+
+    std::uint64_t answered() const { return m_answered; }
+    std::uint64_t unloads() const { return m_unloads; }
+    /// What no turn of the others can make right.
+    const std::vector<std::string>& wrong() const { return m_wrong; }
+
+private:
+    using Dice = std::minstd_rand;
+    using Action = void (Clients::*)(unsigned client, Dice& dice);
+    static const std::vector<Action> actions;
+    struct Method {
+        host::Path service;
+        const char* name;
+        Arguments others;
+    };
+
+    template <class T>
+    static const T& one_of(const std::vector<T>& all, Dice& dice)
+    {
+        return all.at(dice() % all.size());
+    }
+
+    template <class Request>
+    void ask(unsigned client, const char* what, Request request)
+    {
+        const host::Answer answer = m_watchdog.during(client, what, [&] { return request(m_rig.server()); });
+        m_answered.fetch_add(answer.ok(), std::memory_order_relaxed);
+        // What the module may answer changes with the others' turns; that it does is what counts.
+        if (answer.status.fault != host::Fault::nobody && answer.status.fault != host::Fault::provider)
+            found_wrong(what, answer.status);
+    }
+    void found_wrong(const char* what, const host::Status& status)
+    {
+        const std::lock_guard<std::mutex> lock(m_mutex);
+        m_wrong.push_back(std::string(what) + ": " + status.message);
+    }
+    void call(unsigned client, const host::Path& path, const char* name, const Arguments& arguments)
+    {
+        ask(client, name, [&](host::Host& server) { return server.call(path, name, arguments); });
+    }
+
+    void enumerate(unsigned client, Dice& dice)
+    {
+        const std::string& name = one_of(m_classes, dice);
+        if (name == "NVRHBA_AlertIndication") return;
+        ask(client, "enumerate", [&](host::Host& server) {
+            return dice() % 2 ? server.enumerate(name_space, name) : server.names(name_space, name);
+        });
+    }
+    void traverse(unsigned client, Dice& dice)
+    {
+        const host::Path& from = one_of(dice() % 2 ? m_ports : m_controllers, dice);
+        const char* const over = dice() % 2 ? "NVRHBA_FCPortConformsToProfile" : "NVRHBA_ControlledBy";
+        ask(client, "associators", [&](host::Host& server) { return server.associators(from, over); });
+        ask(client, "reference names", [&](host::Host& server) { return server.reference_names(from, over); });
+    }
+    void get_live_values(unsigned client, Dice& dice)
+    {
+        advance_clock(11s); // so that they are read again
+        ask(client, "get a port", [&](host::Host& server) { return server.get(one_of(m_ports, dice)); });
+        const char* const name = dice() % 2 ? "NVRHBA_FCPortStatistics" : "NVRHBA_DriverParams";
+        ask(client, "enumerate live values", [&](host::Host& server) { return server.enumerate(name_space, name); });
+    }
+    void refresh(unsigned client, Dice&)
+    {
+        advance_clock(31min);
+        ask(client, "start a refresh", [](host::Host& server) { return server.enumerate(name_space, settings_class); });
+    }
+    void change_a_setting(unsigned client, Dice& dice)
+    {
+        const std::size_t which = dice() % m_settings.size(); // the time-out, and two switches
+        change_setting(client, which, which == 0 ? 1 + dice() % 30 : dice() % 2);
+    }
+    void serve(unsigned client, Dice& dice)
+    {
+        const Method& method = one_of(m_methods, dice);
+        Arguments arguments = method.others;
+        arguments.push_back({"Target", Value::reference(one_of(m_ports, dice))});
+        call(client, method.service, method.name, arguments);
+    }
+    void diagnose(unsigned client, Dice& dice)
+    {
+        const host::Path& test = one_of(m_tests, dice);
+        host::Instance settings;
+        settings.path.class_name = "NVRHBA_FCHBADiagnosticSettingData";
+        settings.path.name_space = name_space;
+        settings.set("InstanceID", *test.find("Name"));
+        settings.set("LoopControlParameter", texts_value({"2"}));
+        settings.set("TargetDevice", Value::string("50060E8005A10000"));
+        call(client, test, "RunDiagnosticService",
+             {{"ManagedElement", Value::reference(one_of(m_controllers, dice))},
+              {"DiagnosticSettings", Value::instance(settings)}});
+        if (dice() % 4 == 0) call(client, one_of(m_logs, dice), "ClearLog", {});
+    }
+    void listen(unsigned client, Dice&)
+    {
+        int id = 0;
+        const host::Status subscribed = m_watchdog.during(client, "subscribe", [&] {
+            return m_rig.server().subscribe(
+                name_space, "NVRHBA_AlertIndication", [](const host::Indication&) {}, id);
+        });
+        if (!subscribed.ok()) return found_wrong("subscribe", subscribed);
+        for (unsigned i = 0; i < 3; i++)
+            m_watchdog.during(client, "an event", [] { return nvrsim_event("0", link_up, 0); });
+        // It may be gone: this server unloads what is idle, whoever listens.
+        m_watchdog.during(client, "unsubscribe", [&] { return m_rig.server().unsubscribe(id); });
+    }
+    void unload(unsigned client, Dice&)
+    {
+        const host::Unload_Result result =
+            m_watchdog.during(client, "unload what is idle", [&] { return m_rig.server().unload_idle(); });
+        m_unloads.fetch_add(static_cast<unsigned>(result.closed), std::memory_order_relaxed);
+    }
+
+    void change_setting(unsigned client, std::size_t which, std::uint32_t value)
+    {
+        host::Instance setting;
+        setting.path = m_settings.at(which);
+        for (const host::Named_Value& key : setting.path.keys)
+            setting.set(key.name, key.value);
+        setting.set("current", Value::uint32(value));
+        ask(client, "change a setting",
+            [&](host::Host& server) { return server.modify(setting, std::vector<std::string>{"current"}); });
+    }
+
+    Rig& m_rig;
+    Watchdog& m_watchdog;
+    std::vector<std::string> m_classes;
+    std::vector<host::Path> m_ports, m_controllers, m_tests, m_logs, m_settings;
+    std::vector<Method> m_methods;
+    std::atomic<std::uint64_t> m_answered{0}, m_unloads{0};
+    std::mutex m_mutex;
+    std::vector<std::string> m_wrong;
+
+public:
+    void restore_settings()
+    {
+        for (std::size_t which = 0; which < m_settings.size(); which++)
+            change_setting(0, which, which == 0 ? 10 : 1);
+    }
+};
+
+const std::vector<Clients::Action> Clients::actions = {
+    &Clients::enumerate,        &Clients::enumerate, &Clients::traverse, &Clients::get_live_values, &Clients::refresh,
+    &Clients::change_a_setting, &Clients::serve,     &Clients::diagnose, &Clients::listen,          &Clients::unload,
+};
+
+} // namespace
+
+TEST(Threads, OfAllThatClientsDoWaitForNoneForEverAndChangeNothing)
+{
+    Session session;
+    Rig& rig = session.rig();
+    const std::string before = session.published();
+    Watchdog watchdog;
+    Clients clients(rig, watchdog);
+    for (unsigned round = 0; round < rounds(); round++) {
+        {
+            const Quiet_Output quiet; // the bridge prints some of what it is asked
+            on_all_clients([&](unsigned client) { clients.act(client, 1 + round * number_of_clients + client); });
+        }
+        EXPECT_THAT(clients.wrong(), IsEmpty()) << "round " << round;
+        EXPECT_THAT(rig.server().report().violations, IsEmpty()) << "round " << round;
+        // A life ends while a refresh runs.
+        advance_clock(31min);
+        ASSERT_THAT(rig.enumerate(settings_class), succeeded());
+        watchdog.during(0, "stop", [&] { rig.stop(); });
+        EXPECT_EQ(left_beside_strings(rig.server().report()), 0u) << rig.server().report().to_text();
+        EXPECT_EQ(rig.server().report().contexts_not_detached, 0u);
+        // The tag library's closing call is looked for in another library than its opening one, and not found.
+        EXPECT_EQ(nvrsim_open_handles(), calls("CPQFC_OpenAdapter"));
+        EXPECT_EQ(nvrsim_callbacks(), 0u);
+        rig.restart();
+    }
+    clients.restore_settings();
+    EXPECT_EQ(difference(before, session.published()), "");
+    EXPECT_GT(clients.answered(), rounds() * number_of_clients);
+    RecordProperty("answered", std::to_string(clients.answered()));
+    RecordProperty("unloads", std::to_string(clients.unloads()));
+}
+
+// Last clean-ups and first factories, from eight sides at once: the agent comes and goes all the time.
+TEST(Threads, ThatLoadAndUnloadMeet)
+{
+    Rig rig({host::Manner::strict(), "small", refreshing_settings});
+    Entries entries;
+    Watchdog watchdog;
+    const std::vector<std::string> classes = {"NVRHBA_FCPort", "NVRHBA_Product", "NVRHBA_StorageVolume",
+                                              settings_class};
+    const unsigned lives = 25 * rounds();
+    const auto live = [&](unsigned client, const CMPIBroker* broker, const CMPIContext* context) {
+        for (unsigned life = 0; life < lives; life++) {
+            const std::string& name = classes[(client + life) % classes.size()];
+            CMPIInstanceMI* mi =
+                watchdog.during(client, "a factory", [&] { return entries.instances(name, broker, context); });
+            ASSERT_TRUE(mi) << name;
+            CMPIStatus status;
+            CMPIObjectPath* path = broker->eft->newObjectPath(broker, name_space, name.c_str(), &status);
+            for (unsigned i = 0; i < life % 3; i++)
+                watchdog.during(client, "names",
+                                [&] { return mi->ft->enumerateInstanceNames(mi, context, nullptr, path); });
+            path->ft->release(path);
+            const CMPIStatus cleaned =
+                watchdog.during(client, "a clean-up", [&] { return mi->ft->cleanup(mi, context, 1); });
+            EXPECT_EQ(cleaned.rc, CMPI_RC_OK) << name;
+            // What the refresh's questions made the server load, which holds the agent too.
+            watchdog.during(client, "unload what is idle", [&] { return rig.server().unload_idle(); });
+        }
+    };
+    on_all_clients([&](unsigned client) {
+        rig.server().on_request_thread(
+            [&](const CMPIBroker* broker, const CMPIContext* context) { live(client, broker, context); });
+    });
+    EXPECT_THAT(rig.server().report().violations, IsEmpty());
+    rig.stop();
+    EXPECT_EQ(rig.server().report().contexts_not_detached, 0u);
+    EXPECT_EQ(nvrsim_open_handles(), 0u);
+    const std::size_t loads = rig.count_words("Norvane Provider v2.5.19-1 Loaded[" + std::to_string(getpid()) + "]");
+    EXPECT_GE(loads, 1u);
+    EXPECT_EQ(rig.count_words("Norvane Provider Unloaded"), loads);
+    RecordProperty("lives", std::to_string(loads));
+}
