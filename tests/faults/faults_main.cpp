@@ -22,7 +22,7 @@ namespace {
 using namespace nvrtest;
 
 struct Wanted {
-    bool is_all = false, is_list = false, is_absent = false;
+    bool is_all = false, is_list = false, is_absent = false, is_first = false;
     std::size_t sample = 0, skip = 0;
     std::uint64_t seed = 1;
     std::string only;
@@ -88,12 +88,17 @@ int run(const Wanted& wanted)
                 calls.size(), missing.size());
     std::vector<Run> all = wanted.is_absent ? std::vector<Run>() : calls;
     all.insert(all.end(), missing.begin(), missing.end());
+    if (wanted.is_first)
+        all.erase(std::remove_if(all.begin(), all.end(),
+                                 [](const Run& run) { return run.name.find("#1:") == std::string::npos; }),
+                  all.end());
     if (wanted.is_list)
         for (const Run& run : all)
             std::printf("%s\n", run.name.c_str());
     if (!wanted.only.empty()) return run_only(all, wanted.only);
     if (wanted.sample > 0)
         return make(sample_of(all, wanted), wanted.at_once, "a sample by the seed " + std::to_string(wanted.seed)) > 0;
+    if (wanted.is_first) return make(all, wanted.at_once, "the first call of each operation") > 0;
     if (!wanted.is_all && !wanted.is_absent) return 0;
     std::size_t failed = make(missing, wanted.at_once, "without a symbol or a library");
     if (wanted.is_all) {
@@ -113,6 +118,7 @@ int main(int argc, char** argv)
     Wanted wanted;
     CLI::Option* all = app.add_flag("--all", wanted.is_all, "All of them");
     app.add_flag("--absent", wanted.is_absent, "Of what is missing alone")->excludes(all);
+    app.add_flag("--first", wanted.is_first, "Of the first call of each operation alone")->excludes(all);
     CLI::Option* sample = app.add_option("--sample", wanted.sample, "So many of them")->excludes(all);
     app.add_option("--seed", wanted.seed, "Which, with --sample")->needs(sample)->capture_default_str();
     app.add_option("--skip", wanted.skip, "Behind so many others of that seed")->needs(sample);
