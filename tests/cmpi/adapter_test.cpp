@@ -316,7 +316,7 @@ TEST_F(Adapter, TheProviderOutlivesACleanUpWhileARequestRuns)
     started.get_future().wait();
     std::thread last([&] { EXPECT_EQ(clean(), CMPI_RC_OK); });
     const auto in_table = [&] {
-        Tables_Lock locked(&tables);
+        Auto_Mutex locked(tables.mutex);
         return tables.adapter != nullptr;
     };
     while (in_table())
