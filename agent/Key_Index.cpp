@@ -91,11 +91,13 @@ bool Key_Index::walk(const Instance* instance, std::size_t& depth, uint64& value
     return true;
 }
 
-bool Key_Index::hash(const Instance* instance, uint64& value) const
+bool Key_Index::hash(const Instance* instance, uint32& value) const
 {
     std::size_t depth = 0;
-    value = 0;
-    return walk(instance, depth, value);
+    uint64 mixed = 0;
+    const bool has_shape = walk(instance, depth, mixed);
+    value = static_cast<uint32>(mixed >> 32);
+    return has_shape;
 }
 
 void Key_Index::learn_shape(const Instance* instance)
@@ -120,43 +122,55 @@ Key_Index::Entry Key_Index::entry_of(const Instance* instance)
 
 void Key_Index::append(const Entry& entry, const Array<Instance*>& list)
 {
-    std::vector<uint32> wider;
-    const bool grow = m_slots.size() < 2 * list.size();
-    if (grow) wider.resize(m_slots.empty() ? first_slots : 2 * m_slots.size());
-    m_entries.push_back(entry);
-    m_strangers += entry.strange;
-    if (grow) {
+    if (m_slots.size() < 2 * list.size()) {
+        std::vector<Slot> wider(m_slots.empty() ? first_slots : 2 * m_slots.size());
+        for (const Slot& slot : m_slots)
+            if (slot.position != 0) place(wider, slot);
         m_slots.swap(wider);
-        place_all();
-    } else if (!entry.strange)
-        place(list.size() - 1);
+    }
+    if (entry.strange)
+        m_strangers++;
+    else
+        place(m_slots, {entry.hash, static_cast<uint32>(list.size())});
 }
 
-void Key_Index::place(std::size_t position)
+void Key_Index::place(std::vector<Slot>& slots, const Slot& slot)
 {
-    std::size_t slot = m_entries[position].hash & (m_slots.size() - 1);
-    while (m_slots[slot] != 0)
-        slot = (slot + 1) & (m_slots.size() - 1);
-    m_slots[slot] = static_cast<uint32>(position + 1);
-}
-
-void Key_Index::place_all()
-{
-    std::fill(m_slots.begin(), m_slots.end(), 0u);
-    for (std::size_t i = 0; i < m_entries.size(); i++)
-        if (!m_entries[i].strange) place(i);
+    std::size_t i = slot.hash & (slots.size() - 1);
+    while (slots[i].position != 0)
+        i = (i + 1) & (slots.size() - 1);
+    slots[i] = slot;
 }
 
 void Key_Index::remove(std::size_t position)
 {
-    m_strangers -= m_entries[position].strange;
-    m_entries.erase(m_entries.begin() + static_cast<std::ptrdiff_t>(position));
-    place_all();
+    const std::size_t last = m_slots.size() - 1;
+    std::size_t hole = m_slots.size();
+    for (std::size_t i = 0; i < m_slots.size(); i++) {
+        if (m_slots[i].position == position + 1)
+            hole = i;
+        else if (m_slots[i].position > position + 1)
+            m_slots[i].position--;
+    }
+    if (hole == m_slots.size()) {
+        m_strangers--;
+        return;
+    }
+    // What stands behind the hole moves into it, unless it would come to stand before the place of its hash.
+    for (std::size_t i = (hole + 1) & last; m_slots[i].position != 0; i = (i + 1) & last) {
+        if (((i - m_slots[i].hash) & last) < ((i - hole) & last)) continue;
+        m_slots[hole] = m_slots[i];
+        hole = i;
+    }
+    m_slots[hole] = Slot();
 }
 
 void Key_Index::clear()
 {
-    *this = Key_Index();
+    m_shape.clear();
+    m_keys.clear();
+    m_strangers = 0;
+    std::fill(m_slots.begin(), m_slots.end(), Slot());
 }
 
 int Key_Index::find(const Instance* key, const Array<Instance*>& list) const
@@ -174,10 +188,10 @@ int Key_Index::find(const Entry& entry, const Instance* key, const Array<Instanc
             if (key_eq(key, list[i])) return static_cast<int>(i);
         return -1;
     }
-    for (std::size_t slot = entry.hash & (m_slots.size() - 1); m_slots[slot] != 0;
-         slot = (slot + 1) & (m_slots.size() - 1)) {
-        const std::size_t i = m_slots[slot] - 1;
-        if (m_entries[i].hash == entry.hash && key_eq(key, list[i])) return static_cast<int>(i);
+    for (std::size_t i = entry.hash & (m_slots.size() - 1); m_slots[i].position != 0;
+         i = (i + 1) & (m_slots.size() - 1)) {
+        const Slot& slot = m_slots[i];
+        if (slot.hash == entry.hash && key_eq(key, list[slot.position - 1])) return static_cast<int>(slot.position - 1);
     }
     return -1;
 }

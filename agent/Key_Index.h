@@ -17,7 +17,7 @@ class Key_Index {
 public:
     /// What the index knows of an instance: made once, for the search and for the place.
     struct Entry {
-        uint64 hash;
+        uint32 hash;
         bool strange; // of another shape than the list's first element: it has no hash, and no slot
     };
     /// The entry of an instance that may be appended; the first one gives the index its shape.
@@ -26,6 +26,7 @@ public:
     void append(const Entry& entry, const Array<Instance*>& list);
     /// Notes that the element at `position` has left the list.
     void remove(std::size_t position);
+    /// Forgets all elements and their shape, and keeps its memory for as many again.
     void clear();
 
     /// The position of the first element of `list` whose keys agree with `key`'s, or -1.
@@ -35,11 +36,9 @@ public:
 
 private:
     /// The hash of an instance of this index's shape; false for another shape.
-    bool hash(const Instance* instance, uint64& value) const;
+    bool hash(const Instance* instance, uint32& value) const;
     bool walk(const Instance* instance, std::size_t& depth, uint64& value) const;
     void learn_shape(const Instance* instance);
-    void place(std::size_t position);
-    void place_all();
 
     /// One instance of the shape: its class (null: no instance) and its keys, `count` of m_keys from `first` on.
     struct Node {
@@ -48,9 +47,14 @@ private:
     };
     std::vector<Node> m_shape; // in walking order; of the first element
     std::vector<const Meta_Feature*> m_keys;
-    std::vector<Entry> m_entries; // one an element
+    /// A lookup reads one place of memory, and an element only where its hash agrees.
+    struct Slot {
+        uint32 hash;
+        uint32 position; // behind it by one; 0: free
+    };
+    static void place(std::vector<Slot>& slots, const Slot& slot);
     std::size_t m_strangers = 0;
-    std::vector<uint32> m_slots; // open addressing: position + 1, or 0; a power of two, at most half full
+    std::vector<Slot> m_slots; // open addressing; a power of two, at most half full
 };
 
 } // namespace cimple

@@ -23,6 +23,7 @@
 #include "foundation/NVR_SysLogger.h"
 #include "foundation/NvrConfigFile.h"
 #include "foundation/management_api.h"
+#include "runtime/Blocks.h"
 #include "runtime/Mutex.h"
 #include "runtime/Thread.h"
 
@@ -184,6 +185,10 @@ public:
     Map<struct NVRHBA_SCSIInitiatorTargetStorageExtentPath> m_NVRHBA_SCSIInitiatorTargetStorageExtentPath_map;
     Map<struct NVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath>
         m_NVRHBA_SCSIInitiatorTargetArbitraryLogicalUnitPath_map;
+    // Where these lie. Most questions are about one kind, and then read that one from end to end.
+    Blocks m_SANEndpointBlocks;
+    Blocks m_SANUnitBlocks;
+    Blocks m_SANLinkBlocks;
     // Virtual ports.
     Map<struct NVRHBA_ResourcePool> m_NVRHBA_ResourcePool_map;
     Map<struct NVRHBA_ElementAllocatedFromPool> m_NVRHBA_ElementAllocatedFromPool_map;

@@ -20,6 +20,7 @@ namespace cimple {
 class Adapter;
 class Port;
 class Target;
+struct NVRHBA_SCSIProtocolEndpoint;
 
 class SAN_Update {
 public:
@@ -45,7 +46,7 @@ private:
 
     // san_instances.cpp
     void buildTarget(Target_Scope& scope, int index);
-    Instance* buildEndpoint(const Target_Scope& scope);
+    Ref<NVRHBA_SCSIProtocolEndpoint> makeEndpoint(Target_Scope& scope);
     Instance* buildUnit(const Target_Scope& scope, const Unit_Class_Row& row);
 
     // logical_unit_instances.cpp

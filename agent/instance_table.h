@@ -73,7 +73,8 @@ struct Element {
 template <class T>
 void set(Property<Array<T>>& property, std::initializer_list<typename Element<T>::type> values)
 {
-    property.value = Array<T>(values);
+    Array<T> made(values);
+    property.value.swap(made);
     property.null = 0;
 }
 template <class T>

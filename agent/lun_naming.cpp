@@ -92,12 +92,13 @@ String unit_name(const DeviceIdentifier& identifier, const String& text)
     constexpr char digits[] = "0123456789ABCDEF";
     const std::size_t end =
         std::min<std::size_t>(identifier.identifierLength, sizeof identifier.identifier); // as the device claims
-    String name;
+    char name[2 * sizeof identifier.identifier];
+    char* next = name;
     for (std::size_t i = start; i < end; i++) {
-        name.append(digits[identifier.identifier[i] >> 4]);
-        name.append(digits[identifier.identifier[i] & 0xF]);
+        *next++ = digits[identifier.identifier[i] >> 4];
+        *next++ = digits[identifier.identifier[i] & 0xF];
     }
-    return name;
+    return String(name, static_cast<std::size_t>(next - name));
 }
 
 } // namespace cimple

@@ -61,7 +61,11 @@ String lunText(uint64 lun)
 // a host with many paths would hold each endpoint and unit three times.
 Instance* SAN_Update::tie(Instance_Map& map, std::initializer_list<End> ends)
 {
-    Ref<Instance> association(create(map.meta_class(), true));
+    Ref<Instance> association;
+    {
+        const Blocks::Use use(&m_agent.m_SANLinkBlocks);
+        association.reset(create(map.meta_class(), true));
+    }
     association->__name_space = m_nameSpace;
     for (const End& end : ends) {
         const Meta_Feature* feature = find_feature(map.meta_class(), end.reference, META_FLAG_REFERENCE);
@@ -71,10 +75,13 @@ Instance* SAN_Update::tie(Instance_Map& map, std::initializer_list<End> ends)
     return insert(map, std::move(association));
 }
 
-Instance* SAN_Update::buildEndpoint(const Target_Scope& scope)
+Ref<NVRHBA_SCSIProtocolEndpoint> SAN_Update::makeEndpoint(Target_Scope& scope)
 {
+    const Blocks::Use use(&m_agent.m_SANEndpointBlocks);
     const Target& target = scope.target;
     auto endpoint = make<NVRHBA_SCSIProtocolEndpoint>(m_nameSpace);
+    scope.inquiry = text("%.8s %.16s Revision %.4s Serial Number %.40s", target.Vendor.c_str(), target.Product.c_str(),
+                         target.Revision.c_str(), target.SerialNumber.c_str());
     set(endpoint->TargetWWPN, m_texts(target.PortName));
     set(endpoint->TargetWWNN, m_texts(target.NodeName));
     set(endpoint->Description, scope.inquiry);
@@ -96,12 +103,13 @@ Instance* SAN_Update::buildEndpoint(const Target_Scope& scope)
     set(endpoint->SCSITargetNumber, target.TargetNumber);
     set(endpoint->OtherIdentifyingInfo, {text_of(target.OSDeviceName)});
     set(endpoint->IdentifyingDescriptions, {m_texts("OS Device Name")});
-    return insert(m_agent.m_NVRHBA_SCSIProtocolEndpoint_map, endpoint);
+    return endpoint;
 }
 
 Instance* SAN_Update::buildUnit(const Target_Scope& scope, const Unit_Class_Row& row)
 {
     const auto make_it = [&]() -> Ref<Instance> {
+        const Blocks::Use use(&m_agent.m_SANUnitBlocks);
         switch (row.unit) {
         case Unit_Class::StorageVolume:
             return makeStorageVolume(scope, row);
@@ -123,13 +131,11 @@ void SAN_Update::buildTarget(Target_Scope& scope, int index)
 {
     const Target& target = scope.target;
     scope.lun = lunText(target.FcpLun);
-    scope.inquiry = text("%.8s %.16s Revision %.4s Serial Number %.40s", target.Vendor.c_str(), target.Product.c_str(),
-                         target.Revision.c_str(), target.SerialNumber.c_str());
     const String shortInquiry =
         text("%.8s %.16s Revision %.4s", target.Vendor.c_str(), target.Product.c_str(), target.Revision.c_str());
     scope.shortInquiry = m_texts({shortInquiry.c_str(), shortInquiry.size()});
 
-    Instance* endpoint = buildEndpoint(scope);
+    Instance* endpoint = insert(m_agent.m_NVRHBA_SCSIProtocolEndpoint_map, makeEndpoint(scope));
     NVR_LOG("Generating NVRHBA_LocalHostedAccessPoint (Local Hosted Access Point %s:%s:%s)", scope.wwpn,
             target.PortName.c_str(), scope.lun.c_str());
     tie(m_agent.m_NVRHBA_LocalHostedAccessPoint_map, {{"Antecedent", m_host}, {"Dependent", endpoint}});

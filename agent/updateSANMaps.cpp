@@ -83,6 +83,8 @@ uint32 ProviderAgent::updateSANMaps()
     NVR_LOG("PERF: updateSANMaps: Entry");
     const std::size_t paths = m_NVRHBA_SCSIProtocolEndpoint_map.size();
     clearSANMaps();
+    for (Blocks* blocks : {&m_SANEndpointBlocks, &m_SANUnitBlocks, &m_SANLinkBlocks})
+        blocks->rewind();
     if (paths >= many_paths) malloc_trim(0);
     try {
         if (m_pData && m_pData->haveAdapters()) SAN_Update(*this).walkAdapters();

@@ -50,8 +50,8 @@ constexpr char volume_class[] = "NVRHBA_StorageVolume";
 using Figures = std::map<std::string, double>;
 
 const char* const figure_names[] = {
-    "first_answer",    "refresh", "refresh_total", "resident", "heap",         "peak_ratio", "instances",
-    "instances_floor", "names",   "names_floor",   "get",      "volume_paths", "volume_all", "port_devices",
+    "first_answer", "refresh",     "refresh_total", "resident",     "peak_ratio", "instances",    "instances_floor",
+    "names",        "names_floor", "get",           "volume_paths", "volume_all", "port_devices",
 };
 
 // --- One point
@@ -104,12 +104,6 @@ void forget_peak()
     std::ofstream("/proc/self/clear_refs") << "5";
 }
 
-double heap()
-{
-    const struct mallinfo2 info = mallinfo2();
-    return static_cast<double>(info.uordblks + info.hblkhd);
-}
-
 /// Lets the cache grow old and waits until the SAN is read anew. The thread holds the lock that an enumeration of ports
 /// takes from its first call into the libraries until the new maps are ready. An earlier thread that is still at its
 /// end takes the new time for its own, so the time-out may have to come twice.
@@ -131,9 +125,8 @@ void require(bool is_so, const char* what)
 
 void measure_memory(nvrbench::Bench_Host& host, const Point& point, Figures& figures)
 {
-    const double resident_before = resident(), heap_before = heap();
+    const double resident_before = resident();
     figures["first_answer"] = microseconds_of([&] { (void)host.enumerate("NVRHBA_TapeDrive"); });
-    figures["heap"] = (heap() - heap_before) / point.paths();
     const double steady = resident() - resident_before;
     figures["resident"] = steady / point.paths();
     forget_peak();
@@ -239,12 +232,12 @@ Figures measured_apart(const char* name)
 
 void print_row(const Point& point, const Figures& f)
 {
-    std::printf("| %s | %u | %.3f | %.1f | %.1f | %.0f | %.0f | %.2f | %.1f | %.2f | %.1f | %.2f | %.0f | %.1f | %.1f "
-                "| %.1f |\n",
+    std::printf("| %s | %u | %.3f | %.1f | %.1f | %.0f | %.2f | %.1f | %.2f | %.1f | %.2f | %.0f | %.1f | %.1f | %.1f "
+                "|\n",
                 point.name, point.paths(), f.at("first_answer") * 1e-6, f.at("refresh"), f.at("refresh_total"),
-                f.at("resident"), f.at("heap"), f.at("peak_ratio"), f.at("instances"),
-                f.at("instances") / f.at("instances_floor"), f.at("names"), f.at("names") / f.at("names_floor"),
-                f.at("get"), f.at("volume_paths") * 1e-3, f.at("volume_all") * 1e-3, f.at("port_devices"));
+                f.at("resident"), f.at("peak_ratio"), f.at("instances"), f.at("instances") / f.at("instances_floor"),
+                f.at("names"), f.at("names") / f.at("names_floor"), f.at("get"), f.at("volume_paths") * 1e-3,
+                f.at("volume_all") * 1e-3, f.at("port_devices"));
     std::fflush(stdout);
 }
 
@@ -254,7 +247,7 @@ void print_growth(const std::map<std::string, Figures>& measured)
     const char* const compared[] = {"64", "1000", "10000", "XXL"};
     const Figures& unit = measured.at("1000");
     std::puts("\n| paths | refresh s | a path to 1,000 | enumeration s | a path to 1,000 | names s | a path to 1,000 | "
-              "heap B/path | to 1,000 | "
+              "resident B/path | to 1,000 | "
               "from a port s | an end to 1,000 |");
     std::puts("|---|---|---|---|---|---|---|---|---|---|---|");
     for (const char* name : compared) {
@@ -265,7 +258,7 @@ void print_growth(const std::map<std::string, Figures>& measured)
         std::printf("| %u |", point.paths());
         for (const char* figure : {"refresh", "instances", "names"})
             std::printf(" %.4f | %.2f |", f.at(figure) * point.paths() * 1e-6, f.at(figure) / unit.at(figure));
-        std::printf(" %.0f | %.2f | %.4f | %.2f |\n", f.at("heap"), f.at("heap") / unit.at("heap"),
+        std::printf(" %.0f | %.2f | %.4f | %.2f |\n", f.at("resident"), f.at("resident") / unit.at("resident"),
                     f.at("port_devices") * point.port_ends() * 1e-6, f.at("port_devices") / unit.at("port_devices"));
     }
 }
@@ -274,9 +267,9 @@ void print_table(const std::vector<std::string>& names)
 {
     std::map<std::string, Figures> measured;
     std::puts(
-        "| point | paths | first answer s | refresh us/path | with libraries | resident B/path | heap B/path | peak | "
+        "| point | paths | first answer s | refresh us/path | with libraries | resident B/path | peak | "
         "instances us | of floor | names us | of floor | get us | associators ms | all classes ms | from a port us |");
-    std::puts("|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|");
+    std::puts("|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|");
     for (const std::string& name : names) {
         const Point& point = point_of(name);
         measured[name] = measured_apart(point.name);

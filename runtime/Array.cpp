@@ -7,6 +7,7 @@
 #include <new>
 #include <utility>
 
+#include "runtime/Blocks.h"
 #include "runtime/Datetime.h"
 #include "runtime/String.h"
 
@@ -58,7 +59,8 @@ const Array_Traits instance_array_traits = {sizeof(void*), nullptr, nullptr, nul
 struct alignas(std::max_align_t) Array_Base::Rep {
     const Array_Traits* traits;
     std::size_t size;
-    std::size_t capacity; // in elements; the elements follow
+    std::size_t capacity; // in elements
+    bool is_cut;          // from a block; the elements follow
 
     char* at(std::size_t index) { return reinterpret_cast<char*>(this + 1) + index * traits->element_size; }
     const char* at(std::size_t index) const
@@ -68,14 +70,14 @@ struct alignas(std::max_align_t) Array_Base::Rep {
 };
 
 Array_Base::Rep Array_Base::empty_reps[number_of_types + 1] = {
-    {&array_traits[0], 0, first_capacity},       {&array_traits[1], 0, first_capacity},
-    {&array_traits[2], 0, first_capacity},       {&array_traits[3], 0, first_capacity},
-    {&array_traits[4], 0, first_capacity},       {&array_traits[5], 0, first_capacity},
-    {&array_traits[6], 0, first_capacity},       {&array_traits[7], 0, first_capacity},
-    {&array_traits[8], 0, first_capacity},       {&array_traits[9], 0, first_capacity},
-    {&array_traits[10], 0, first_capacity},      {&array_traits[11], 0, first_capacity},
-    {&array_traits[12], 0, first_capacity},      {&array_traits[13], 0, first_capacity},
-    {&instance_array_traits, 0, first_capacity},
+    {&array_traits[0], 0, first_capacity, false},       {&array_traits[1], 0, first_capacity, false},
+    {&array_traits[2], 0, first_capacity, false},       {&array_traits[3], 0, first_capacity, false},
+    {&array_traits[4], 0, first_capacity, false},       {&array_traits[5], 0, first_capacity, false},
+    {&array_traits[6], 0, first_capacity, false},       {&array_traits[7], 0, first_capacity, false},
+    {&array_traits[8], 0, first_capacity, false},       {&array_traits[9], 0, first_capacity, false},
+    {&array_traits[10], 0, first_capacity, false},      {&array_traits[11], 0, first_capacity, false},
+    {&array_traits[12], 0, first_capacity, false},      {&array_traits[13], 0, first_capacity, false},
+    {&instance_array_traits, 0, first_capacity, false},
 };
 
 namespace {
@@ -110,7 +112,9 @@ void construct_all(const Array_Traits& traits, char* to, const char* from, std::
 Array_Base::Rep* Array_Base::new_rep(const Array_Traits& traits, std::size_t capacity)
 {
     if (capacity > (SIZE_MAX / 4 - sizeof(Rep)) / traits.element_size) throw std::bad_alloc();
-    return new (::operator new(sizeof(Rep) + capacity * traits.element_size)) Rep{&traits, 0, capacity};
+    bool is_cut;
+    void* place = Blocks::allocate(sizeof(Rep) + capacity * traits.element_size, is_cut);
+    return new (place) Rep{&traits, 0, capacity, is_cut};
 }
 
 // The shared empty rep of the traits, or null for traits of a room's own.
@@ -131,7 +135,7 @@ void Array_Base::free_rep(Rep* rep) noexcept
 {
     if (is_shared(rep)) return;
     destruct_all(*rep->traits, rep->at(0), rep->size);
-    ::operator delete(rep);
+    Blocks::deallocate(rep, rep->is_cut);
 }
 
 // A rep with copies of `source`'s elements but the `left_out` ones from `gap` on.

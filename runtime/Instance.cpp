@@ -3,6 +3,7 @@
 #include <cstring>
 #include <new>
 
+#include "runtime/Blocks.h"
 #include "runtime/Owned_References.h"
 
 // The life of an instance: creation, cloning, destruction and counting. Refreshes and requests clone instances by the
@@ -15,10 +16,13 @@ namespace cimple {
 
 namespace {
 
+// One byte behind the record tells where the memory is from.
 Instance* new_head(const Meta_Record* record)
 {
-    void* place = ::operator new(record->size);
+    bool is_cut;
+    void* place = Blocks::allocate(record->size + sizeof(is_cut), is_cut);
     auto* instance = new (place) Instance;
+    *static_cast<bool*>(feature_at(instance, record->size)) = is_cut;
     instance->magic = instance_magic;
     instance->refs.store(1, std::memory_order_relaxed);
     // A method record is told from an instance by the flags in the common head of both records.
@@ -230,8 +234,9 @@ void destroy(Instance* instance)
     if (!instance) return;
     for (const Meta_Feature* feature : features_of(record_of(instance)))
         end_feature(instance, feature);
+    const bool is_cut = *static_cast<const bool*>(feature_at(instance, record_of(instance)->size));
     instance->~Instance();
-    ::operator delete(instance);
+    Blocks::deallocate(instance, is_cut);
 }
 
 void ref(const Instance* instance)

@@ -4,6 +4,8 @@
 #include <cstring>
 #include <new>
 
+#include "runtime/Blocks.h"
+
 namespace cimple {
 
 namespace {
@@ -26,20 +28,23 @@ std::size_t rounded_up(std::size_t size)
 
 } // namespace
 
-String::Empty_Rep String::empty_rep{{{2}, 0, smallest_capacity}, {}};
+String::Empty_Rep String::empty_rep{{{2}, false, 0, smallest_capacity}, {}};
 
 String::Rep* String::new_rep(std::size_t capacity)
 {
     capacity = rounded_up(capacity);
-    Rep* rep = new (::operator new(sizeof(Rep) + capacity + 1)) Rep{{1}, 0, capacity};
+    bool is_cut;
+    void* place = Blocks::allocate(sizeof(Rep) + capacity + 1, is_cut);
+    Rep* rep = new (place) Rep{{1}, is_cut, 0, capacity};
     bytes(rep)[0] = '\0';
     return rep;
 }
 
 void String::free_rep(Rep* rep) noexcept
 {
+    const bool is_cut = rep->is_cut;
     rep->~Rep();
-    ::operator delete(rep);
+    Blocks::deallocate(rep, is_cut);
 }
 
 // Fills `rep`, fresh and unshared, before the old rep goes: `text` may lie in that.

@@ -72,6 +72,7 @@ public:
 private:
     struct Rep {
         std::atomic<uint32> refs;
+        bool is_cut; // from a block
         std::size_t size;
         std::size_t capacity; // the terminator is not counted; the bytes follow
     };

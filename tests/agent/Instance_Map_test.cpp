@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 
+#include <numeric>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -271,6 +272,25 @@ TEST_F(InstanceMap, FindsEachOfManyAndRefusesEachAgain)
         const Ref<NVRHBA_FCPort> key(port<NVRHBA_FCPort>(std::to_string(i).c_str()));
         ASSERT_EQ(map.find(key.get()), i);
         ASSERT_EQ(map.insert(key.get()), -1);
+    }
+}
+
+TEST_F(InstanceMap, FindsEachOfManyThatAreLeftWhateverWasRemoved)
+{
+    constexpr int count = 500;
+    fill(count);
+    std::vector<int> left(count);
+    std::iota(left.begin(), left.end(), 0);
+    for (std::size_t next = 0; left.size() > 20; next = next * 31 + 17) {
+        const std::size_t at = next % left.size();
+        const Ref<NVRHBA_FCPort> key(port<NVRHBA_FCPort>(std::to_string(left[at]).c_str()));
+        ASSERT_EQ(map.remove(key.get()), 0);
+        ASSERT_EQ(map.find(key.get()), -1);
+        left.erase(left.begin() + static_cast<std::ptrdiff_t>(at));
+        for (std::size_t i = 0; i < left.size(); i += 7) {
+            const Ref<NVRHBA_FCPort> kept(port<NVRHBA_FCPort>(std::to_string(left[i]).c_str()));
+            ASSERT_EQ(map.find(kept.get()), static_cast<int>(i));
+        }
     }
 }
 

@@ -1,5 +1,6 @@
 // An update of the maps for which memory runs out: wherever that is, it ends as updates end, and the next one is whole.
 #include <set>
+#include <sys/mman.h>
 
 #include "agent/Agent_Wait.h"
 #include "tests/agent/Simulated_Host.h"
@@ -8,6 +9,12 @@
 using namespace cimple;
 using namespace nvrtest;
 using testing::IsSupersetOf;
+
+// There is no room for blocks here, so that each piece of an instance is asked for by itself.
+extern "C" void* __wrap_mmap(void*, std::size_t, int, int, int, off_t)
+{
+    return MAP_FAILED;
+}
 
 namespace {
 
@@ -39,7 +46,7 @@ protected:
                                                        for (const std::string& word : words())
                                                            all.insert(word);
                                                    });
-        EXPECT_GT(pieces, 50);
+        EXPECT_GT(pieces, 40);
         EXPECT_EQ(status, 0u) << "the last one had all that it wanted";
         return all;
     }
