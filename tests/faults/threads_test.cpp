@@ -137,8 +137,18 @@ public:
             (this->*actions[dice() % actions.size()])(client, dice);
     }
 
+    void advance(std::chrono::seconds by)
+    {
+        advance_clock(by);
+        m_ahead.fetch_add(by.count(), std::memory_order_relaxed);
+    }
+    /// Between two lives: a year of rounds would show in what is published.
+    void turn_clock_back() { advance_clock(-std::chrono::seconds(m_ahead.exchange(0))); }
+
     std::uint64_t answered() const { return m_answered; }
     std::uint64_t unloads() const { return m_unloads; }
+    /// Instances within instances in all answers: the bridge leaves such a one to its call's end.
+    std::uint64_t embedded() const { return m_embedded; }
     /// What no turn of the others can make right.
     const std::vector<std::string>& wrong() const { return m_wrong; }
 
@@ -163,6 +173,9 @@ private:
     {
         const host::Answer answer = m_watchdog.during(client, what, [&] { return request(m_rig.server()); });
         m_answered.fetch_add(answer.ok(), std::memory_order_relaxed);
+        for (const host::Instance& instance : answer.instances)
+            for (const host::Named_Value& property : instance.properties)
+                m_embedded.fetch_add(property.value.type() == CMPI_instance, std::memory_order_relaxed);
         // What the module may answer changes with the others' turns; that it does is what counts.
         if (answer.status.fault != host::Fault::nobody && answer.status.fault != host::Fault::provider)
             found_wrong(what, answer.status);
@@ -194,14 +207,14 @@ private:
     }
     void get_live_values(unsigned client, Dice& dice)
     {
-        advance_clock(11s); // so that they are read again
+        advance(11s); // so that they are read again
         ask(client, "get a port", [&](host::Host& server) { return server.get(one_of(m_ports, dice)); });
         const char* const name = dice() % 2 ? "NVRHBA_FCPortStatistics" : "NVRHBA_DriverParams";
         ask(client, "enumerate live values", [&](host::Host& server) { return server.enumerate(name_space, name); });
     }
     void refresh(unsigned client, Dice&)
     {
-        advance_clock(31min);
+        advance(31min);
         ask(client, "start a refresh", [](host::Host& server) { return server.enumerate(name_space, settings_class); });
     }
     void change_a_setting(unsigned client, Dice& dice)
@@ -266,7 +279,8 @@ private:
     std::vector<std::string> m_classes;
     std::vector<host::Path> m_ports, m_controllers, m_tests, m_logs, m_settings;
     std::vector<Method> m_methods;
-    std::atomic<std::uint64_t> m_answered{0}, m_unloads{0};
+    std::atomic<std::uint64_t> m_answered{0}, m_unloads{0}, m_embedded{0};
+    std::atomic<std::int64_t> m_ahead{0}; // seconds
     std::mutex m_mutex;
     std::vector<std::string> m_wrong;
 
@@ -300,14 +314,15 @@ TEST(Threads, OfAllThatClientsDoWaitForNoneForEverAndChangeNothing)
         EXPECT_THAT(clients.wrong(), IsEmpty()) << "round " << round;
         EXPECT_THAT(rig.server().report().violations, IsEmpty()) << "round " << round;
         // A life ends while a refresh runs.
-        advance_clock(31min);
+        clients.advance(31min);
         ASSERT_THAT(rig.enumerate(settings_class), succeeded());
         watchdog.during(0, "stop", [&] { rig.stop(); });
-        EXPECT_EQ(left_beside_strings(rig.server().report()), 0u) << rig.server().report().to_text();
+        EXPECT_LE(left_beside_strings(rig.server().report()), clients.embedded()) << rig.server().report().to_text();
         EXPECT_EQ(rig.server().report().contexts_not_detached, 0u);
         // The tag library's closing call is looked for in another library than its opening one, and not found.
         EXPECT_EQ(nvrsim_open_handles(), calls("CPQFC_OpenAdapter"));
         EXPECT_EQ(nvrsim_callbacks(), 0u);
+        clients.turn_clock_back();
         rig.restart();
     }
     clients.restore_settings();
