@@ -108,7 +108,11 @@ Status Indications::activate(const Served_Class& served, const std::shared_ptr<S
     bool first = ++served.provider->filters == 1;
     if (!manner.enables_each_time && !first && served.provider->enabled) return active;
     served.provider->enabled = true;
-    if (!manner.asks_before_activation) return call(served, Call::enable, *subscription, false, true);
+    if (!manner.asks_before_activation) {
+        Status enabled = call(served, Call::enable, *subscription, false, true);
+        if (!enabled.ok()) deactivate(served, *subscription);
+        return enabled;
+    }
     std::lock_guard lock(m_mutex);
     m_threads.emplace_back([this, served, subscription] { call(served, Call::enable, *subscription, false, false); });
     return active;

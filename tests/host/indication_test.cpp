@@ -94,6 +94,22 @@ TEST_P(Indications_, AFilterThatTheProviderRefusesIsNotActive)
     }
 }
 
+// Where the server waits for the answer; the others do not learn of it.
+TEST_P(Indications_, AFilterWhoseIndicationsAreNotEnabledIsNotActive)
+{
+    things::set("enable_status", 1);
+    int id = 0;
+    const Status status = server->subscribe(things::space, "TEST_Alert", sink(), id);
+    EXPECT_EQ(asks() ? 0 : 1, status.code);
+    if (asks()) return;
+    EXPECT_EQ(6, server->unsubscribe(id).code);
+    EXPECT_THAT(told(), ElementsAre("activate TEST_Alert in root/test 1", "enable",
+                                    "deactivate 'TEST_Alert' in root/test 1", "disable"));
+    things::set("enable_status", 0);
+    EXPECT_EQ(0, server->subscribe(things::space, "TEST_Alert", sink(), id).code);
+    EXPECT_THAT(told(), ElementsAre("activate TEST_Alert in root/test 1", "enable"));
+}
+
 TEST_P(Indications_, WithoutAProviderAreNotSupported)
 {
     int id = 0;

@@ -607,7 +607,7 @@ static CMPIStatus enable(CMPIIndicationMI* mi, const CMPIContext* ctx)
     pthread_t thread;
     (void)mi;
     event("%s%s", "enable", "", 0);
-    if (!setting("alert")) return answer(CMPI_RC_OK);
+    if (!setting("alert")) return answer((CMPIrc)setting("enable_status"));
     delivery_context = broker->bft->prepareAttachThread(broker, ctx);
     pthread_create(&thread, NULL, alert_thread, NULL);
     pthread_join(thread, NULL);
