@@ -1,0 +1,43 @@
+/// What happens to the adapters while clients ask: links go down and up, events come, the libraries fail, lie, throw,
+/// are slow or lose an adapter, the cache grows old, the server unloads what is idle.
+///
+/// One thread at a time. Nobody stops or restarts the host's server meanwhile.
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "tests/module/support/Rig.h"
+#include "tests/soak/Counts.h"
+#include "tests/soak/Random.h"
+#include "tests/soak/Watch.h"
+
+namespace soak {
+
+class Trouble {
+public:
+    /// `calls`: the operations of the libraries that may fail.
+    Trouble(nvrtest::Rig& rig, Watch& watch, Counts& counts, std::vector<std::string> calls);
+
+    /// One thing that happens.
+    void act(Random& random);
+    /// The host as it was loaded, without faults. True if the module may have been loaded while there were some: it
+    /// needs a new life to see the host as it is.
+    bool end();
+
+private:
+    void add_fault(Random& random);
+    void unload(bool with_faults);
+    void clear_faults();
+
+    nvrtest::Rig& m_rig;
+    Watch& m_watch;
+    Counts& m_counts;
+    const std::vector<std::string> m_calls;
+    bool m_is_spoiled = false;
+};
+
+/// The operations that the libraries were last asked for.
+std::vector<std::string> called_operations();
+
+} // namespace soak

@@ -1,0 +1,385 @@
+// A server's weeks in short: clients of all kinds at once, adapters that trouble them, and at every tenth of the run a
+// look at what the process holds.
+//
+//     nvr_soak --seconds 20
+//     nvr_soak --minutes 5 --manner pegasus
+//     nvr_soak --hours 72
+//
+// The exit code is 0 if resident memory stayed level, threads and descriptors came back, every request was answered in
+// time and the instances are in the end those of the start; else 1. Runs as root, or as a user who may make user
+// namespaces: settings, logs and libraries are its own.
+#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <condition_variable>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <exception>
+#include <fcntl.h>
+#include <filesystem>
+#include <iostream>
+#include <memory>
+#include <mutex>
+#include <new>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <unistd.h>
+#include <vector>
+
+#include "simulator/nvrsim.h"
+#include "tests/module/support/Rig.h"
+#include "tests/module/support/Test_Clock.h"
+#include "tests/soak/Crossing.h"
+#include "tests/soak/Load.h"
+#include "tests/soak/Process.h"
+#include "tests/soak/Trend.h"
+#include "tests/soak/Trouble.h"
+#include "tests/support/private_host.h"
+#include "tests/support/private_host_setup.h"
+#include "tests/support/simulator.h"
+
+namespace {
+
+using namespace soak;
+using Clock = std::chrono::steady_clock;
+
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr bool is_sanitized = true;
+#else
+constexpr bool is_sanitized = false;
+#endif
+/// No request may take longer; ten times as long where a sanitizer slows all down.
+constexpr std::chrono::seconds patience{is_sanitized ? 100 : 10};
+/// Between two looks the resident memory may move by as much without a leak, kB over the second half of the run.
+constexpr double tolerance = 512;
+constexpr std::uintmax_t largest_trace = 16 * 1024 * 1024;
+
+struct Options {
+    std::chrono::seconds length{300};
+    std::uint64_t requests = 0; ///< ends the run in the place of the length, if not 0
+    std::size_t clients = 6;
+    std::uint64_t seed = 1;
+    const host::Manner* manner = &host::Manner::strict();
+    std::size_t leak = 0; ///< bytes that each request is made to lose
+};
+
+constexpr char usage[] =
+    "nvr_soak [--seconds N | --minutes N | --hours N | --requests N] [--clients N] [--manner NAME] [--seed N]\n"
+    "         [--leak BYTES]    each request loses so many bytes: the run has to end with 1\n";
+
+std::uint64_t number(const std::string& text)
+{
+    std::size_t read = 0;
+    const std::uint64_t value = std::stoull(text, &read);
+    if (read != text.size() || value == 0 || text[0] == '-') throw std::invalid_argument("no number: " + text);
+    return value;
+}
+
+Options parsed(int argc, char** argv)
+{
+    Options options;
+    for (int i = 1; i < argc; i += 2) {
+        const std::string name = argv[i];
+        if (i + 1 == argc) throw std::invalid_argument(usage);
+        const std::string value = argv[i + 1];
+        if (name == "--seconds")
+            options.length = std::chrono::seconds(number(value));
+        else if (name == "--minutes")
+            options.length = std::chrono::minutes(number(value));
+        else if (name == "--hours")
+            options.length = std::chrono::hours(number(value));
+        else if (name == "--requests")
+            options.requests = number(value);
+        else if (name == "--clients")
+            options.clients = number(value);
+        else if (name == "--seed")
+            options.seed = number(value);
+        else if (name == "--leak")
+            options.leak = number(value);
+        else if (name == "--manner")
+            options.manner = host::Manner::find(value);
+        else
+            throw std::invalid_argument(usage);
+        if (!options.manner) throw std::invalid_argument("no such manner: " + value);
+    }
+    return options;
+}
+
+/// Where the report goes; what the module writes to standard output goes nowhere.
+std::FILE* report_stream()
+{
+    static std::FILE* const stream = [] {
+        std::FILE* const kept = fdopen(dup(STDOUT_FILENO), "w");
+        const int nowhere = open("/dev/null", O_WRONLY | O_CLOEXEC);
+        if (!kept || nowhere < 0 || dup2(nowhere, STDOUT_FILENO) < 0) throw std::runtime_error("no output");
+        close(nowhere);
+        setvbuf(kept, nullptr, _IOLBF, 0);
+        return kept;
+    }();
+    return stream;
+}
+
+template <class... Values>
+void say(const char* format, Values... values)
+{
+    std::fprintf(report_stream(), format, values...);
+}
+
+void bound_trace()
+{
+    std::error_code none;
+    if (std::filesystem::file_size(nvrtest::trace_path, none) > largest_trace && !none)
+        (void)truncate(nvrtest::trace_path, 0);
+}
+
+/// The server remembers what it did, up to 10,000 lines: that it still fills its memory must not show.
+void fill_server_log(host::Host& server)
+{
+    const std::string line(100, '-');
+    server.on_request_thread([&](const CMPIBroker* broker, const CMPIContext*) {
+        for (int i = 0; i < 10000; i++)
+            broker->eft->logMessage(broker, 0, "soak", line.c_str(), nullptr);
+    });
+}
+
+/// One run.
+class Soak {
+public:
+    explicit Soak(const Options& options)
+        : m_options(options), m_watch(patience, &Soak::tell_hang), m_rig({*options.manner}),
+          m_load(m_rig, m_watch, m_counts), m_trouble(m_rig, m_watch, m_counts, warm_up())
+    {
+        m_rig.restart();
+        fill_server_log(m_rig.server());
+        m_before = Process::now();
+    }
+
+    /// True if all was well.
+    bool run();
+
+private:
+    struct Look {
+        double minutes;
+        Process process;
+    };
+
+    [[noreturn]] static void tell_hang(const std::string& what)
+    {
+        say("hangs: %s\n", what.c_str());
+        std::_Exit(1);
+    }
+    std::vector<std::string> warm_up();
+    void serve_client(std::uint64_t seed);
+    void make_trouble(std::uint64_t seed);
+    /// Waits until a tenth, or a minute, has passed.
+    void wait_for_tick(std::size_t tick, std::size_t ticks);
+    void look();
+    void wait_for_refresh();
+    std::string rested_names();
+    void begin_new_life();
+    bool judge();
+
+    double minutes() const { return std::chrono::duration<double, std::ratio<60>>(Clock::now() - m_start).count(); }
+
+    const Options m_options;
+    Counts m_counts;
+    Watch m_watch;
+    nvrtest::Rig m_rig;
+    Load m_load;
+    std::string m_names; ///< of all instances, at the start
+    Trouble m_trouble;
+    Crossing m_crossing;
+    Process m_before;
+    Clock::time_point m_start = Clock::now();
+    std::mutex m_mutex;
+    std::condition_variable m_changed;
+    std::atomic<std::uint64_t> m_next_tick{0}; ///< in requests
+    std::atomic<bool> m_ends{false};
+    std::vector<Look> m_looks;
+    std::size_t m_different = 0;
+    std::uint64_t m_violations = 0, m_left = 0;
+    std::string m_told_left; ///< the first report with one of them
+    bool m_is_traced = true;
+};
+
+std::vector<std::string> Soak::warm_up()
+{
+    m_names = rested_names();
+    return called_operations();
+}
+
+void Soak::serve_client(std::uint64_t seed)
+{
+    Random random(seed);
+    while (!m_ends) {
+        const Crossing::Pass pass(m_crossing);
+        const std::uint64_t before = m_counts.requests;
+        m_load.act(random);
+        if (m_options.leak != 0) std::memset(::operator new(m_options.leak), 1, m_options.leak);
+        if (before < m_next_tick && m_counts.requests >= m_next_tick) {
+            const std::lock_guard<std::mutex> lock(m_mutex);
+            m_changed.notify_all();
+        }
+    }
+}
+
+void Soak::make_trouble(std::uint64_t seed)
+{
+    Random random(seed);
+    while (!m_ends) {
+        {
+            const Crossing::Pass pass(m_crossing);
+            m_trouble.act(random);
+            bound_trace();
+        }
+        std::unique_lock<std::mutex> lock(m_mutex);
+        m_changed.wait_for(lock, std::chrono::milliseconds(5 + random.below(50)), [this] { return m_ends.load(); });
+    }
+}
+
+void Soak::wait_for_tick(std::size_t tick, std::size_t ticks)
+{
+    std::unique_lock<std::mutex> lock(m_mutex);
+    if (m_options.requests != 0) {
+        m_next_tick = m_options.requests * tick / ticks;
+        m_changed.wait(lock, [this] { return m_counts.requests >= m_next_tick; });
+    } else {
+        m_changed.wait_until(lock, m_start + m_options.length * tick / ticks, [] { return false; });
+    }
+}
+
+// A refresh runs on a thread that the server has lent a context; so does the worker of the alerts, which some servers
+// never let go: it is there when this is called.
+void Soak::wait_for_refresh()
+{
+    const Watch::Turn turn(m_watch, "the end of a refresh");
+    const std::uint64_t resting = m_options.manner->disable == host::Manner::Disable::never;
+    while (m_rig.server().report().contexts_not_detached > resting)
+        std::this_thread::sleep_for(std::chrono::milliseconds(1));
+}
+
+std::string Soak::rested_names()
+{
+    m_load.unsubscribe_all();
+    m_load.meet_alert();
+    m_load.restore_settings();
+    m_load.restore_files();
+    wait_for_refresh();
+    nvrtest::advance_clock(std::chrono::minutes(31));
+    m_load.all_names(); // starts the refresh
+    wait_for_refresh();
+    return m_load.all_names();
+}
+
+void Soak::begin_new_life()
+{
+    const Watch::Turn turn(m_watch, "the server's stop and start");
+    m_rig.stop();
+    const host::Report report = m_rig.server().report();
+    m_violations += report.violation_count;
+    m_left += report.clones_alive() + report.contexts_not_detached;
+    if (m_violations + m_left != 0 && m_told_left.empty()) m_told_left = report.to_text();
+    m_is_traced = !m_is_traced;
+    nvrtest::write_file(nvrtest::dmp_path, std::string(m_is_traced ? "2,5,1\n" : "2,5,0\n") + nvrtest::trace_path);
+    m_rig.restart();
+    fill_server_log(m_rig.server());
+    m_counts.unloads++;
+}
+
+void Soak::look()
+{
+    const Crossing::Hold hold(m_crossing);
+    if (m_trouble.end()) begin_new_life();
+    m_different += rested_names() != m_names;
+    const Process process = Process::now();
+    m_looks.push_back({minutes(), process});
+    say("%7.1f min  requests %9llu  errors %8llu  faults %8llu  alerts %7llu  lives %5llu  resident %7zu kB  heap %7zu "
+        "kB  "
+        "threads %3zu  descriptors %3zu\n",
+        minutes(), static_cast<unsigned long long>(m_counts.requests), static_cast<unsigned long long>(m_counts.errors),
+        static_cast<unsigned long long>(m_counts.faults), static_cast<unsigned long long>(m_counts.alerts),
+        static_cast<unsigned long long>(m_counts.unloads + 1), process.resident, process.heap, process.threads,
+        process.descriptors);
+    if (m_looks.size() % 3 == 0) begin_new_life();
+}
+
+bool Soak::run()
+{
+    const std::size_t ticks =
+        m_options.requests != 0
+            ? 10
+            : std::max<std::size_t>(10, std::chrono::duration_cast<std::chrono::minutes>(m_options.length).count());
+    m_start = Clock::now();
+    std::vector<std::thread> threads;
+    for (std::size_t i = 0; i < m_options.clients; i++)
+        threads.emplace_back([this, i] { serve_client(m_options.seed * 1000 + i + 1); });
+    threads.emplace_back([this] { make_trouble(m_options.seed * 1000); });
+    for (std::size_t tick = 1; tick <= ticks; tick++) {
+        wait_for_tick(tick, ticks);
+        look();
+    }
+    {
+        const std::lock_guard<std::mutex> lock(m_mutex);
+        m_ends = true;
+        m_changed.notify_all();
+    }
+    for (std::thread& thread : threads)
+        thread.join();
+    m_trouble.end();
+    m_load.unsubscribe_all();
+    begin_new_life();
+    return judge();
+}
+
+bool Soak::judge()
+{
+    bool all_well = true;
+    const auto hold_against = [&](bool is_well, const char* format, auto... values) {
+        all_well &= is_well;
+        say(is_well ? "well: " : "NOT WELL: ");
+        say(format, values...);
+    };
+    std::vector<std::pair<double, double>> resident;
+    for (std::size_t i = m_looks.size() / 2; i < m_looks.size(); i++)
+        resident.emplace_back(m_looks[i].minutes, static_cast<double>(m_looks[i].process.resident));
+    const Trend trend = Trend::through(resident);
+    if (is_sanitized) say("not judged under a sanitizer: ");
+    hold_against(
+        is_sanitized || trend.is_level(tolerance),
+        "resident memory moves by %.1f kB a minute (standard error %.1f), %.0f kB over the last %zu lines; level "
+        "below two standard errors, or %.0f kB\n",
+        trend.slope, trend.error, trend.change, resident.size(), tolerance);
+    const Process after = Process::now();
+    hold_against(after.threads <= m_before.threads, "%zu threads before, %zu after\n", m_before.threads, after.threads);
+    hold_against(after.descriptors <= m_before.descriptors, "%zu descriptors before, %zu after\n", m_before.descriptors,
+                 after.descriptors);
+    hold_against(m_different == 0, "other instances than at the start in %zu of %zu looks\n", m_different,
+                 m_looks.size());
+    hold_against(nvrsim_open_handles() == 0, "%zu handles of adapters open\n", nvrsim_open_handles());
+    hold_against(m_violations == 0 && m_left == 0, "%llu rules of the server broken, %llu of its objects kept\n%s",
+                 static_cast<unsigned long long>(m_violations), static_cast<unsigned long long>(m_left),
+                 m_told_left.c_str());
+    say("well: each of %llu requests was answered in time\n", static_cast<unsigned long long>(m_counts.requests));
+    return all_well;
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    try {
+        const Options options = parsed(argc, argv);
+        // By its default settings the allocator keeps free blocks aside for each thread, more and more for a while.
+        setenv("GLIBC_TUNABLES", "glibc.malloc.tcache_count=0:glibc.malloc.arena_max=1", 0);
+        nvrtest::enter_private_host(argv);
+        report_stream();
+        // Simulated dumps and all else go where nobody else is.
+        setenv("TMPDIR", Load::folder, 1);
+        return Soak(options).run() ? 0 : 1;
+    } catch (const std::exception& error) {
+        std::cerr << error.what() << '\n';
+        return 1;
+    }
+}
