@@ -1,0 +1,545 @@
+// A client, or a server, that means ill: every operation of every class with arguments that are missing, null, foreign,
+// of other types and huge. Each call is answered, and afterwards an honest client sees what it saw before.
+#include <atomic>
+#include <cstdint>
+#include <filesystem>
+#include <functional>
+#include <limits>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include <gmock/gmock.h>
+
+#include "simulator/nvrsim.h"
+#include "tests/module/support/Entries.h"
+#include "tests/module/support/Instance_Text.h"
+#include "tests/module/support/Service.h"
+#include "tests/module/support/Test_Clock.h"
+#include "tests/support/simulator.h"
+
+using namespace nvrtest;
+using host::Path;
+using host::Value;
+using testing::IsEmpty;
+
+namespace {
+
+constexpr char folder[] = "/var/log/hostile";
+constexpr char alert_class[] = "NVRHBA_AlertIndication";
+constexpr std::size_t megabyte = 1024 * 1024;
+
+Path nobody_of(const std::string& class_name)
+{
+    Path path;
+    path.name_space = "root/norvane";
+    path.class_name = class_name;
+    return path;
+}
+
+Value many(std::size_t count, CMPIType element, const Value& value)
+{
+    return Value::array(element, std::vector<Value>(count, value));
+}
+
+/// An instance that holds one that holds one.
+Value nest(unsigned depth)
+{
+    host::Instance instance;
+    instance.path = nobody_of("NVRHBA_JobSettingData");
+    instance.set("InstanceID", depth > 0 ? nest(depth - 1) : Value::string("the innermost"));
+    return Value::instance(instance);
+}
+
+Value reference_within(unsigned depth)
+{
+    Path path = nobody_of("NVRHBA_ControlledBy");
+    path.set("Antecedent", depth > 0 ? reference_within(depth - 1) : Value::string("the innermost"));
+    return Value::reference(path);
+}
+
+/// One value of each type, and some that are broken within.
+std::vector<Value> strange_values()
+{
+    Path elsewhere = nobody_of("NVRHBA_FCPort");
+    elsewhere.name_space = "root/nowhere";
+    elsewhere.set("DeviceID", Value::string("10000000C9A00001"));
+    Path unknown = nobody_of("CIM_NoSuchClass");
+    unknown.set("Name", Value::null_of(CMPI_string));
+    Path bare;
+    host::Instance foreign;
+    foreign.path = unknown;
+    foreign.set("Name", Value::uint64(1));
+    const Value text = Value::string("%s%n%x \x01\xff\r\n\"<&>");
+    return {
+        Value(),
+        Value::null_of(CMPI_string),
+        Value::null_of(CMPI_ref),
+        Value::null_of(CMPI_stringA),
+        Value::boolean(true),
+        Value::uint8(255),
+        Value::uint16(65535),
+        Value::uint32(4294967295u),
+        Value::uint64(std::numeric_limits<std::uint64_t>::max()),
+        Value::sint64(std::numeric_limits<std::int64_t>::min()),
+        Value::real(CMPI_real64, std::numeric_limits<double>::quiet_NaN()),
+        Value::integer(CMPI_char16, 0xD800),
+        text,
+        Value::string(""),
+        Value::datetime("99999999999999.999999:000"),
+        Value::datetime("no time at all"),
+        Value::reference(elsewhere),
+        Value::reference(unknown),
+        Value::reference(bare),
+        Value::reference(nobody_of("NVRHBA_FCPort")),
+        Value::instance(foreign),
+        Value::array(CMPI_string, {text, Value::null_of(CMPI_string), text}),
+        Value::array(CMPI_string, {}),
+        Value::array(CMPI_uint8, {Value::uint8(0)}),
+        Value::array(CMPI_boolean, {Value::boolean(true)}),
+        Value::array(CMPI_ref, {Value::reference(unknown), Value::null_of(CMPI_ref)}),
+        Value::array(CMPI_instance, {Value::instance(foreign)}),
+        Value::array(CMPI_dateTime, {Value::datetime("no time at all")}),
+    };
+}
+
+std::vector<Value> huge_values()
+{
+    Path path = nobody_of("NVRHBA_FCPort");
+    path.set("DeviceID", Value::string(std::string(megabyte, '1')));
+    return {
+        Value::string(std::string(megabyte, 'A')),
+        many(100000, CMPI_uint8, Value::uint8(7)),
+        many(10000, CMPI_uint16, Value::uint16(32768)),
+        many(10000, CMPI_string, Value::string("text")),
+        many(2, CMPI_string, Value::string(std::string(megabyte, 'B'))),
+        many(1000, CMPI_ref, Value::reference(nobody_of("NVRHBA_FCPort"))),
+        Value::reference(path),
+        reference_within(60),
+        nest(60),
+    };
+}
+
+class Hostile : public testing::Test {
+protected:
+    Hostile()
+    {
+        std::filesystem::create_directories(folder);
+        std::filesystem::current_path(folder);
+        m_before = whole_host();
+        m_ports = rig.names("NVRHBA_FCPort").paths;
+        rig.server().reset_report();
+    }
+
+    /// All that an honest client reads. Counters and states change by asking, so that the clock moves on first.
+    std::string whole_host()
+    {
+        rig.refresh();
+        std::string text;
+        advance_clock(std::chrono::seconds(11));
+        for (const std::string& name : instance_classes()) {
+            const host::Answer answer = rig.enumerate(name);
+            EXPECT_THAT(answer, succeeded()) << name;
+            text += to_lines(name, answer.instances);
+        }
+        return text;
+    }
+
+    void TearDown() override
+    {
+        rig.settle();
+        load_scenario("small"); // a client may change an adapter
+        for (const auto& [name, value] : {std::pair("cachetimeout", 10u), {"adapterrefresh", 1u}, {"sanrefresh", 1u}}) {
+            host::Instance setting;
+            setting.path = nobody_of("NVRHBA_ProviderConfigSetting");
+            setting.set("InstanceID", Value::string(std::string("Norvane HBA Provider:") + name));
+            setting.path.keys = setting.properties;
+            setting.set("current", Value::uint32(value));
+            EXPECT_THAT(rig.server().modify(setting, std::vector<std::string>{"current"}), succeeded());
+        }
+        rig.refresh();
+        EXPECT_EQ(difference(m_before, whole_host()), "");
+        rig.stop();
+        const host::Report report = rig.server().report();
+        EXPECT_THAT(report.violations, IsEmpty());
+        EXPECT_EQ(left_beside_strings(report) + report.clones_alive(), 0u) << report.to_text();
+        EXPECT_EQ(report.contexts_not_detached, 0u);
+        EXPECT_EQ(nvrsim_open_handles(), 0u);
+        EXPECT_GT(m_calls, 0u);
+    }
+
+    std::vector<std::string> instance_classes()
+    {
+        std::vector<std::string> names = rig.classes();
+        names.erase(std::remove(names.begin(), names.end(), alert_class), names.end());
+        return names;
+    }
+
+    /// Any answer will do that is the module's own: no exception came out of it.
+    void expect_answer(const host::Answer& answer, const std::string& what)
+    {
+        m_calls++;
+        EXPECT_NE(answer.status.fault, host::Fault::module) << what << ": " << answer.status.message;
+        EXPECT_NE(answer.status.fault, host::Fault::server) << what << ": " << answer.status.message;
+    }
+
+    /// Something that the method may take: a port that there is, a text that looks like a name.
+    Value plausible(const host::Element_Record& parameter)
+    {
+        const CMPIType type = parameter.type;
+        if (type == CMPI_ref) return Value::reference(m_ports.at(0));
+        if (type & CMPI_ARRAY) {
+            host::Element_Record element = parameter;
+            element.type = static_cast<CMPIType>(type & ~CMPI_ARRAY);
+            return Value::array(element.type, {plausible(element)});
+        }
+        if (type == CMPI_boolean) return Value::boolean(false);
+        if (host::is_integer(type)) return Value::integer(type, 1);
+        if (type == CMPI_dateTime) return Value::datetime("00000000000001.000000:000");
+        return type == CMPI_string ? Value::string("10000000C9A0F001") : Value::null_of(type);
+    }
+
+    void call_with_each(const Path& target, const host::Method_Record& method, const std::vector<Value>& values)
+    {
+        Arguments good;
+        for (const host::Element_Record& parameter : method.parameters)
+            good.push_back({parameter.name, plausible(parameter)});
+        const auto call = [&](const Arguments& arguments, const std::string& what) {
+            expect_answer(rig.server().call(target, method.name, arguments),
+                          target.class_name + '.' + method.name + ' ' + what);
+        };
+        call({}, "without arguments");
+        call(good, "with all");
+        for (std::size_t i = 0; i < good.size(); i++) {
+            Arguments others = good;
+            others.erase(others.begin() + static_cast<std::ptrdiff_t>(i));
+            call(others, "without " + good[i].name);
+            for (std::size_t at = 0; at < values.size(); at++) {
+                others = good;
+                others[i].value = values[at];
+                call(others, good[i].name + " = value " + std::to_string(at));
+            }
+        }
+    }
+
+    /// In four threads, each class in one of them.
+    void in_threads(const std::vector<std::string>& names, const std::function<void(const std::string&)>& body)
+    {
+        std::atomic<std::size_t> next{0};
+        std::vector<std::thread> threads;
+        for (int i = 0; i < 4; i++)
+            threads.emplace_back([&] {
+                for (std::size_t at = next++; at < names.size(); at = next++)
+                    body(names[at]);
+            });
+        for (std::thread& thread : threads)
+            thread.join();
+    }
+
+    Path some_path(const std::string& class_name)
+    {
+        const std::vector<Path> paths = rig.names(class_name).paths;
+        return paths.empty() ? nobody_of(class_name) : paths.front();
+    }
+
+    Rig rig{{host::Manner::strict(), "small", refreshing_settings}};
+    std::vector<Path> m_ports;
+    std::atomic<std::size_t> m_calls{0};
+
+private:
+    std::string m_before;
+};
+
+} // namespace
+
+TEST_F(Hostile, ArgumentsOfEveryMethodAreMissingOrOfAnotherType)
+{
+    const std::vector<Value> values = strange_values();
+    in_threads(instance_classes(), [&](const std::string& name) {
+        const Path target = some_path(name);
+        for (const host::Method_Record& method : module_schema()->find(name)->methods)
+            call_with_each(target, method, values);
+    });
+    EXPECT_GT(m_calls, 5000u);
+}
+
+TEST_F(Hostile, ArgumentsOfEveryServedMethodAreHuge)
+{
+    const std::vector<Value> values = huge_values();
+    for (const std::string& name : instance_classes()) {
+        const Path target = some_path(name);
+        for (const host::Method_Record& method : module_schema()->find(name)->methods)
+            if (rig.server().call(target, method.name).status.code != CMPI_RC_ERR_NOT_SUPPORTED)
+                call_with_each(target, method, values);
+    }
+    EXPECT_GT(m_calls, 200u);
+}
+
+TEST_F(Hostile, MethodsThatNobodyHasAndArgumentsThatNobodyAskedFor)
+{
+    Arguments superfluous;
+    for (int i = 0; i < 10000; i++)
+        superfluous.push_back({"No" + std::to_string(i), Value::uint32(1)});
+    superfluous.push_back({std::string(megabyte, 'n'), Value::string("")});
+    superfluous.push_back({"return_value", Value::string("")});
+    superfluous.push_back({"", Value()});
+    for (const std::string& name : instance_classes()) {
+        const Path target = some_path(name);
+        for (const std::string& method : {std::string(), name, std::string("return_value"), std::string("%n%s")})
+            expect_answer(rig.server().call(target, method), name + '.' + method);
+        const auto& methods = module_schema()->find(name)->methods;
+        if (methods.empty() || methods.front().parameters.empty()) continue;
+        expect_answer(rig.server().call(target, std::string(megabyte, 'm')), name);
+        expect_answer(rig.server().call(target, methods.back().name, superfluous), name + '.' + methods.back().name);
+    }
+}
+
+TEST_F(Hostile, KeysAreMissingSuperfluousHugeOrOfAnotherType)
+{
+    const std::vector<Value> values = strange_values();
+    const Value huge = Value::string(std::string(megabyte, 'k'));
+    in_threads(instance_classes(), [&](const std::string& name) {
+        const Path good = some_path(name);
+        std::vector<Path> paths = {nobody_of(name)};
+        for (std::size_t i = 0; i < good.keys.size(); i++) {
+            Path path = good;
+            path.keys.erase(path.keys.begin() + static_cast<std::ptrdiff_t>(i));
+            paths.push_back(path);
+            for (const Value& value : values) {
+                path = good;
+                path.keys[i].value = value;
+                paths.push_back(path);
+            }
+        }
+        Path more = good;
+        for (int i = 0; i < 1000; i++)
+            more.keys.push_back({"More" + std::to_string(i), Value::string("x")});
+        paths.push_back(more);
+        Path large = good;
+        for (host::Named_Value& key : large.keys)
+            key.value = huge;
+        large.keys.push_back({std::string(megabyte, 'n'), Value()});
+        paths.push_back(large);
+        for (std::size_t at = 0; at < paths.size(); at++) {
+            const Path& path = paths[at];
+            const std::string what = name + ", path " + std::to_string(at);
+            expect_answer(rig.server().get(path), "get " + what);
+            expect_answer(rig.server().remove(path), "delete " + what);
+            expect_answer(rig.server().reference_names(path, "NVRHBA_ControlledBy"), "references of " + what);
+        }
+    });
+}
+
+TEST_F(Hostile, PropertiesOfEveryClassAreOfAnotherTypeOrUnknown)
+{
+    const std::vector<Value> strange = strange_values(), huge = huge_values();
+    in_threads(instance_classes(), [&](const std::string& name) {
+        const bool can_change =
+            name == "NVRHBA_ProviderConfigSetting" || name == "NVRHBA_FCPort" || name == "NVRHBA_DumpData";
+        std::vector<Value> values = strange;
+        const Path path = some_path(name);
+        for (std::size_t at = 0; at < values.size(); at++) {
+            const Value& value = values[at];
+            host::Instance instance;
+            instance.path = path;
+            for (const host::Element_Record& property : module_schema()->find(name)->properties)
+                instance.set(property.name, value);
+            instance.set("NoSuchProperty", value);
+            const std::string what = name + ": all are value " + std::to_string(at);
+            expect_answer(rig.server().modify(instance), "modify " + what);
+            expect_answer(rig.server().modify(instance, std::vector<std::string>{"NoSuchProperty"}), "modify " + what);
+            expect_answer(rig.server().create(instance), "create " + what);
+        }
+        host::Instance empty;
+        empty.path = nobody_of(name);
+        expect_answer(rig.server().modify(empty), "modify nothing of " + name);
+        expect_answer(rig.server().create(empty), "create nothing of " + name);
+        if (!can_change) return;
+        // One property at a time, the others in order.
+        for (const host::Element_Record& property : module_schema()->find(name)->properties) {
+            values = strange;
+            if (property.key || property.writable) values.insert(values.end(), huge.begin(), huge.end());
+            for (const Value& value : values) {
+                host::Instance instance;
+                instance.path = path;
+                instance.properties = path.keys;
+                instance.set(property.name, value);
+                expect_answer(rig.server().modify(instance), "modify " + name + '.' + property.name);
+            }
+        }
+    });
+}
+
+TEST_F(Hostile, ListsOfPropertiesAreLong)
+{
+    std::vector<std::string> names(100000, "DeviceID");
+    for (std::size_t i = 0; i < names.size(); i += 2)
+        names[i] = "No" + std::to_string(i);
+    names.push_back(std::string(megabyte, 'p'));
+    for (const std::string& name : instance_classes())
+        expect_answer(rig.enumerate(name, std::vector<std::string>{"", "%n", "DeviceID", "deviceid", name}), name);
+    for (const char* name : {"NVRHBA_FCPort", "NVRHBA_ControlledBy", "NVRHBA_ProviderConfigSetting"}) {
+        expect_answer(rig.enumerate(name, names), name);
+        expect_answer(rig.server().get(some_path(name), names), name);
+    }
+    EXPECT_THAT(rig.server().references(m_ports.at(0), "NVRHBA_ControlledBy", "", names), succeeded());
+}
+
+TEST_F(Hostile, TraversalsAskForWhatThereIsNot)
+{
+    const std::string huge(megabyte, 'r');
+    std::vector<Path> starts = {m_ports.at(0), nobody_of("NVRHBA_FCPort"), nobody_of("NVRHBA_ControlledBy")};
+    starts.push_back(m_ports.at(0));
+    starts.back().set("DeviceID", Value::string(huge));
+    const std::string words[] = {"", "Antecedent", "CIM_ManagedElement", "NoSuch", "%n%s", huge};
+    for (const char* through : {"NVRHBA_ControlledBy", "NVRHBA_HostedService", "NVRHBA_ElementConformsToProfile"})
+        for (const Path& start : starts)
+            for (const std::string& role : words) {
+                expect_answer(rig.server().associators(start, through, "", role, ""), through);
+                expect_answer(rig.server().associators(start, through, "", "", role), through);
+                expect_answer(rig.server().associator_names(start, through, role, role, role), through);
+                expect_answer(rig.server().references(start, through, role), through);
+                expect_answer(rig.server().reference_names(start, through, role), through);
+            }
+}
+
+// ---- Straight at the tables, with what no server hands over.
+
+TEST_F(Hostile, EveryFunctionOfEveryTableIsCalledWithNothing)
+{
+    Entries entries;
+    const char* const nothing[] = {nullptr};
+    const char** const none = const_cast<const char**>(nothing);
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        const CMPIContext* const contexts[] = {context, nullptr};
+        for (const std::string& name : rig.classes()) {
+            SCOPED_TRACE(name);
+            CMPIInstanceMI* instances = entries.instances(name, broker, context);
+            CMPIMethodMI* methods = entries.methods(name, broker, context);
+            CMPIAssociationMI* ends = entries.associations(name, broker, context);
+            for (const CMPIContext* ctx : contexts) {
+                if (instances) {
+                    for (CMPIInstanceMI* mi : {instances, static_cast<CMPIInstanceMI*>(nullptr)}) {
+                        const CMPIInstanceMIFT& ft = *instances->ft;
+                        EXPECT_NE(ft.enumerateInstanceNames(mi, ctx, nullptr, nullptr).rc, CMPI_RC_OK);
+                        EXPECT_NE(ft.enumerateInstances(mi, ctx, nullptr, nullptr, none).rc, CMPI_RC_OK);
+                        EXPECT_NE(ft.getInstance(mi, ctx, nullptr, nullptr, none).rc, CMPI_RC_OK);
+                        EXPECT_NE(ft.createInstance(mi, ctx, nullptr, nullptr, nullptr).rc, CMPI_RC_OK);
+                        EXPECT_NE(ft.modifyInstance(mi, ctx, nullptr, nullptr, nullptr, none).rc, CMPI_RC_OK);
+                        EXPECT_NE(ft.deleteInstance(mi, ctx, nullptr, nullptr).rc, CMPI_RC_OK);
+                        EXPECT_NE(ft.execQuery(mi, ctx, nullptr, nullptr, nullptr, nullptr).rc, CMPI_RC_OK);
+                    }
+                }
+                if (methods)
+                    for (CMPIMethodMI* mi : {methods, static_cast<CMPIMethodMI*>(nullptr)}) {
+                        const auto call = methods->ft->invokeMethod;
+                        EXPECT_NE(call(mi, ctx, nullptr, nullptr, nullptr, nullptr, nullptr).rc, CMPI_RC_OK);
+                    }
+                // A class that is not found has no ends: that is an answer.
+                if (ends)
+                    for (CMPIAssociationMI* mi : {ends, static_cast<CMPIAssociationMI*>(nullptr)}) {
+                        const CMPIAssociationMIFT& ft = *ends->ft;
+                        const CMPIrc rc = mi ? CMPI_RC_OK : CMPI_RC_ERR_FAILED;
+                        EXPECT_EQ(
+                            ft.associators(mi, ctx, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, none).rc, rc);
+                        EXPECT_EQ(ft.associatorNames(mi, ctx, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr).rc,
+                                  rc);
+                        EXPECT_EQ(ft.references(mi, ctx, nullptr, nullptr, nullptr, nullptr, none).rc, rc);
+                        EXPECT_EQ(ft.referenceNames(mi, ctx, nullptr, nullptr, nullptr, nullptr).rc, rc);
+                    }
+                m_calls++;
+            }
+            const auto clean_up = [](auto* mi) {
+                if (!mi) return;
+                EXPECT_EQ(mi->ft->cleanup(nullptr, nullptr, 0).rc, CMPI_RC_OK);
+                EXPECT_EQ(mi->ft->cleanup(mi, nullptr, 0).rc, CMPI_RC_OK);
+            };
+            clean_up(instances);
+            clean_up(methods);
+            clean_up(ends);
+        }
+    });
+}
+
+TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
+{
+    Entries entries;
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        CMPIInstanceMI* ports = entries.instances("NVRHBA_FCPort", broker, context);
+        CMPIMethodMI* names = entries.methods("NVRHBA_FCHBAWWNService", broker, context);
+        CMPIAssociationMI* ends = entries.associations("NVRHBA_ControlledBy", broker, context);
+        for (const std::string& name_space :
+             {std::string("root/norvane"), std::string("root/nowhere"), std::string(), std::string(megabyte, '/')})
+            for (const std::string& name :
+                 {std::string("NVRHBA_Product"), std::string("NVRHBA_ControlledBy"), std::string(megabyte, 'c')}) {
+                CMPIStatus status = {CMPI_RC_OK, nullptr};
+                CMPIObjectPath* path = broker->eft->newObjectPath(broker, name_space.c_str(), name.c_str(), &status);
+                if (!path) continue;
+                CMPIInstance* instance = broker->eft->newInstance(broker, path, &status);
+                ports->ft->enumerateInstanceNames(ports, context, nullptr, path);
+                ports->ft->enumerateInstances(ports, context, nullptr, path, nullptr);
+                ports->ft->getInstance(ports, context, nullptr, path, nullptr);
+                ports->ft->createInstance(ports, context, nullptr, path, instance);
+                ports->ft->modifyInstance(ports, context, nullptr, path, instance, nullptr);
+                ports->ft->deleteInstance(ports, context, nullptr, path);
+                names->ft->invokeMethod(names, context, nullptr, path, "ReadWWN", nullptr, nullptr);
+                ends->ft->associators(ends, context, nullptr, path, name.c_str(), name.c_str(), "", "", nullptr);
+                ends->ft->references(ends, context, nullptr, path, name.c_str(), "", nullptr);
+                m_calls++;
+                if (instance) instance->ft->release(instance);
+                path->ft->release(path);
+            }
+        EXPECT_EQ(ports->ft->cleanup(ports, context, 0).rc, CMPI_RC_OK);
+        EXPECT_EQ(names->ft->cleanup(names, context, 0).rc, CMPI_RC_OK);
+        EXPECT_EQ(ends->ft->cleanup(ends, context, 0).rc, CMPI_RC_OK);
+    });
+}
+
+TEST_F(Hostile, FiltersOfAnyClassAndQueryComeAndGoInAnyOrder)
+{
+    Entries entries;
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        CMPIIndicationMI* mi = entries.indications(alert_class, broker, context);
+        ASSERT_TRUE(mi);
+        const CMPIIndicationMIFT& ft = *mi->ft;
+        CMPIStatus status = {CMPI_RC_OK, nullptr};
+        const auto at = [&](const std::string& name_space) {
+            return broker->eft->newObjectPath(broker, name_space.c_str(), "CIM_NoSuchClass", &status);
+        };
+        for (int round = 0; round < 3; round++) {
+            EXPECT_EQ(ft.disableIndications(mi, context).rc, CMPI_RC_OK) << "they are not enabled";
+            CMPIObjectPath* nowhere = at("root/nowhere");
+            EXPECT_EQ(ft.deActivateFilter(mi, context, nullptr, nullptr, nowhere, 1).rc, CMPI_RC_OK) << "it is not";
+            for (CMPIIndicationMI* whose : {mi, static_cast<CMPIIndicationMI*>(nullptr)}) {
+                ft.authorizeFilter(whose, nullptr, nullptr, nullptr, nullptr, nullptr);
+                ft.mustPoll(whose, nullptr, nullptr, nullptr, nullptr);
+                ft.activateFilter(whose, nullptr, nullptr, nullptr, nullptr, 0);
+                ft.deActivateFilter(whose, nullptr, nullptr, nullptr, nullptr, 0);
+            }
+            for (const char* query : {"", "SELECT", "%n%s", "SELECT * FROM CIM_NoSuchClass WHERE \"\0"}) {
+                CMPISelectExp* filter = broker->eft->newSelectExp(broker, query, "no:such", nullptr, &status);
+                EXPECT_EQ(ft.authorizeFilter(mi, context, filter, "NoSuch", nowhere, "nobody").rc, CMPI_RC_OK);
+                EXPECT_EQ(ft.activateFilter(mi, context, filter, "", nowhere, 1).rc, CMPI_RC_OK);
+                if (filter) filter->ft->release(filter);
+            }
+            for (int i = 0; i < 1000; i++) {
+                CMPIObjectPath* path = at("root/" + std::to_string(i));
+                EXPECT_EQ(ft.activateFilter(mi, context, nullptr, nullptr, path, 1).rc, CMPI_RC_OK);
+                path->ft->release(path);
+            }
+            EXPECT_EQ(ft.enableIndications(mi, context).rc, CMPI_RC_OK);
+            EXPECT_EQ(ft.enableIndications(mi, context).rc, CMPI_RC_OK) << "twice";
+            nvrsim_event("0", 513, 0); // to all thousand
+            nvrsim_drain_events();
+            for (int i = 0; i < 1005; i++) {
+                CMPIObjectPath* path = at(i < 1000 ? "root/" + std::to_string(i) : "root/nowhere");
+                EXPECT_EQ(ft.deActivateFilter(mi, context, nullptr, nullptr, path, 1).rc, CMPI_RC_OK);
+                path->ft->release(path);
+            }
+            EXPECT_EQ(ft.disableIndications(mi, context).rc, CMPI_RC_OK);
+            nowhere->ft->release(nowhere);
+            m_calls++;
+        }
+        EXPECT_EQ(ft.cleanup(mi, nullptr, 0).rc, CMPI_RC_OK);
+    });
+}
