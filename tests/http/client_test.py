@@ -9,6 +9,7 @@ import queue
 import re
 import shlex
 import shutil
+import socket
 import subprocess
 import sys
 import tempfile
@@ -440,6 +441,125 @@ class WithXml(unittest.TestCase):
             self.assertIn('ERROR CODE="5"', request(operation, class_name), operation)
         for operation in ("GetInstance", "DeleteInstance", "GetProperty", "Associators", "References"):
             self.assertIn('ERROR CODE="4"', request(operation, ""), operation)
+
+
+class WithIll(unittest.TestCase):
+    """Clients that mean ill: whatever they send, the next honest one is answered as before."""
+
+    PORTS = '<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="NVRHBA_FCPort"/></IPARAMVALUE>'
+    HEAD = b"POST /cimom HTTP/1.1\r\nHost: here\r\nContent-Type: application/xml\r\nConnection: close\r\n"
+
+    def setUp(self):
+        self.before = request("EnumerateInstanceNames", self.PORTS)
+
+    def tearDown(self):
+        self.assertEqual(request("EnumerateInstanceNames", self.PORTS), self.before)
+        self.assertIsNone(SERVER.poll())
+
+    def raw(self, data):
+        """All that comes back for these bytes."""
+        with socket.create_connection(("127.0.0.1", PORT), timeout=60) as connection:
+            answer = b""
+            try:
+                connection.sendall(data)
+                connection.shutdown(socket.SHUT_WR)
+                while part := connection.recv(65536):
+                    answer += part
+            except (BrokenPipeError, ConnectionResetError):  # it does not read on
+                pass
+        return answer
+
+    def assert_refused(self, data):
+        """No answer, or one that says whose fault it is."""
+        self.assertRegex(self.raw(data)[:12] or b"HTTP/1.1 400", rb"^HTTP/1\.[01] [45]\d\d$", data[:300])
+
+    def body(self, inner):
+        return ('<?xml version="1.0"?><CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE ID="1" PROTOCOLVERSION="1.0">'
+                f"<SIMPLEREQ>{inner}</SIMPLEREQ></MESSAGE></CIM>").encode()
+
+    def post(self, body):
+        return self.HEAD + b"Content-Length: %d\r\n\r\n" % len(body) + body
+
+    def test_lengths_that_lie(self):
+        body = self.body('<IMETHODCALL NAME="EnumerateInstanceNames"><LOCALNAMESPACEPATH><NAMESPACE NAME="root"/>'
+                         f'<NAMESPACE NAME="norvane"/></LOCALNAMESPACEPATH>{self.PORTS}</IMETHODCALL>')
+        self.assertTrue(self.raw(self.post(body)).startswith(b"HTTP/1.1 200"))
+        for length in (b"0", b"1", b"%d" % (len(body) - 1), b"%d" % (len(body) + 1), b"-1", b"+5", b"0x10", b"ten",
+                       b"18446744073709551615", b"18446744073709551616", b"9" * 1000, b""):
+            self.assert_refused(self.HEAD + b"Content-Length: " + length + b"\r\n\r\n" + body)
+        chunked = self.HEAD + b"Transfer-Encoding: chunked\r\n"
+        for chunks in (b"", b"zz\r\n", b"-1\r\n", b"5\r\nab", b"ffffffffffffffffff\r\nx", b"5\r\nabcdefg\r\n0\r\n\r\n",
+                       b"0\r\n\r\n", b"5;" + b"x" * 100000):
+            self.assert_refused(chunked + b"\r\n" + chunks)
+
+    def test_heads_that_are_none(self):
+        for head in (b"", b"\r\n" * 1000, b"\0" * 1000, b"GET", b"POST /cimom", b"POST\r\n\r\n",
+                     b"POST /cimom HTTP/9.9\r\n\r\n",
+                     b"POST " + b"/" * 100000 + b" HTTP/1.1\r\n\r\n", b"POST /cimom HTTP/1.1\r\n" + b"A: b\r\n" * 20000 + b"\r\n",
+                     b"POST /cimom HTTP/1.1\r\n: no name\r\n\r\n", bytes(range(256)) * 100, b"\x16\x03\x01\x02\x00" * 50):
+            self.assert_refused(head)
+
+    def test_bodies_that_are_none(self):
+        entities = "".join(f'<!ENTITY e{i} "{f"&e{i - 1};" * 10 if i else "x" * 10}">' for i in range(20))
+        for body in (b"", b"<", b"\0" * 1000, b"<CIM", b"<CIM>" * 100000, b"<" * 1000000, b"&" * 100000, b"]]>",
+                     ("<CIM" + "".join(f' A{i}="b"' for i in range(100000)) + "/>").encode(),
+                     self.body("x" * 1000000), self.body("<![CDATA["), self.body("<A>" * 50000 + "</A>" * 50000),
+                     f"<!DOCTYPE CIM [{entities}]><CIM>&e19;</CIM>".encode(),
+                     b'<!DOCTYPE CIM [<!ENTITY f SYSTEM "file:///etc/passwd">]><CIM>&f;</CIM>',
+                     self.body('<IMETHODCALL NAME="EnumerateInstances"/>').decode().encode("utf-16"),
+                     bytes(range(256)) * 1000):
+            answer = self.raw(self.post(body))
+            self.assertRegex(answer[:12], rb"^HTTP/1\.1 (200|4\d\d|501)$", body[:100])
+            self.assertNotIn(b"root:", answer)
+            if answer.startswith(b"HTTP/1.1 200"):
+                self.assertIn(b"<ERROR CODE=", answer, body[:100])
+
+    def test_operations_that_nobody_knows(self):
+        for name in ("", "NoSuchOperation", "x" * 100000, "&#0;", "../..", "EnumerateInstances&#x0a;X: y"):
+            answer = self.raw(self.post(self.body(
+                f'<IMETHODCALL NAME="{name}"><LOCALNAMESPACEPATH><NAMESPACE NAME="root"/></LOCALNAMESPACEPATH></IMETHODCALL>')))
+            self.assertTrue(b"<ERROR CODE=" in answer or answer.startswith((b"HTTP/1.1 400", b"HTTP/1.1 501")), answer[:300])
+
+    def test_arguments_of_each_service_that_are_of_another_type(self):
+        values = ['<VALUE>"%n%s"</VALUE>', "<VALUE/>", "<VALUE>-99999999999999999999999</VALUE>", "<VALUE.ARRAY/>",
+                  "<VALUE.ARRAY><VALUE>1</VALUE><VALUE.NULL/><VALUE>x</VALUE></VALUE.ARRAY>", "<VALUE.REFERENCE/>",
+                  '<VALUE.REFERENCE><INSTANCENAME CLASSNAME="NVRHBA_Nothing"/></VALUE.REFERENCE>',
+                  '<VALUE.REFERENCE><CLASSNAME NAME="NVRHBA_FCPort"/></VALUE.REFERENCE>',
+                  f"<VALUE>{'A' * 1048576}</VALUE>", ""]
+        kinds = ["", ' PARAMTYPE="string"', ' PARAMTYPE="reference"', ' PARAMTYPE="uint8"', ' PARAMTYPE="none"']
+        called = 0
+        for service in ("NVRHBA_FCHBAWWNService", "NVRHBA_DumpService", "NVRHBA_FCTagService", "NVRHBA_BootBIOSService",
+                        "NVRHBA_SoftwareInstallationService", "NVRHBA_FCHBADriverParamService", "NVRHBA_RecordLog",
+                        "NVRHBA_FCHBADiagnosticTest"):
+            name = re.search("<INSTANCENAME.*?</INSTANCENAME>", request(
+                "EnumerateInstanceNames", self.PORTS.replace("NVRHBA_FCPort", service)), re.S).group(0)
+            declared = request("GetClass", self.PORTS.replace("NVRHBA_FCPort", service) +
+                               '<IPARAMVALUE NAME="LocalOnly"><VALUE>FALSE</VALUE></IPARAMVALUE>')
+            for method, inner in re.findall(r'<METHOD NAME="(\w+)".*?>(.*?)</METHOD>', declared, re.S):
+                for parameter in re.findall(r'<PARAMETER[.\w]* NAME="(\w+)"', inner):
+                    for number, value in enumerate(values):
+                        kind = kinds[number % len(kinds)]
+                        try:
+                            answer = request(method, f'<PARAMVALUE NAME="{parameter}"{kind}>{value}</PARAMVALUE>',
+                                             extrinsic=name)
+                            self.assertRegex(answer, "<RETURNVALUE|<ERROR CODE=", (service, method, parameter, value[:99]))
+                        except AssertionError as refused:
+                            self.assertRegex(str(refused), "^400 ", (service, method, parameter, value[:99]))
+                        called += 1
+        self.assertGreater(called, 300)
+
+    def test_more_connections_than_it_takes(self):
+        connections = []
+        try:
+            for number in range(600):
+                connections.append(socket.create_connection(("127.0.0.1", PORT), timeout=60))
+                try:
+                    connections[-1].sendall(self.HEAD[:number % len(self.HEAD)])
+                except (BrokenPipeError, ConnectionResetError):  # it has enough
+                    pass
+        finally:
+            for connection in connections:
+                connection.close()
 
 
 unittest.main(verbosity=2)
