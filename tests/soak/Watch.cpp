@@ -1,6 +1,7 @@
 #include "tests/soak/Watch.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace soak {
 
@@ -29,7 +30,7 @@ void Watch::allow(Clock::duration delay)
 Watch::Turn::Turn(Watch& watch, std::string what) : m_watch(watch), m_what(std::move(what))
 {
     const std::lock_guard<std::mutex> lock(watch.m_mutex);
-    m_until = Clock::now() + watch.m_limit;
+    m_until = watch.m_now + watch.m_limit;
     m_place = watch.m_turns.insert(watch.m_turns.end(), this);
 }
 
@@ -43,10 +44,12 @@ void Watch::run()
 {
     const auto pause = std::min<Clock::duration>(m_limit / 10, std::chrono::milliseconds(500));
     std::unique_lock<std::mutex> lock(m_mutex);
+    Clock::time_point last = Clock::now();
     while (!m_changed.wait_for(lock, pause, [this] { return m_ends; })) {
         const Clock::time_point now = Clock::now();
+        m_now += std::min(now - std::exchange(last, now), 2 * pause);
         for (const Turn* turn : m_turns)
-            if (now > turn->m_until) return m_on_hang(turn->m_what);
+            if (m_now > turn->m_until) return m_on_hang(turn->m_what);
     }
 }
 

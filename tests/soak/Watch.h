@@ -4,6 +4,7 @@
 ///     Watch watch(std::chrono::seconds(10), [](const std::string& what) { std::_Exit(1); });
 ///     { Watch::Turn turn(watch, "enumerate NVRHBA_FCPort"); server.enumerate(...); }
 ///
+/// Its clock goes by its own rounds: while the machine lets this process wait for a processor, it hardly moves.
 /// Any thread. The handler is called once, on the watch's own thread, while the request still waits.
 #pragma once
 
@@ -41,7 +42,7 @@ public:
         friend class Watch;
         Watch& m_watch;
         const std::string m_what;
-        Clock::time_point m_until;
+        Clock::duration m_until;
         std::list<Turn*>::iterator m_place;
     };
 
@@ -53,6 +54,7 @@ private:
     std::mutex m_mutex;
     std::condition_variable m_changed;
     std::list<Turn*> m_turns;
+    Clock::duration m_now{};
     bool m_ends = false;
     std::thread m_thread;
 };
