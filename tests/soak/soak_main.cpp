@@ -291,10 +291,13 @@ void Soak::begin_new_life()
 void Soak::look()
 {
     const Crossing::Hold hold(m_crossing);
+    const std::uint64_t requests = m_counts.requests, errors = m_counts.errors; // of clients
     if (m_trouble.end()) begin_new_life();
     m_different += rested_names() != m_names;
     const Process process = Process::now();
     m_looks.push_back({minutes(), process});
+    m_counts.requests = requests;
+    m_counts.errors = errors;
     say("%7.1f min  requests %9llu  errors %8llu  faults %8llu  alerts %7llu  lives %5llu  resident %7zu kB  heap %7zu "
         "kB  "
         "threads %3zu  descriptors %3zu\n",
