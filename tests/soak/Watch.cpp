@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <utility>
 
+#include "tests/soak/Process.h"
+
 namespace soak {
 
 Watch::Watch(Clock::duration limit, std::function<void(const std::string&)> on_hang)
@@ -44,10 +46,13 @@ void Watch::run()
 {
     const auto pause = std::min<Clock::duration>(m_limit / 10, std::chrono::milliseconds(500));
     std::unique_lock<std::mutex> lock(m_mutex);
+    Starvation starvation;
+    starvation.since_last();
     Clock::time_point last = Clock::now();
     while (!m_changed.wait_for(lock, pause, [this] { return m_ends; })) {
         const Clock::time_point now = Clock::now();
-        m_now += std::min(now - std::exchange(last, now), 2 * pause);
+        const Clock::duration passed = now - std::exchange(last, now);
+        m_now += std::max(Clock::duration(0), passed - starvation.since_last());
         for (const Turn* turn : m_turns)
             if (m_now > turn->m_until) return m_on_hang(turn->m_what);
     }

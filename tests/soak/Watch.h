@@ -4,7 +4,7 @@
 ///     Watch watch(std::chrono::seconds(10), [](const std::string& what) { std::_Exit(1); });
 ///     { Watch::Turn turn(watch, "enumerate NVRHBA_FCPort"); server.enumerate(...); }
 ///
-/// Its clock goes by its own rounds: while the machine lets this process wait for a processor, it hardly moves.
+/// Its clock stands still while a thread of this process waits for a free processor.
 /// Any thread. The handler is called once, on the watch's own thread, while the request still waits.
 #pragma once
 
