@@ -50,8 +50,6 @@ constexpr bool is_sanitized = true;
 #else
 constexpr bool is_sanitized = false;
 #endif
-/// No request may take longer; ten times as long where a sanitizer slows all down.
-constexpr std::chrono::seconds patience{is_sanitized ? 100 : 10};
 /// Between two looks the resident memory may move by as much without a leak, kB over the second half of the run.
 constexpr double tolerance = 512;
 constexpr std::uintmax_t largest_trace = 16 * 1024 * 1024;
@@ -62,11 +60,14 @@ struct Options {
     std::size_t clients = 6;
     std::uint64_t seed = 1;
     const host::Manner* manner = &host::Manner::strict();
+    /// No request may take longer; ten times as long where a sanitizer slows all down.
+    std::chrono::seconds patience{is_sanitized ? 100 : 10};
     std::size_t leak = 0; ///< bytes that each request is made to lose
 };
 
 constexpr char usage[] =
     "nvr_soak [--seconds N | --minutes N | --hours N | --requests N] [--clients N] [--manner NAME] [--seed N]\n"
+    "         [--patience N]    seconds that a request may take; more where others keep the processors busy\n"
     "         [--leak BYTES]    each request loses so many bytes: the run has to end with 1\n";
 
 std::uint64_t number(const std::string& text)
@@ -96,6 +97,8 @@ Options parsed(int argc, char** argv)
             options.clients = number(value);
         else if (name == "--seed")
             options.seed = number(value);
+        else if (name == "--patience")
+            options.patience = std::chrono::seconds(number(value));
         else if (name == "--leak")
             options.leak = number(value);
         else if (name == "--manner")
@@ -148,7 +151,7 @@ void fill_server_log(host::Host& server)
 class Soak {
 public:
     explicit Soak(const Options& options)
-        : m_options(options), m_watch(patience, &Soak::tell_hang), m_rig({*options.manner}),
+        : m_options(options), m_watch(options.patience, &Soak::tell_hang), m_rig({*options.manner}),
           m_load(m_rig, m_watch, m_counts), m_trouble(m_rig, m_watch, m_counts, warm_up())
     {
         m_rig.restart();
