@@ -4,6 +4,7 @@
 #include <cstdarg>
 #include <cstdio>
 #include <exception>
+#include <string>
 
 #include "foundation/NVR_CIMLogger.h"
 #include "foundation/NVR_FileLogger.h"
@@ -11,6 +12,7 @@
 #include "runtime/Immortal.h"
 #include "runtime/Mutex.h"
 #include "runtime/Undisturbed.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
@@ -117,15 +119,19 @@ void CLogger::log(const char* file, const uint32& line, sint32 level, const char
 
 void CLogger::dispatch(const char* file, uint32 line, sint32 level, const char* text)
 {
+    // A message is not worth an error, and destructors log.
+    const auto hand_over = [&](NVR_LoggerInterface* logger) {
+        guarded([&] { logger->logMessage(level, file, line, text); });
+    };
     if (m_enabled == 0) {
         if (NVR_SysLogger* logger = system_logger) {
-            logger->logMessage(level, file, line, text);
+            hand_over(logger);
             return;
         }
     }
     Hold hold;
     for (NVR_LoggerInterface* logger : m_loggers)
-        logger->logMessage(level, file, line, text);
+        hand_over(logger);
 }
 
 int CLogger::attach(NVR_LoggerInterface* logger)

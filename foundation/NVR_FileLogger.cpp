@@ -1,6 +1,7 @@
 #include "foundation/NVR_FileLogger.h"
 
 #include <cerrno>
+#include <new>
 #include <pthread.h>
 #include <stdio_ext.h>
 #include <sys/stat.h>
@@ -40,7 +41,7 @@ void NVR_FileLogger::logMessage(sint32 level, const char* file, uint32 line, con
     CLogger::Hold hold;
     if (!m_stream || level > NVR_DBG) return;
     char time[Datetime::text_size];
-    Datetime::now().pretty(time);
+    Datetime::now_pretty(time);
     // The letter l behind the number is part of the line, not of the conversion.
     std::fprintf(m_stream, "[threadid =%ul] [%s] [%s:%u][%s] %s\n", static_cast<unsigned>(::pthread_self()), time, file,
                  line, logLevelName(level), text);
@@ -92,6 +93,7 @@ int NVR_FileLogger::setPath(const char* path)
     }
     String stored(path); // before anything changes: `path` may be our own text
     File file = open_file(path, "a+");
+    if (!file && errno == ENOMEM) throw std::bad_alloc(); // no fault of the path: settings with it must not be given up
     if (!file) return -1;
     closeStream();
     m_stream = file.release();

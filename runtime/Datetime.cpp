@@ -85,6 +85,36 @@ bool scan_timestamp(const char* text, uint64& usec, sint32& utc)
     return true;
 }
 
+/// The system's clock: microseconds since the epoch, and the zone. False if it fails.
+bool read_clock(uint64& usec, sint32& utc)
+{
+    timeval time{};
+    struct timezone zone {};
+    if (gettimeofday(&time, &zone) != 0) return false;
+    usec = static_cast<uint64>(time.tv_sec) * second + static_cast<uint64>(time.tv_usec);
+    utc = -zone.tz_minuteswest;
+    return true;
+}
+
+void write(char (&text)[Datetime::text_size], uint64 usec, sint32 utc, bool is_timestamp, bool prettify)
+{
+    const auto fraction = static_cast<unsigned>(usec % second);
+    if (!is_timestamp) {
+        std::snprintf(text, sizeof text, prettify ? "%08u %02u %02u %02u.%06u:000" : "%08u%02u%02u%02u.%06u:000",
+                      static_cast<unsigned>(usec / day), static_cast<unsigned>(usec / hour % 24),
+                      static_cast<unsigned>(usec / minute % 60), static_cast<unsigned>(usec / second % 60), fraction);
+        return;
+    }
+    const auto time = static_cast<std::time_t>(usec / second);
+    std::tm date{};
+    localtime_r(&time, &date);
+    const long long zone = utc;
+    std::snprintf(text, sizeof text,
+                  prettify ? "%04d/%02d/%02d %02d:%02d:%02d.%06d%c%03d" : "%04d%02d%02d%02d%02d%02d.%06d%c%03d",
+                  date.tm_year + 1900, date.tm_mon + 1, date.tm_mday, date.tm_hour, date.tm_min, date.tm_sec,
+                  static_cast<int>(fraction), zone < 0 ? '-' : '+', static_cast<int>(zone < 0 ? -zone : zone));
+}
+
 } // namespace
 
 struct Datetime::Rep {
@@ -139,11 +169,9 @@ Datetime& Datetime::operator=(const Datetime& other) noexcept
 
 Datetime Datetime::now()
 {
-    timeval time{};
-    struct timezone zone {};
-    if (gettimeofday(&time, &zone) != 0) return Datetime();
-    return Datetime(static_cast<uint64>(time.tv_sec) * second + static_cast<uint64>(time.tv_usec),
-                    -zone.tz_minuteswest);
+    uint64 usec = 0;
+    sint32 utc = 0;
+    return read_clock(usec, utc) ? Datetime(usec, utc) : Datetime();
 }
 
 int Datetime::set(const char* text)
@@ -193,22 +221,15 @@ void Datetime::set_timestamp(uint64 usec, sint32 utc)
 
 void Datetime::print(char (&text)[text_size], bool prettify) const
 {
-    const uint64 usec = this->usec();
-    const auto fraction = static_cast<unsigned>(usec % second);
-    if (!is_timestamp()) {
-        std::snprintf(text, text_size, prettify ? "%08u %02u %02u %02u.%06u:000" : "%08u%02u%02u%02u.%06u:000",
-                      static_cast<unsigned>(usec / day), static_cast<unsigned>(usec / hour % 24),
-                      static_cast<unsigned>(usec / minute % 60), static_cast<unsigned>(usec / second % 60), fraction);
-        return;
-    }
-    const auto time = static_cast<std::time_t>(usec / second);
-    std::tm date{};
-    localtime_r(&time, &date);
-    const long long utc = this->utc();
-    std::snprintf(text, text_size,
-                  prettify ? "%04d/%02d/%02d %02d:%02d:%02d.%06d%c%03d" : "%04d%02d%02d%02d%02d%02d.%06d%c%03d",
-                  date.tm_year + 1900, date.tm_mon + 1, date.tm_mday, date.tm_hour, date.tm_min, date.tm_sec,
-                  static_cast<int>(fraction), utc < 0 ? '-' : '+', static_cast<int>(utc < 0 ? -utc : utc));
+    write(text, usec(), utc(), is_timestamp(), prettify);
+}
+
+void Datetime::now_pretty(char (&text)[text_size])
+{
+    uint64 usec = 0;
+    sint32 utc = 0;
+    const bool is_known = read_clock(usec, utc);
+    write(text, usec, utc, is_known, true);
 }
 
 bool operator==(const Datetime& a, const Datetime& b)

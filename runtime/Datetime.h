@@ -49,6 +49,8 @@ public:
     void ascii(char (&text)[text_size]) const { print(text, false); }
     /// The readable form: "yyyy/mm/dd hh:mm:ss.mmmmmm+utc", or an interval with blanks between its parts.
     void pretty(char (&text)[text_size]) const { print(text, true); }
+    /// now() as pretty() writes it, for messages: asks for no memory.
+    static void now_pretty(char (&text)[text_size]);
 
 private:
     struct Rep;

@@ -150,7 +150,7 @@ void append_format(String& text, const char* format, ...)
 void append_head(String& line, Log_Level level, const char* file, int at)
 {
     char time[Datetime::text_size];
-    Datetime::now().pretty(time);
+    Datetime::now_pretty(time);
     if (char* point = std::strchr(time, '.')) *point = '\0';
     append_format(line, "%s %s: %s(%d): ", time, level_names[level], file, at);
 }

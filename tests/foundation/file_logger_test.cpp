@@ -11,7 +11,9 @@
 #include <unistd.h>
 
 #include "foundation/CLogger.h"
+#include "foundation/NVR_CIMLogger.h"
 #include "tests/support/private_host.h"
+#include "tests/support/short_memory.h"
 #include "tests/support/trace.h"
 
 using namespace cimple;
@@ -46,6 +48,29 @@ TEST_F(TraceFile, HasOneLineForEachRecord)
         MatchesRegex("\\[threadid =[0-9]+l\\] \\[[0-9]+/[0-9]+/[0-9]+ [0-9]+:[0-9]+:[0-9]+\\.[0-9]+[+-][0-9]+\\] "
                      "\\[dir/source.cpp:12\\]\\[NVR_DBG\\] a message\n"));
     EXPECT_THAT(trace_file_words(path), ElementsAre("a message"));
+}
+
+// Destructors log, also while memory is short.
+TEST_F(TraceFile, NeedsNoMemoryForARecord)
+{
+    ASSERT_EQ(file.setPath(path.c_str()), 0);
+    logger().setMode(2);
+    EXPECT_EQ(refuse_each_allocation([] { logger().log("f", 1, 5, "a %s", "message"); }, [](bool) {}), 0);
+    EXPECT_THAT(trace_file_words(path), ElementsAre("a message"));
+}
+
+TEST_F(TraceFile, HasTheRecordThatAnotherLoggerHasNoMemoryFor)
+{
+    NVR_CIMLogger ring; // keeps it too, in memory of its own
+    ASSERT_EQ(file.setPath(path.c_str()), 0);
+    logger().setMode(4);
+    const long pieces =
+        refuse_each_allocation([] { logger().log("f", 1, 3, "x"); }, [](bool has_thrown) { EXPECT_FALSE(has_thrown); });
+    EXPECT_GT(pieces, 0);
+    EXPECT_EQ(trace_file_words(path), std::vector<std::string>(static_cast<std::size_t>(pieces) + 1, "x"));
+    std::vector<NVR_CIMLogEntry> kept;
+    ring.getEntries(kept);
+    EXPECT_EQ(kept.size(), 1u);
 }
 
 TEST_F(TraceFile, RecordsInModesTwoAndFourUpToLevelFive)
