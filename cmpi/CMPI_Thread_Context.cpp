@@ -26,10 +26,11 @@ Instance* read_instance(const CMPIBroker* broker, const Meta_Class* meta_class, 
 {
     CMPIStatus status;
     const CMPIObjectPath* path = ask(status, instance, &CMPIInstanceFT::getObjectPath);
-    Instance* result = nullptr;
-    if (make_cimple_instance(broker, meta_class, path, instance, result) != 0) return nullptr;
-    set_name_space_recursive(result, name_space, false);
-    return result;
+    Instance* made = nullptr;
+    if (make_cimple_instance(broker, meta_class, path, instance, made) != 0) return nullptr;
+    Ref<Instance> result(made);
+    set_name_space_recursive(made, name_space, false);
+    return result.release();
 }
 
 Made<CMPIObjectPath> path_of(const CMPIBroker* broker, const char* name_space, const Instance* instance)

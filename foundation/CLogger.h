@@ -11,10 +11,10 @@
 
 #include <atomic>
 #include <mutex>
-#include <string>
 #include <vector>
 
 #include "foundation/NVR_LoggerInterface.h"
+#include "runtime/String.h"
 #include "runtime/Type.h"
 
 namespace cimple {
@@ -91,7 +91,7 @@ private:
     CLogger();
     void dispatch(const char* file, uint32 line, sint32 level, const char* text);
     bool setTracePath(const char* path);
-    std::string tracePath() const;
+    String tracePath() const;
     bool writeSettings() const;
 
     std::atomic<uint32> m_mode{0};

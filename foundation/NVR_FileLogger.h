@@ -27,7 +27,8 @@ public:
     void clear() override;
 
     /// Opens `path` for appending and lets go of the file before. Result 0; -1 for a null path, one that cannot be
-    /// looked up or opened, or a file without its owner's write permission: the file before then stays in use.
+    /// looked up or opened, or a file without its owner's write permission: the file before then stays in use. Want of
+    /// memory is std::bad_alloc.
     int setPath(const char* path);
     String getPath() const;
 

@@ -74,8 +74,8 @@ void NvrConfigFile::load(const char* path)
         static_cast<void>(::stat(m_path.c_str(), &status));
         if (errno == ENOENT) return; // also a stale one: only errno is tested
     }
-    File file = open_file(m_path.c_str(), "r");
-    if (!file) {
+    Line_Reader file(m_path.c_str());
+    if (!file.is_open()) {
         NVR_LOG("Unable to open provider config setting file - %s", m_path.c_str());
         return;
     }
@@ -83,7 +83,7 @@ void NvrConfigFile::load(const char* path)
     bool seen_adapter_data = false;
     bool seen_san_data = false;
     char buffer[1024];
-    for (int lines = 0; lines < 1000 && std::fgets(buffer, sizeof buffer, file.get()); lines++) {
+    for (int lines = 0; lines < 1000 && file.read(buffer); lines++) {
         char* line = trim(buffer);
         char* equals = std::strchr(line, '=');
         if (*line == '#' || !equals) continue;

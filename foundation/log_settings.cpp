@@ -13,12 +13,12 @@ namespace cimple {
 
 const char* const log_settings_path = "/etc/norvane_fc_provider.dmp";
 
-std::string CLogger::tracePath() const
+String CLogger::tracePath() const
 {
     Hold hold;
     for (NVR_LoggerInterface* logger : m_loggers)
-        if (auto* file = dynamic_cast<NVR_FileLogger*>(logger)) return file->getPath().c_str();
-    return "";
+        if (auto* file = dynamic_cast<NVR_FileLogger*>(logger)) return file->getPath();
+    return {};
 }
 
 bool CLogger::setTracePath(const char* path)
@@ -33,7 +33,8 @@ bool CLogger::writeSettings() const
 {
     char line[40];
     std::snprintf(line, sizeof line, "%d,%d,%d\n", static_cast<int>(getMode()), getLevel(), isEnabled() ? 1 : 0);
-    return write_text(log_settings_path, line + tracePath());
+    const String path = tracePath();
+    return write_text(log_settings_path, line, {path.c_str(), path.size()});
 }
 
 void CLogger::saveSettings()
@@ -60,14 +61,14 @@ void CLogger::loadSettings()
     Undisturbed undisturbed;
     struct stat status;
     if (::stat(log_settings_path, &status) != 0) return;
-    File file = open_file(log_settings_path, "r");
-    if (!file) {
+    Line_Reader file(log_settings_path);
+    if (!file.is_open()) {
         NVR_LOG("Unable to open config data file - %s", log_settings_path);
         return;
     }
 
     char line[20];
-    if (!std::fgets(line, sizeof line, file.get())) return;
+    if (!file.read(line)) return;
     char* rest = nullptr;
     const char* token = ::strtok_r(line, ",", &rest);
     if (!token) {
@@ -103,11 +104,10 @@ void CLogger::loadSettings()
 
     char path[256] = "";
     if (mode == 2 || mode == 4) {
-        if (!std::fgets(path, sizeof path, file.get())) return;
+        if (!file.read(path)) return;
         if (char* end = std::strrchr(path, '\r')) *end = '\0';
         if (char* end = std::strrchr(path, '\n')) *end = '\0';
     }
-    file.reset();
     if (!setTracePath(path)) return; // always so for the other modes, whose empty path no file has
     setLevel(static_cast<sint32>(level));
     setMode(mode);

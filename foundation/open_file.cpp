@@ -78,17 +78,52 @@ File open_file(const char* path, const char* mode)
     return fd < 0 ? nullptr : stream_of(fd, mode);
 }
 
+Line_Reader::Line_Reader(const char* path) : m_fd(::open(path, O_RDONLY | always)) {}
+
+Line_Reader::~Line_Reader()
+{
+    if (m_fd >= 0) ::close(m_fd);
+}
+
+/// The next byte, or EOF.
+int Line_Reader::next()
+{
+    if (m_at == m_end) {
+        ssize_t size;
+        do
+            size = ::read(m_fd, m_bytes, sizeof m_bytes);
+        while (size < 0 && errno == EINTR);
+        if (size <= 0) return EOF;
+        m_at = 0;
+        m_end = static_cast<std::size_t>(size);
+    }
+    return static_cast<unsigned char>(m_bytes[m_at++]);
+}
+
+bool Line_Reader::read(char* line, std::size_t size)
+{
+    std::size_t length = 0;
+    while (length + 1 < size) {
+        const int byte = next();
+        if (byte == EOF) break;
+        line[length++] = static_cast<char>(byte);
+        if (byte == '\n') break;
+    }
+    line[length] = '\0';
+    return length > 0;
+}
+
 int fault_of_file(const char* path)
 {
     struct stat status;
     return ::stat(path, &status) == 0 && is_regular(status) ? 0 : errno;
 }
 
-bool write_text(const char* path, std::string_view text)
+bool write_text(const char* path, std::string_view text, std::string_view rest)
 {
     const int fd = ::open(path, O_WRONLY | O_CREAT | O_TRUNC | always, 0666);
     if (fd < 0) return false;
-    write_all(fd, text);
+    if (write_all(fd, text)) write_all(fd, rest);
     ::close(fd);
     return true;
 }

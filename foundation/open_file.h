@@ -1,6 +1,7 @@
 /// Opens files so that no caller is ever blocked, whatever stands at the path: a FIFO, a full pipe, a terminal.
 #pragma once
 
+#include <cstddef>
 #include <cstdio>
 #include <memory>
 #include <string_view>
@@ -16,9 +17,36 @@ using File = std::unique_ptr<std::FILE, Close_File>;
 /// that would wait fails. The file is closed in programs that the process starts.
 File open_file(const char* path, const char* mode);
 
-/// Empties the file or makes it, and writes the text; false if it cannot be opened, with errno set. What does not fit
-/// is lost. Takes no lock, also none of the C library's: to be called by a process that ends, too.
-bool write_text(const char* path, std::string_view text);
+/// Reads a file by lines and asks for no memory: settings that were not read would be lost when they are written back.
+class Line_Reader {
+public:
+    /// Opens the file as open_file does.
+    explicit Line_Reader(const char* path);
+    ~Line_Reader();
+    Line_Reader(const Line_Reader&) = delete;
+    Line_Reader& operator=(const Line_Reader&) = delete;
+
+    bool is_open() const { return m_fd >= 0; }
+    /// As fgets: a line with its end, or as much of it as there is room for; false at the end of the file.
+    template <std::size_t Size>
+    bool read(char (&line)[Size])
+    {
+        return read(line, Size);
+    }
+
+private:
+    bool read(char* line, std::size_t size);
+    int next();
+
+    const int m_fd;
+    char m_bytes[512];
+    std::size_t m_at = 0, m_end = 0;
+};
+
+/// Empties the file or makes it, and writes the text and what comes behind it; false if it cannot be opened, with errno
+/// set. What does not fit is lost. Asks for no memory and takes no lock, also none of the C library's: to be called by
+/// a process that ends, too.
+bool write_text(const char* path, std::string_view text, std::string_view rest = {});
 
 /// As open_file, for paths that clients name, which may lead anywhere: as fopen with mode "rb" or "wb", but for regular
 /// files alone (errno EINVAL for others). Writing empties a file that is there, also behind a link, and else makes it;

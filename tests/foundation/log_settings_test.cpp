@@ -11,6 +11,7 @@
 #include "foundation/NVR_FileLogger.h"
 #include "tests/support/log_capture.h"
 #include "tests/support/private_host.h"
+#include "tests/support/short_memory.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -55,6 +56,18 @@ TEST_F(LogSettings, WithoutAFileNothingChangesAndNothingIsLogged)
     EXPECT_EQ(errno, 4711);
     EXPECT_THAT(capture.words(), IsEmpty());
     expect(0, 0, false);
+}
+
+// What is not read at the start, or not written at the end, is lost.
+TEST_F(LogSettings, AreReadAndWrittenWithLittleMemory)
+{
+    write_file(settings, "2,5,1\n" + trace);
+    refuse_each_allocation([] { logger().loadSettings(); },
+                           [](bool has_thrown) { EXPECT_TRUE(has_thrown) << "it was given up in silence"; });
+    expect(2, 5, true);
+    remove(settings);
+    EXPECT_EQ(refuse_each_allocation([] { logger().saveSettings(); }, [](bool) {}), 0);
+    EXPECT_EQ(read_file(settings), "2,5,1\n" + trace);
 }
 
 TEST_F(LogSettings, OfModeTwoOpenTheTraceFile)

@@ -38,6 +38,36 @@ void expect_refused(const char* mode, int error)
 
 } // namespace
 
+TEST(LineReader, ReadsAsFgetsDoes)
+{
+    const std::string longest(1000, 'x');
+    write_file(path, "one\n\n" + longest + "\nlast");
+    Line_Reader file(path.c_str());
+    ASSERT_TRUE(file.is_open());
+    char line[600], small[5];
+    for (const std::string& expected :
+         {std::string("one\n"), std::string("\n"), longest.substr(0, 599), longest.substr(599) + '\n'}) {
+        ASSERT_TRUE(file.read(line));
+        EXPECT_EQ(line, expected);
+    }
+    ASSERT_TRUE(file.read(small));
+    EXPECT_STREQ(small, "last");
+    EXPECT_FALSE(file.read(small));
+    EXPECT_STREQ(small, "");
+}
+
+TEST(LineReader, OfWhatIsNotThereOrNoFile)
+{
+    EXPECT_FALSE(Line_Reader("/var/log/missing").is_open());
+    EXPECT_EQ(errno, ENOENT);
+    char line[20];
+    Line_Reader folder("/var/log");
+    EXPECT_FALSE(folder.read(line));
+    ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
+    Line_Reader fifo(path.c_str());
+    EXPECT_FALSE(fifo.read(line)) << "it waited for a writer";
+}
+
 TEST(OpenRegularFile, ReadsWritesAndMakesFiles)
 {
     expect_refused("rb", ENOENT);
