@@ -8,6 +8,7 @@
 /// For programs with a private host. One at a time; its server may be asked from many threads.
 #pragma once
 
+#include <functional>
 #include <ios>
 #include <memory>
 #include <string>
@@ -98,6 +99,10 @@ private:
     mutable Told m_told;
     std::unique_ptr<host::Host> m_server;
 };
+
+/// Where a refresh may fail to start, its words in the log have no end: then all rigs wait until this says that none
+/// runs.
+void wait_for_refreshes_by(std::function<bool()> no_refresh_runs);
 
 /// The schema of the module's classes, read once.
 std::shared_ptr<const host::Schema> module_schema();
