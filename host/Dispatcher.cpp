@@ -96,13 +96,17 @@ Answer Dispatcher::enumerate(const Request& request)
     if (targets.empty() && own.empty()) return nobody("instance", request.path);
     Answer answer = ask(request, targets, Mi::instance);
     if (request.operation == Operation::exec_query) return answer;
+    const bool names = request.operation == Operation::names;
+    const bool hands_on = request.sink && (names ? bool(request.sink->path) : bool(request.sink->instance));
+    if (hands_on) answer.handed_on += own.size();
     for (Instance& instance : own) {
-        if (request.operation == Operation::names) {
-            answer.paths.push_back(instance.path);
-            continue;
-        }
-        keep_properties(instance, request.properties, m_broker.schema());
-        answer.instances.push_back(std::move(instance));
+        if (!names) keep_properties(instance, request.properties, m_broker.schema());
+        if (hands_on)
+            names ? request.sink->path(std::move(instance.path)) : request.sink->instance(std::move(instance));
+        else if (names)
+            answer.paths.push_back(std::move(instance.path));
+        else
+            answer.instances.push_back(std::move(instance));
     }
     return answer;
 }
@@ -194,6 +198,7 @@ Answer Dispatcher::ask(const Request& request, const std::vector<Target>& target
         if (whole.ok()) whole.status = answer.status;
         std::move(answer.instances.begin(), answer.instances.end(), std::back_inserter(whole.instances));
         std::move(answer.paths.begin(), answer.paths.end(), std::back_inserter(whole.paths));
+        whole.handed_on += answer.handed_on;
     }
     return whole;
 }
@@ -215,9 +220,10 @@ void Dispatcher::ask_one(const Request& request, const Target& target, Mi kind, 
     // An error that the provider returned as an object says more than its status.
     if (answer.ok() || status.ok()) answer.status = answer.ok() ? status : answer.status;
     std::chrono::duration<double, std::milli> time = std::chrono::steady_clock::now() - start;
-    m_broker.log().line("%s %s: %s, %zu instances, %zu paths, %.3f ms", operation_name(request.operation),
+    const std::string handed_on = request.sink ? ", " + std::to_string(answer.handed_on) + " handed on" : "";
+    m_broker.log().line("%s %s: %s, %zu instances, %zu paths%s, %.3f ms", operation_name(request.operation),
                         target.class_name.c_str(), status_name(answer.status.code).c_str(), answer.instances.size(),
-                        answer.paths.size(), time.count());
+                        answer.paths.size(), handed_on.c_str(), time.count());
 }
 
 } // namespace host

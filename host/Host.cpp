@@ -60,17 +60,18 @@ Path class_path(const std::string& name_space, const std::string& class_name)
     return path;
 }
 
-Request with(Property_List properties)
+Request with(Property_List properties, const Result_Sink* sink = nullptr)
 {
     Request request;
+    request.sink = sink;
     request.properties = std::move(properties);
     return request;
 }
 
 Request along(const std::string& association_class, const std::string& result_class, const std::string& role,
-              const std::string& result_role, Property_List properties = {})
+              const std::string& result_role, Property_List properties = {}, const Result_Sink* sink = nullptr)
 {
-    Request request = with(std::move(properties));
+    Request request = with(std::move(properties), sink);
     request.association_class = association_class;
     request.result_class = result_class;
     request.role = role;
@@ -118,14 +119,15 @@ std::vector<Registration> Host::registrations() const
     return m_parts->modules.registrations();
 }
 
-Answer Host::enumerate(const std::string& name_space, const std::string& class_name, Property_List properties)
+Answer Host::enumerate(const std::string& name_space, const std::string& class_name, Property_List properties,
+                       const Result_Sink* sink)
 {
-    return m_parts->run(Operation::enumerate, class_path(name_space, class_name), with(std::move(properties)));
+    return m_parts->run(Operation::enumerate, class_path(name_space, class_name), with(std::move(properties), sink));
 }
 
-Answer Host::names(const std::string& name_space, const std::string& class_name)
+Answer Host::names(const std::string& name_space, const std::string& class_name, const Result_Sink* sink)
 {
-    return m_parts->run(Operation::names, class_path(name_space, class_name));
+    return m_parts->run(Operation::names, class_path(name_space, class_name), with({}, sink));
 }
 
 Answer Host::get(const Path& path, Property_List properties)
@@ -185,10 +187,11 @@ Answer Host::call(const Path& path, const std::string& method, const std::vector
 }
 
 Answer Host::associators(const Path& path, const std::string& association_class, const std::string& result_class,
-                         const std::string& role, const std::string& result_role, Property_List properties)
+                         const std::string& role, const std::string& result_role, Property_List properties,
+                         const Result_Sink* sink)
 {
     return m_parts->run(Operation::associators, path,
-                        along(association_class, result_class, role, result_role, std::move(properties)));
+                        along(association_class, result_class, role, result_role, std::move(properties), sink));
 }
 
 Answer Host::associator_names(const Path& path, const std::string& association_class, const std::string& result_class,

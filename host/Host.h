@@ -60,8 +60,17 @@ struct Answer {
     std::vector<Path> paths;
     Value value;                  ///< a method's return value, a property
     std::vector<Named_Value> out; ///< a method's out parameters
+    std::size_t handed_on = 0;    ///< instances or paths that went to a sink instead
 
     bool ok() const { return status.ok(); }
+};
+
+/// Takes an answer result by result, while the provider is still returning the others: what a server does that sends it
+/// on in portions instead of keeping all of it. Called inside the provider's call and on its thread, by several at once
+/// where the manner asks subclasses in parallel; must not throw, nor call back into the host.
+struct Result_Sink {
+    std::function<void(Instance&&)> instance; ///< empty: instances stay in the answer
+    std::function<void(Path&&)> path;         ///< empty: paths stay in the answer
 };
 
 /// Kinds of provider a class can be registered with.
@@ -141,8 +150,10 @@ public:
 
     // --- Requests of a client --------------------------------------------------------------------------------------
 
-    Answer enumerate(const std::string& name_space, const std::string& class_name, Property_List properties = {});
-    Answer names(const std::string& name_space, const std::string& class_name);
+    /// A `sink` outlives the request; null: all results stay in the answer.
+    Answer enumerate(const std::string& name_space, const std::string& class_name, Property_List properties = {},
+                     const Result_Sink* sink = nullptr);
+    Answer names(const std::string& name_space, const std::string& class_name, const Result_Sink* sink = nullptr);
     Answer get(const Path& path, Property_List properties = {});
     /// `paths` has the new instance's path.
     Answer create(const Instance& instance);
@@ -157,7 +168,8 @@ public:
     Answer call(const Path& path, const std::string& method, const std::vector<Named_Value>& in = {});
     Answer associators(const Path& path, const std::string& association_class = "",
                        const std::string& result_class = "", const std::string& role = "",
-                       const std::string& result_role = "", Property_List properties = {});
+                       const std::string& result_role = "", Property_List properties = {},
+                       const Result_Sink* sink = nullptr);
     Answer associator_names(const Path& path, const std::string& association_class = "",
                             const std::string& result_class = "", const std::string& role = "",
                             const std::string& result_role = "");

@@ -152,7 +152,7 @@ private:
 
     CMPIResult* result(Takes takes, const std::string& class_name)
     {
-        return &m_broker.make<Result_Object>(Origin::lent, m_answer, takes, class_name)->face;
+        return &m_broker.make<Result_Object>(Origin::lent, m_answer, m_request.sink, takes, class_name)->face;
     }
 
     const CMPIInstance* instance()

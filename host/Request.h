@@ -37,7 +37,8 @@ struct Request {
     std::string query, language;
     std::string association_class, result_class, role, result_role;
     std::string principal;
-    bool up_call = false; ///< from a module, which may be in the middle of its own clean-up
+    const Result_Sink* sink = nullptr; ///< null: results stay in the answer
+    bool up_call = false;              ///< from a module, which may be in the middle of its own clean-up
 };
 
 /// "enumerateInstances" and so on, as the function tables have it.

@@ -65,16 +65,17 @@ CMPIResultFT Result_Object::table(const Manner& manner)
     return ft;
 }
 
-Result_Object::Result_Object(Broker& owner, Origin from, Answer& answer, Takes takes, std::string class_name)
+Result_Object::Result_Object(Broker& owner, Origin from, Answer& answer, const Result_Sink* sink, Takes takes,
+                             std::string class_name)
     : Object(owner, object_kind, from), face{static_cast<Object*>(this), &owner.tables().result}, m_answer(answer),
-      m_takes(takes), m_class(std::move(class_name))
+      m_sink(sink), m_takes(takes), m_class(std::move(class_name))
 {
 }
 
 std::string Result_Object::to_text() const
 {
     return std::to_string(m_answer.instances.size()) + " instances, " + std::to_string(m_answer.paths.size()) +
-           " paths";
+           " paths" + (m_sink ? ", " + std::to_string(m_answer.handed_on) + " handed on" : "");
 }
 
 bool Result_Object::open(const char* call, Takes takes)
@@ -107,8 +108,14 @@ CMPIStatus Result_Object::take(const CMPIInstance* instance)
         return status_of(CMPI_RC_ERR_INVALID_PARAMETER);
     }
     if (!open("returnInstance", Takes::instances)) return status_of(CMPI_RC_ERR_INVALID_PARAMETER);
-    m_answer.instances.push_back(given->filtered());
-    check_path("returnInstance", m_answer.instances.back().path);
+    Instance taken = given->filtered();
+    check_path("returnInstance", taken.path);
+    if (m_sink && m_sink->instance) {
+        m_answer.handed_on++;
+        m_sink->instance(std::move(taken));
+    } else {
+        m_answer.instances.push_back(std::move(taken));
+    }
     return status_of(CMPI_RC_OK);
 }
 
@@ -120,8 +127,13 @@ CMPIStatus Result_Object::take(const CMPIObjectPath* path)
         return status_of(CMPI_RC_ERR_INVALID_PARAMETER);
     }
     if (!open("returnObjectPath", Takes::paths)) return status_of(CMPI_RC_ERR_INVALID_PARAMETER);
-    m_answer.paths.push_back(given->data);
     check_path("returnObjectPath", given->data);
+    if (m_sink && m_sink->path) {
+        m_answer.handed_on++;
+        m_sink->path(Path(given->data));
+    } else {
+        m_answer.paths.push_back(given->data);
+    }
     return status_of(CMPI_RC_OK);
 }
 

@@ -10,6 +10,7 @@ namespace host {
 
 struct Manner;
 struct Answer;
+struct Result_Sink;
 
 class Result_Object final : public Object {
 public:
@@ -19,8 +20,10 @@ public:
     /// What the operation lets a provider return.
     enum class Takes { instances, paths, data, nothing };
 
-    /// Results go to `answer`, which outlives the object. `class_name`: results have to be of it ("" for any).
-    Result_Object(Broker& owner, Origin from, Answer& answer, Takes takes, std::string class_name);
+    /// Results go to `answer`, or to `sink` if there is one; both outlive the object. `class_name`: results have to be
+    /// of it ("" for any).
+    Result_Object(Broker& owner, Origin from, Answer& answer, const Result_Sink* sink, Takes takes,
+                  std::string class_name);
     std::string to_text() const override;
 
     CMPIStatus take(const CMPIInstance* instance);
@@ -36,6 +39,7 @@ private:
     void check_path(const char* call, const Path& path);
 
     Answer& m_answer;
+    const Result_Sink* const m_sink;
     const Takes m_takes;
     const std::string m_class;
     bool m_done = false;

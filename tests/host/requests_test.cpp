@@ -66,6 +66,39 @@ TEST_P(Requests, ASuperclassBringsTheInstancesOfItsSubclasses)
     EXPECT_EQ(4u, server->names(things::space, "CIM_Root").paths.size());
 }
 
+TEST_P(Requests, ASinkGetsEachResultInTheProvidersOrderAndTheAnswerKeepsNone)
+{
+    things::set("count", 3);
+    Instance own;
+    own.path = things::thing(7);
+    server->add_instance(own);
+    std::vector<Path> paths;
+    std::vector<std::string> texts;
+    Result_Sink sink;
+    sink.instance = [&](Instance&& instance) {
+        paths.push_back(instance.path);
+        texts.push_back(instance.get("Text").as_text());
+    };
+    Answer answer = server->enumerate(things::space, "TEST_Thing", {}, &sink);
+    ASSERT_TRUE(answer.ok()) << answer.status.message;
+    EXPECT_TRUE(answer.instances.empty());
+    EXPECT_EQ(4u, answer.handed_on);
+    const auto all = ElementsAre(things::thing(1), things::thing(2), things::thing(3), things::thing(7));
+    EXPECT_THAT(paths, all);
+    EXPECT_THAT(texts, ElementsAre("some text", "some text", "some text", ""));
+    answer = server->names(things::space, "TEST_Thing", &sink);
+    EXPECT_THAT(answer.paths, all) << "a sink takes what it has a function for";
+    EXPECT_EQ(0u, answer.handed_on);
+
+    paths.clear();
+    sink.path = [&](Path&& path) { paths.push_back(std::move(path)); };
+    answer = server->names(things::space, "TEST_Thing", &sink);
+    EXPECT_TRUE(answer.paths.empty());
+    EXPECT_EQ(4u, answer.handed_on);
+    EXPECT_THAT(paths, all);
+    server->clear_instances();
+}
+
 TEST_P(Requests, GetFindsOneByItsKeys)
 {
     things::set("count", 5);
