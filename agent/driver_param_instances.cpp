@@ -20,7 +20,6 @@ namespace cimple {
 namespace {
 
 constexpr uint32 status_no_memory = 8;
-constexpr uint32 status_failed = 1;
 constexpr uint32 most_records = 16 * 1024 * 1024 / sizeof(RM_DRIVERPARAM);
 
 /// What both classes of parameters show of a record.
@@ -113,8 +112,8 @@ uint32 nvrcimGetDriverParam(ProviderAgent& agent, const std::string& wwpn, bool 
 {
     NVR_LOG("NVR_MethodWrapper::nvrcimGetDriverParam()");
     HBA_WWN wwn = {};
-    if (string2HBAName(&wwn, wwpn.c_str()) == 0) return status_failed;
-    if (!isLocal(wwn)) return status_failed;
+    if (string2HBAName(&wwn, wwpn.c_str()) == 0) return RM_STATUS_ERROR;
+    if (!isLocal(wwn)) return RM_STATUS_ERROR;
     std::vector<RM_DRIVERPARAM> records;
     if (const uint32 status = readDriverParams(wwn, global, records)) return status;
     if (global) NVR_LOG("number of driver parameters %d", static_cast<int>(records.size()));
@@ -135,7 +134,7 @@ uint32 nvrcimGetDriverParam(ProviderAgent& agent, const std::string& wwpn, bool 
             }
         }
     } catch (const Update_Ended&) {
-        return status_failed; // of this list alone: the update goes on
+        return RM_STATUS_ERROR; // of this list alone: the update goes on
     }
     return RM_STATUS_OK;
 }

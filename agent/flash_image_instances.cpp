@@ -16,7 +16,6 @@ namespace cimple {
 
 namespace {
 
-constexpr uint32 status_failed = 1;
 constexpr uint16 class_firmware = 10;
 
 /// The record behind the last image ends the list and is counted with them.
@@ -51,7 +50,7 @@ uint32 createFlashImages(ProviderAgent& agent, const char* wwpn, const FCAdapter
                          const Instance* controller)
 {
     HBA_WWN wwn = {};
-    if (!library_name(wwn, wwpn, "Id2HBAName failed", "str2HBAName failed")) return status_failed;
+    if (!library_name(wwn, wwpn, "Id2HBAName failed", "str2HBAName failed")) return RM_STATUS_ERROR;
     RM_FLASHCONTENTS contents = {};
     if (const uint32 status = RM_DiagGetLoadListParams(wwn, &contents)) {
         NVR_LOG("Failed to retrieve the flash contents. Exited with ErrorCode %d", static_cast<int>(status));
@@ -65,7 +64,7 @@ uint32 createFlashImages(ProviderAgent& agent, const char* wwpn, const FCAdapter
             insertOrLog(agent.m_NVRHBA_FlashImageSoftwareIdentity_map, Ref<Instance>(made.release()),
                         "Insert Failed : m_NVRHBA_FlashImageSoftwareIdentity_map ");
         if (!image || !associate(agent, Link::ElementFlashImageSoftwareIdentity, image, controller))
-            return status_failed;
+            return RM_STATUS_ERROR;
     }
     NVR_LOG("Success...");
     return 0;

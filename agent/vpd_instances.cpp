@@ -6,12 +6,11 @@
 #include "agent/vpd.h"
 #include "classes/NVRHBA_VitalProductData.h"
 #include "foundation/CLogger.h"
+#include "foundation/management_binding.h"
 
 namespace cimple {
 
 namespace {
-
-constexpr uint32 status_failed = 1;
 
 struct Vpd_Row {
     const char* tag;
@@ -45,7 +44,7 @@ uint32 CreateVPD(ProviderAgent& agent, const char* wwpn, Instance*& made)
     NVR_LOG("Inside CreateVPD");
     made = nullptr;
     HBA_WWN wwn = {};
-    if (!library_name(wwn, wwpn, "Id2HBAName failed", "str2HBAName failed")) return status_failed;
+    if (!library_name(wwn, wwpn, "Id2HBAName failed", "str2HBAName failed")) return RM_STATUS_ERROR;
     std::vector<Vpd_Entry> entries;
     if (const uint32 status = readVPD(wwn, entries)) {
         NVR_LOG("ERROR: RM_GetVPD call failed : %d", static_cast<int>(status));
@@ -69,7 +68,7 @@ uint32 CreateVPD(ProviderAgent& agent, const char* wwpn, Instance*& made)
         set(vpd->VPDTagValues, values);
     }
     made = insertOrLog(agent.m_NVRHBA_VitalProductData_map, Ref<Instance>(vpd.release()));
-    return made ? 0 : status_failed;
+    return made ? 0 : RM_STATUS_ERROR;
 }
 
 } // namespace cimple

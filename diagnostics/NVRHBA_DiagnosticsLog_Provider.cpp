@@ -8,14 +8,13 @@
 #include "classes/NVRHBA_DiagnosticServiceRecord.h"
 #include "classes/NVRHBA_LogManagesRecord.h"
 #include "classes/NVRHBA_RecordAppliesToElement.h"
+#include "diagnostics/diagnostic_answer.h"
 #include "diagnostics/diagnostic_tests.h"
 #include "foundation/CLogger.h"
 
 namespace cimple {
 
 namespace {
-
-enum Answer : uint32 { ANSWER_OK = 0, ANSWER_FAILED = 4, ANSWER_INVALID = 5 };
 
 /// Builds the map anew without the elements of which `belongs` is true; the others keep their order. False, after
 /// `failure` was logged, for a map that cannot be built: it stays as it stands.

@@ -11,14 +11,13 @@
 #include "classes/NVRHBA_PortController.h"
 #include "diagnostics/NVR_DiagTestFunc.h"
 #include "diagnostics/NVR_Diagnostics.h"
+#include "diagnostics/diagnostic_answer.h"
 #include "diagnostics/diagnostic_tests.h"
 #include "foundation/CLogger.h"
 
 namespace cimple {
 
 namespace {
-
-enum Answer : uint32 { ANSWER_OK = 0, ANSWER_UNKNOWN_TEST = 1, ANSWER_INVALID = 5, ANSWER_STATUS = 40000 };
 
 constexpr std::size_t wwpn_size = 16;
 

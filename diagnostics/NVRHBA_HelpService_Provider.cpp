@@ -3,13 +3,12 @@
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
 #include "agent/instance_table.h"
+#include "diagnostics/diagnostic_answer.h"
 #include "foundation/CLogger.h"
 
 namespace cimple {
 
 namespace {
-
-enum Answer : uint32 { ANSWER_OK = 0, ANSWER_FAILED = 4, ANSWER_INVALID = 5 };
 
 constexpr uint16 as_string = 1; // the one format and the one delivery
 

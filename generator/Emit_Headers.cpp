@@ -5,7 +5,7 @@
 namespace generator {
 namespace {
 
-constexpr const char* notice = "// Made by the generator from the MOF files: change those.\n";
+constexpr const char* header_notice = "// Made by the generator from the MOF files: change those.\n";
 
 /// The class's features but its methods: what its instances hold.
 std::vector<const mof::Feature*> members_of(const mof::Class& target)
@@ -67,7 +67,7 @@ std::string emit_class_header(const Catalogue&, const mof::Class& target)
     std::string text = "/// " + target.name;
     if (target.super) text += ", a " + target.super->name;
     text += ".\n";
-    text += notice;
+    text += header_notice;
     text += "#pragma once\n\n#include \"runtime/Instance.h\"\n";
     for (const auto& header : headers)
         text += "#include \"classes/" + header + ".h\"\n";
@@ -96,7 +96,7 @@ std::string emit_methods_header(const mof::Class& target)
     std::string text = "/// Answers \"not supported\" to each method that " + target.name + " inherits.\n";
     text += "///\n/// A provider derives from it and declares what it serves; a method that the class itself declares "
             "is not here.\n";
-    text += notice;
+    text += header_notice;
     text += "#pragma once\n\n#include \"runtime/Registration.h\"\n\nnamespace cimple {\n\n";
     text += "struct " + target.name + "_Methods {\n";
     bool first = true;
@@ -113,7 +113,7 @@ std::string emit_methods_header(const mof::Class& target)
 std::string emit_repository_header(const Catalogue&)
 {
     std::string text = "/// The class records of the module, all of them, in one list.\n";
-    text += notice;
+    text += header_notice;
     text += "#pragma once\n\n#include \"runtime/Meta_Class.h\"\n\nnamespace cimple {\n\n"
             "extern const Meta_Repository the_repository;\n\n} // namespace cimple\n";
     return text;

@@ -9,7 +9,7 @@ namespace {
 
 constexpr std::size_t line_width = 100;
 
-std::string quoted(const std::string& text)
+std::string mof_text(const std::string& text)
 {
     std::string result = "\"";
     for (const char c : text) {
@@ -38,10 +38,10 @@ std::string wrapped(const std::string& text, std::size_t indent)
             const std::size_t blank = text.rfind(' ', start + length);
             if (blank != std::string::npos && blank > start) length = blank + 1 - start;
         }
-        result += margin + quoted(text.substr(start, length));
+        result += margin + mof_text(text.substr(start, length));
         start += length;
     }
-    return result.empty() ? quoted("") : result;
+    return result.empty() ? mof_text("") : result;
 }
 
 std::string literal_text(const mof::Literal& literal, std::size_t indent)
@@ -57,7 +57,7 @@ std::string literal_text(const mof::Literal& literal, std::size_t indent)
     case mof::Literal::Kind::real:
         return std::to_string(literal.real);
     case mof::Literal::Kind::string:
-        return literal.text.size() + indent + 4 < line_width ? quoted(literal.text) : wrapped(literal.text, indent);
+        return literal.text.size() + indent + 4 < line_width ? mof_text(literal.text) : wrapped(literal.text, indent);
     }
     return "NULL";
 }

@@ -6,7 +6,7 @@ namespace generator {
 namespace {
 
 /// A string as a C++ literal. Octal escapes end after three digits, whatever follows.
-std::string quoted(const std::string& text)
+std::string literal_of(const std::string& text)
 {
     std::string result = "\"";
     for (const char c : text) {
@@ -41,7 +41,7 @@ std::string constant(const mof::Literal& literal, mof::Type type)
         return literal.boolean ? "true" : "false";
     case mof::Type::string:
     case mof::Type::datetime:
-        return quoted(literal.text);
+        return literal_of(literal.text);
     case mof::Type::real32:
     case mof::Type::real64:
         std::snprintf(text, sizeof text, "static_cast<%s>(%.17g)", mof::type_name(type), literal.real);
@@ -67,7 +67,7 @@ std::string hexadecimal(std::uint32_t flags)
 /// The head that every record begins with.
 std::string head(std::uint32_t flags, const std::string& name)
 {
-    return "{{0}, " + hexadecimal(flags) + ", " + quoted(name) + ", nullptr, 0}";
+    return "{{0}, " + hexadecimal(flags) + ", " + literal_of(name) + ", nullptr, 0}";
 }
 
 std::string target_record(const std::string& target)

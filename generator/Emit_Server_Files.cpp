@@ -8,7 +8,7 @@
 namespace generator {
 namespace {
 
-constexpr const char* notice = "// Made by the generator from the class catalogue.\n\n";
+constexpr const char* registration_notice = "// Made by the generator from the class catalogue.\n\n";
 /// The module's file is lib<location>.so.
 constexpr const char* location = "norvane_fc_provider";
 constexpr const char* vendor = "Norvane";
@@ -40,7 +40,7 @@ std::vector<std::string> name_spaces_of(const mof::Class& target)
 void add_classes(const std::vector<const mof::Class*>& order, const std::string& others_file,
                  const std::string& own_file, std::vector<Text_File>& files, std::string& list)
 {
-    std::string others = notice, own = notice;
+    std::string others = registration_notice, own = registration_notice;
     std::set<std::string> in_own;
     for (const mof::Class* target : order) {
         if (is_own(*target)) in_own.insert(target->name);
@@ -94,7 +94,7 @@ std::string emit_pegasus(const Catalogue& catalogue, const std::string& version)
 {
     const std::string module = "\"" + std::string(location) + "\"";
     std::string text =
-        notice +
+        registration_notice +
         ("instance of PG_ProviderModule {\n    Name = " + module + ";\n    Vendor = \"" + vendor +
          "\";\n    Version = \"" + version +
          "\";\n    InterfaceType = \"CMPI\";\n    InterfaceVersion = \"2.0.0\";\n    Location = " + module + ";\n};\n");
@@ -124,7 +124,7 @@ std::vector<Text_File> emit_server_files(const Catalogue& catalogue, const std::
     std::vector<Text_File> files;
     std::string list;
 
-    std::string qualifiers = notice;
+    std::string qualifiers = registration_notice;
     for (const mof::Qualifier_Declaration& qualifier : catalogue.mof.qualifiers())
         qualifiers += emit_mof(qualifier);
     files.push_back({"mof/00_qualifiers.mof", qualifiers});

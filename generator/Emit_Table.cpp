@@ -6,7 +6,7 @@
 namespace generator {
 namespace {
 
-constexpr const char* notice = "// Made by the generator from the MOF files and providers.txt: change those.\n";
+constexpr const char* table_notice = "// Made by the generator from the MOF files and providers.txt: change those.\n";
 constexpr const char* module_name = "norvane_fc_provider_Module";
 constexpr const char* proc_parameters = "(const Registration*, int code, void* arg0, void* arg1, void* arg2, void* "
                                         "arg3, void* arg4, void* arg5, void* arg6, "
@@ -109,7 +109,7 @@ std::string emit_providers(const Catalogue& catalogue, std::size_t first, std::s
             if (has_inherited_methods(*provider.target)) headers.insert(stem + "_Methods.h");
         }
     }
-    std::string text = notice;
+    std::string text = table_notice;
     for (const auto& header : headers)
         text += "#include \"" + header + "\"\n";
     text += "\nnamespace cimple {\n\n";
@@ -125,7 +125,7 @@ std::string emit_providers(const Catalogue& catalogue, std::size_t first, std::s
 
 std::string emit_registrations(const Catalogue& catalogue)
 {
-    std::string text = notice;
+    std::string text = table_notice;
     text += "#include \"classes/module_table.h\"\n\n";
     for (const auto& provider : catalogue.providers)
         text += "#include \"classes/" + provider.target->name + ".h\"\n";

@@ -38,7 +38,7 @@ Value object_of(const Face* face, CMPIType type, int& code, Make make)
     return Value::null_of(type);
 }
 
-Value text_of(const char* text)
+Value string_of(const char* text)
 {
     return text ? Value::string(text) : Value::null_of(CMPI_string);
 }
@@ -48,7 +48,7 @@ Value text_of(const char* text)
 Value value_of(const CMPIValue* value, CMPIType type, int& code)
 {
     if (type == CMPI_null) return {};
-    if (type == CMPI_chars) return text_of(reinterpret_cast<const char*>(value));
+    if (type == CMPI_chars) return string_of(reinterpret_cast<const char*>(value));
     if (!value) return Value::null_of(type == CMPI_charsptr ? static_cast<CMPIType>(CMPI_string) : type);
     if (type & CMPI_ARRAY) return array_of(*value, type, code);
     switch (type) {
@@ -77,7 +77,7 @@ Value value_of(const CMPIValue* value, CMPIType type, int& code)
     case CMPI_real64:
         return Value::real(type, value->real64);
     case CMPI_charsptr:
-        return text_of(value->chars);
+        return string_of(value->chars);
     case CMPI_string:
         return object_of<String_Object>(value->string, type, code, [](String_Object& s) {
             return s.text ? Value::string(*s.text) : Value::null_of(CMPI_string);

@@ -12,8 +12,6 @@ namespace cimple {
 
 namespace {
 
-constexpr uint32 status_failed = 1;
-
 // The library opens the file by itself, and would wait for the other end of a FIFO.
 bool fileIsThere(const char* path)
 {
@@ -66,9 +64,9 @@ uint32 writeImage(const HBA_WWN& port, const char* path)
 uint32 NVR_MethodWrapper::nvrcimDownloadFW(const HBA_WWN& port, const char* path)
 {
     NVR_LOG("entering the nvrcimDownloadFW function");
-    if (!isLocal(port)) return status_failed;
+    if (!isLocal(port)) return RM_STATUS_ERROR;
     NVR_LOG("\n firmware file name \"%s\"\n", path);
-    if (!fileIsThere(path)) return status_failed;
+    if (!fileIsThere(path)) return RM_STATUS_ERROR;
     uint32 status = importImage(path);
     if (status == RM_STATUS_OK) status = verifyImage(port, path);
     if (status == RM_STATUS_OK) status = writeImage(port, path);
@@ -80,7 +78,7 @@ uint32 NVR_MethodWrapper::SetPortEnabled(const char* deviceID, boolean enabled)
 {
     NVR_LOG("Inside SetPortEnabled %s %d", deviceID, enabled);
     HBA_WWN port;
-    if (!library_name(port, deviceID, "Id2HBAName failed", "str2HBAName failed")) return status_failed;
+    if (!library_name(port, deviceID, "Id2HBAName failed", "str2HBAName failed")) return RM_STATUS_ERROR;
     NVR_LOG("Invoking RM_SetPortEnabled API ");
     uint8 activation = 0;
     const uint32 status = RM_SetPortEnabled(port, enabled, &activation);

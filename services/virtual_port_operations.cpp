@@ -14,7 +14,6 @@ namespace cimple {
 
 namespace {
 
-constexpr int status_failed = 1;
 constexpr int status_null = 4;
 
 void logVPortFailure(uint32 status)
@@ -44,7 +43,7 @@ RM_VMINFO machineInfo(const RM_VMNAME& name)
 int NVR_MethodWrapper::ListVPorts(const HBA_WWN& port, VPort_List* list)
 {
     NVR_LOG("NVR_MethodWrapper::ListVPorts");
-    if (!isLocal(port)) return status_failed;
+    if (!isLocal(port)) return RM_STATUS_ERROR;
     if (!list) {
         NVR_LOG("Invalid input pointer");
         return status_null;
@@ -52,11 +51,11 @@ int NVR_MethodWrapper::ListVPorts(const HBA_WWN& port, VPort_List* list)
     Counted_List<RM_VPORTLIST> found;
     if (!found.fill([&](void* room) { return RM_VPList(port, room); })) {
         NVR_LOG("FMCMD_ListVPorts: Unable to allocate buffer");
-        return status_failed;
+        return RM_STATUS_ERROR;
     }
     if (found.status != RM_STATUS_OK) {
         logVPortFailure(found.status);
-        return status_failed;
+        return RM_STATUS_ERROR;
     }
     list->count = found.count();
     list->entries = found.entries();
@@ -67,7 +66,7 @@ int NVR_MethodWrapper::ListVPorts(const HBA_WWN& port, VPort_List* list)
 int NVR_MethodWrapper::ListVPortAttributes(const HBA_WWN& port, const HBA_WWN& vport, RM_VPORTATTRIBUTES* attributes)
 {
     NVR_LOG("NVR_MethodWrapper::ListVPortAttributes");
-    if (!isLocal(port)) return status_failed;
+    if (!isLocal(port)) return RM_STATUS_ERROR;
     if (!attributes) {
         NVR_LOG("Invalid input vp attributes pointer");
         return status_null;
@@ -76,7 +75,7 @@ int NVR_MethodWrapper::ListVPortAttributes(const HBA_WWN& port, const HBA_WWN& v
     found.version = RM_VPORT_VERSION;
     if (const uint32 status = RM_VPGetAttributes(port, vport, &found)) {
         logVPortFailure(status);
-        return status_failed;
+        return RM_STATUS_ERROR;
     }
     NVR_LOG("VPort details");
     NVR_LOG("VPort Name %s ", fieldText(found.name).c_str());
@@ -87,11 +86,11 @@ int NVR_MethodWrapper::ListVPortAttributes(const HBA_WWN& port, const HBA_WWN& v
 
 int NVR_MethodWrapper::ListVPortTargets(const HBA_WWN& port, const HBA_WWN& vport)
 {
-    if (!isLocal(port) || !isLocal(vport)) return status_failed;
+    if (!isLocal(port) || !isLocal(vport)) return RM_STATUS_ERROR;
     Counted_List<RM_TARGETLIST> found;
     if (!found.fill([&](void* room) { return RM_VPListTargets(port, vport, room); })) {
         NVR_LOG("FMCMD_VportTargets: Unable to allocate buffer");
-        return status_failed;
+        return RM_STATUS_ERROR;
     }
     if (found.status == RM_STATUS_OK) {
         NVR_LOG("Exit the ListVPortTargets method");
@@ -101,14 +100,14 @@ int NVR_MethodWrapper::ListVPortTargets(const HBA_WWN& port, const HBA_WWN& vpor
         NVR_LOG("FMCMD does not support listing virtual port targets on this host.");
     else
         NVR_LOG("Unable to list virtual port's targets!");
-    return status_failed;
+    return RM_STATUS_ERROR;
 }
 
 int NVR_MethodWrapper::ListVMfromVPort(const HBA_WWN& port, const RM_VPORTENTRY& vport,
                                        std::vector<RM_VMINFO>* machines)
 {
     NVR_LOG("NVR_MethodWrapper::ListVMfromVPort %s", wwnText(vport.wwpn).c_str());
-    if (!isLocal(port)) return status_failed;
+    if (!isLocal(port)) return RM_STATUS_ERROR;
     if (!machines) {
         NVR_LOG("Invalid input pointer");
         return status_null;
@@ -135,10 +134,10 @@ int NVR_MethodWrapper::ListVMfromVPort(const HBA_WWN& port, const RM_VPORTENTRY&
             NVR_LOG("FMCMD_ListVMS: Unable to allocate buffer\n");
         else
             NVR_LOG("FMCMD_ListVMS: Unable to allocate buffer.");
-        return status_failed;
+        return RM_STATUS_ERROR;
     }
     NVR_LOG("FMCMD_ListVMS: Status: %d", static_cast<int>(found.status));
-    if (found.status != RM_STATUS_OK) return status_failed;
+    if (found.status != RM_STATUS_OK) return RM_STATUS_ERROR;
     for (uint32 i = 0; i < found.size(); i++)
         machines->push_back(machineInfo(found[i]));
     NVR_LOG("Exit the ListVMs method");

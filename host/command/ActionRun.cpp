@@ -2,6 +2,7 @@
 #include "host/command/Actions.h"
 #include "host/command/Arguments.h"
 #include "host/command/Dialogue.h"
+#include "host/command/Keys.h"
 #include "host/command/Listing.h"
 #include "host/command/Meanings.h"
 #include "host/command/Options.h"
@@ -12,7 +13,6 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
-#include <cctype>
 #include <iostream>
 
 namespace host {
@@ -20,22 +20,7 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-constexpr char port_class[] = "NVRHBA_FCPort";
-
-/// The digits of a name, without separators, as the module writes them.
-std::string plain_name(const std::string& text)
-{
-    std::string digits;
-    for (char c : text)
-        if (c != ':' && c != '-') digits += static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    return digits;
-}
-
-std::string key_text(const Path& path, const char* key)
-{
-    const Value* value = path.find(key);
-    return value ? value->as_text() : "";
-}
+constexpr char target_class[] = "NVRHBA_FCPort";
 
 class Runner {
 public:
@@ -92,7 +77,7 @@ private:
 /// The port that the user named, or the only one. 0, or the exit status.
 int Runner::find_port()
 {
-    const Answer names = m_server.names(m_options.name_space, port_class);
+    const Answer names = m_server.names(m_options.name_space, target_class);
     if (!names.ok()) return failed(names.status);
     std::string known;
     const Path* found = nullptr;
@@ -114,7 +99,7 @@ int Runner::find_port()
 /// The service's instance, or the port itself. 0, or the exit status.
 int Runner::find_target()
 {
-    const std::string& name = m_action.service.empty() ? port_class : m_action.service;
+    const std::string& name = m_action.service.empty() ? target_class : m_action.service;
     const Class_Record* record = m_server.schema().find(name);
     if (!record) return failed({CMPI_RC_ERR_INVALID_CLASS, "there is no class " + name, Fault::request});
     if (m_action.service.empty()) {

@@ -2,6 +2,7 @@
 
 #include "host/command/Actions.h"
 #include "host/command/Dialogue.h"
+#include "host/command/Keys.h"
 #include "host/command/Listing.h"
 #include "host/command/Meanings.h"
 #include "host/command/Options.h"
@@ -12,7 +13,6 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
-#include <cctype>
 
 namespace host {
 namespace {
@@ -32,20 +32,6 @@ const Meanings meanings = {
     {5, "the test, its settings or its target are not possible"},
     {40001, "there is no loopback plug, or the target or the port is none, or the library refused"},
 };
-
-std::string key_text(const Path& path, const char* key)
-{
-    const Value* value = path.find(key);
-    return value ? value->as_text() : "";
-}
-
-std::string upper_digits(const std::string& text)
-{
-    std::string digits;
-    for (char c : text)
-        if (c != ':' && c != '-') digits += static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-    return digits;
-}
 
 /// "external-loopback" for "NVR:FCHBA External Loopback Test".
 std::string short_name(const std::string& name)
@@ -170,8 +156,7 @@ int Diagnostics::find_port(Path& found)
     for (const Path& path : names.paths) {
         const std::string name = key_text(path, "DeviceID");
         known += (known.empty() ? "" : ", ") + name;
-        if (m_options.port.empty() ? names.paths.size() > 1 : upper_digits(m_options.port) != upper_digits(name))
-            continue;
+        if (m_options.port.empty() ? names.paths.size() > 1 : plain_name(m_options.port) != plain_name(name)) continue;
         found = path;
         return 0;
     }
@@ -205,7 +190,7 @@ int Diagnostics::read_settings(const std::string& test, Value& settings)
             }
             instance.set("BufferPattern", Value::array(CMPI_uint8, bytes));
         } else if (label == "--target") {
-            const std::string digits = upper_digits(text);
+            const std::string digits = plain_name(text);
             const auto is_digit = [](unsigned char c) { return std::isxdigit(c) != 0; };
             if (digits.size() != 16 || !std::all_of(digits.begin(), digits.end(), is_digit))
                 return wrong("--target is a World Wide Name of sixteen hexadecimal digits, which " + text + " is not");

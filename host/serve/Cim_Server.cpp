@@ -7,11 +7,11 @@
 #include <iterator>
 
 namespace host {
+
+using namespace cim_status;
+
 namespace {
 
-// Status codes of DSP0200.
-constexpr int failed = 1, invalid_name_space = 3, invalid_parameter = 4, invalid_class = 5, not_found = 6,
-              not_supported = 7, no_such_property = 12, method_not_found = 17;
 constexpr int last_status = 17;
 constexpr std::size_t piece_size = 16 * 1024;
 

@@ -6,9 +6,11 @@
 #include <algorithm>
 
 namespace host {
+
+using namespace cim_status;
+
 namespace {
 
-constexpr int invalid_parameter = 4;
 constexpr std::size_t most_listed = 4096; ///< properties that a client asks for
 
 [[noreturn]] void refuse(const char* cim_error, const std::string& text)

@@ -23,6 +23,13 @@ struct Http_Fault {
     std::string text;
 };
 
+/// Status codes of DSP0200.
+namespace cim_status {
+constexpr int failed = 1, invalid_name_space = 3, invalid_parameter = 4, invalid_class = 5, not_found = 6,
+              not_supported = 7, already_exists = 11, no_such_property = 12, unknown_language = 14,
+              method_not_found = 17;
+}
+
 /// A request that gets an ERROR element.
 struct Cim_Fault {
     int code = 1;

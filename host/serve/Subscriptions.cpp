@@ -8,10 +8,11 @@
 #include <sstream>
 
 namespace host {
+
+using namespace cim_status;
+
 namespace {
 
-constexpr int failed = 1, invalid_parameter = 4, invalid_class = 5, not_found = 6, already_exists = 11,
-              unknown_language = 14;
 constexpr std::size_t most_waiting = 10000, most_kept = 1000, most_name_spaces = 16;
 constexpr long delivery_seconds = 10;
 

@@ -13,7 +13,7 @@ constexpr std::size_t most_keys = 64, most_undeclared = 1024;
 
 [[noreturn]] void refuse(const std::string& text)
 {
-    throw Cim_Fault{4, text};
+    throw Cim_Fault{cim_status::invalid_parameter, text};
 }
 
 CMPIType type_named(const std::string& name)

@@ -12,6 +12,7 @@
 
 #include "foundation/CLogger.h"
 #include "foundation/NVR_CIMLogger.h"
+#include "tests/support/log_capture.h"
 #include "tests/support/private_host.h"
 #include "tests/support/short_memory.h"
 #include "tests/support/trace.h"
@@ -26,11 +27,6 @@ namespace {
 
 // Files of the test's own live where the private host's do.
 const std::string path = "/var/log/trace";
-
-CLogger& logger()
-{
-    return *CLogger::instance();
-}
 
 struct TraceFile : testing::Test {
     NVR_FileLogger file;

@@ -23,11 +23,6 @@ namespace {
 const std::string settings = "/etc/norvane_fc_provider.dmp";
 const std::string trace = "/var/log/trace";
 
-CLogger& logger()
-{
-    return *CLogger::instance();
-}
-
 struct LogSettings : testing::Test {
     // The words of a load, and what it made of mode, level and flag.
     std::vector<std::string> load(const std::string& content)

@@ -19,11 +19,6 @@ using testing::IsEmpty;
 
 namespace {
 
-CLogger& logger()
-{
-    return *CLogger::instance();
-}
-
 void log(sint32 level, const char* text)
 {
     logger().log("here.cpp", 7, level, "%s", text);

@@ -15,13 +15,13 @@ using namespace nvrtest;
 
 namespace {
 
-const std::string path = "/var/log/file";
+const std::string opened = "/var/log/file";
 const std::string other = "/var/log/other";
 
-/// Writes "new" to the file at the path; false, with errno, if it cannot be opened.
+/// Writes "new" to the file at `opened`; false, with errno, if it cannot be opened.
 bool rewrite()
 {
-    File file = open_regular_file(path.c_str(), "wb");
+    File file = open_regular_file(opened.c_str(), "wb");
     if (!file) return false;
     EXPECT_EQ(std::fputs("new", file.get()), 1);
     return true;
@@ -29,10 +29,10 @@ bool rewrite()
 
 void expect_refused(const char* mode, int error)
 {
-    EXPECT_FALSE(open_regular_file(path.c_str(), mode)) << mode;
+    EXPECT_FALSE(open_regular_file(opened.c_str(), mode)) << mode;
     EXPECT_EQ(errno, error) << mode;
     if (*mode == 'r') {
-        EXPECT_EQ(fault_of_file(path.c_str()), error);
+        EXPECT_EQ(fault_of_file(opened.c_str()), error);
     }
 }
 
@@ -72,14 +72,14 @@ TEST(OpenRegularFile, ReadsWritesAndMakesFiles)
 {
     expect_refused("rb", ENOENT);
     ASSERT_TRUE(rewrite());
-    EXPECT_EQ(read_file(path), "new");
+    EXPECT_EQ(read_file(opened), "new");
     char text[8] = {};
-    EXPECT_EQ(std::fread(text, 1, sizeof text, open_regular_file(path.c_str(), "rb").get()), 3u);
+    EXPECT_EQ(std::fread(text, 1, sizeof text, open_regular_file(opened.c_str(), "rb").get()), 3u);
     EXPECT_STREQ(text, "new");
-    EXPECT_EQ(fault_of_file(path.c_str()), 0);
-    write_file(path, "something longer");
+    EXPECT_EQ(fault_of_file(opened.c_str()), 0);
+    write_file(opened, "something longer");
     ASSERT_TRUE(rewrite());
-    EXPECT_EQ(read_file(path), "new");
+    EXPECT_EQ(read_file(opened), "new");
 }
 
 TEST(OpenRegularFile, MakesFilesAsTheUmaskSays)
@@ -88,21 +88,21 @@ TEST(OpenRegularFile, MakesFilesAsTheUmaskSays)
     ASSERT_TRUE(rewrite());
     ::umask(before);
     struct stat status;
-    ASSERT_EQ(::stat(path.c_str(), &status), 0);
+    ASSERT_EQ(::stat(opened.c_str(), &status), 0);
     EXPECT_EQ(status.st_mode & 07777, 0640u);
 }
 
 TEST(OpenRegularFile, FollowsALinkToAFile)
 {
     write_file(other, "old");
-    link(other, path);
+    link(other, opened);
     ASSERT_TRUE(rewrite());
     EXPECT_EQ(read_file(other), "new");
 }
 
 TEST(OpenRegularFile, MakesNothingBehindALinkThatLeadsNowhere)
 {
-    link(other, path);
+    link(other, opened);
     expect_refused("wb", EEXIST);
     expect_refused("rb", ENOENT);
     EXPECT_FALSE(exists(other));
@@ -110,17 +110,17 @@ TEST(OpenRegularFile, MakesNothingBehindALinkThatLeadsNowhere)
 
 TEST(OpenRegularFile, RefusesFolders)
 {
-    make_folder(path);
+    make_folder(opened);
     expect_refused("wb", EINVAL);
     expect_refused("rb", EINVAL);
 }
 
 TEST(OpenRegularFile, RefusesFifosWithoutWaitingForTheirOtherEnd)
 {
-    ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
+    ASSERT_EQ(::mkfifo(opened.c_str(), 0600), 0);
     expect_refused("wb", EINVAL);
     expect_refused("rb", EINVAL);
-    const int end = ::open(path.c_str(), O_RDWR | O_NONBLOCK);
+    const int end = ::open(opened.c_str(), O_RDWR | O_NONBLOCK);
     ASSERT_GE(end, 0);
     expect_refused("wb", EINVAL);
     expect_refused("rb", EINVAL);
@@ -129,7 +129,7 @@ TEST(OpenRegularFile, RefusesFifosWithoutWaitingForTheirOtherEnd)
 
 TEST(OpenRegularFile, RefusesDevices)
 {
-    link("/dev/null", path);
+    link("/dev/null", opened);
     expect_refused("wb", EINVAL);
     expect_refused("rb", EINVAL);
 }
@@ -149,8 +149,8 @@ TEST(OpenRegularFile, TellsWhyAPathIsNone)
 TEST(WriteRegularFile, WritesItsBytesAndNothingElse)
 {
     for (const std::string& bytes : {std::string("a\0b", 3), std::string(), std::string(100000, 'x')}) {
-        ASSERT_TRUE(write_regular_file(path.c_str(), bytes));
-        EXPECT_EQ(read_file(path), bytes);
+        ASSERT_TRUE(write_regular_file(opened.c_str(), bytes));
+        EXPECT_EQ(read_file(opened), bytes);
     }
     make_folder(other);
     EXPECT_FALSE(write_regular_file(other.c_str(), "new"));
@@ -167,10 +167,10 @@ TEST(WriteRegularFile, LeavesNoPartOnAFullDisk)
     EXPECT_FALSE(exists("/var/log/disk/file"));
     // A link stays, and what it leads to is no part either.
     write_file("/var/log/disk/file", "old");
-    link("/var/log/disk/file", path);
-    EXPECT_FALSE(write_regular_file(path.c_str(), more));
-    EXPECT_TRUE(exists(path));
+    link("/var/log/disk/file", opened);
+    EXPECT_FALSE(write_regular_file(opened.c_str(), more));
+    EXPECT_TRUE(exists(opened));
     EXPECT_EQ(read_file("/var/log/disk/file"), "");
-    EXPECT_TRUE(write_regular_file(path.c_str(), "new"));
+    EXPECT_TRUE(write_regular_file(opened.c_str(), "new"));
     EXPECT_EQ(read_file("/var/log/disk/file"), "new");
 }

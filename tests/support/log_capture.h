@@ -11,6 +11,11 @@
 
 namespace nvrtest {
 
+inline cimple::CLogger& logger()
+{
+    return *cimple::CLogger::instance();
+}
+
 /// This thread is within a capture: what that allocates is nobody's who logs.
 inline thread_local bool keeps_log = false;
 

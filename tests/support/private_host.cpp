@@ -24,11 +24,6 @@ namespace {
     throw std::runtime_error(what + ": " + std::strerror(errno));
 }
 
-void bind_over(const std::string& source, const std::string& path)
-{
-    if (::mount(source.c_str(), path.c_str(), nullptr, MS_BIND, nullptr) != 0) fail("bind " + source + " over " + path);
-}
-
 std::string cover_path()
 {
     static int number = 0;

@@ -13,6 +13,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "tests/support/private_host.h"
+
 namespace nvrtest {
 
 namespace {
@@ -67,16 +69,6 @@ std::string choose_root(const std::string& program)
     throw std::runtime_error("no folder to mount the private host on");
 }
 
-void bind_over(const std::string& source, const std::string& path)
-{
-    check(::mount(source.c_str(), path.c_str(), nullptr, MS_BIND | MS_REC, nullptr) == 0, "bind over " + path);
-}
-
-void make_folder(const std::string& path)
-{
-    check(::mkdir(path.c_str(), 0755) == 0, "mkdir " + path);
-}
-
 // The machine's /etc as links, without the module's own files.
 void make_private_etc(const std::string& root)
 {
@@ -103,6 +95,11 @@ void make_private_folder(const std::string& root, const std::string& name, const
 }
 
 } // namespace
+
+void bind_over(const std::string& source, const std::string& path)
+{
+    check(::mount(source.c_str(), path.c_str(), nullptr, MS_BIND | MS_REC, nullptr) == 0, "bind over " + path);
+}
 
 void enter_private_host(char** argv)
 {

@@ -13,6 +13,9 @@ void enter_private_host(char** argv);
 /// folders empty, under the same names. Before the first thread of the process.
 void separate_private_host();
 
+/// Shows `source`, with what is mounted in it, at `path` also. Throws std::runtime_error.
+void bind_over(const std::string& source, const std::string& path);
+
 /// The folder that carries the host's own parts. Throws outside of one.
 std::string private_root();
 
