@@ -14,6 +14,9 @@
 #include <pthread.h>
 #include <stdexcept>
 #include <string_view>
+#include <sys/mman.h>
+#include <sys/syscall.h>
+#include <unistd.h>
 #include <unordered_map>
 #include <unwind.h>
 
@@ -398,6 +401,17 @@ NVR_FOR_ALL void* realloc(void* old, std::size_t size)
         nvrtest::goes_out(block, *asks);
     }
     return block;
+}
+
+// The module's blocks are refused, each of them: the pieces that it would cut from them then come from the heap, where
+// they are told apart.
+NVR_FOR_ALL void* mmap(void* place, std::size_t size, int protection, int flags, int file, off_t from) noexcept
+{
+    if (nvrtest::module.holds(NVR_CALLER)) {
+        errno = ENOMEM;
+        return MAP_FAILED;
+    }
+    return reinterpret_cast<void*>(::syscall(SYS_mmap, place, size, protection, flags, file, from));
 }
 
 NVR_FOR_ALL void* memalign(std::size_t alignment, std::size_t size)

@@ -8,7 +8,7 @@
 /// The program that links this defines malloc and its kin for all that it loads. Its own calls, the simulator's and the
 /// loader's pass; what the C and the C++ library ask for in a call of the module's (operator new, strdup, fopen) counts
 /// as the module's. A place is told by the call stack inside the module: the same stack has the same number in each
-/// process. Any thread.
+/// process. Blocks that the module would map for the pieces of a rebuild are never there. Any thread.
 #pragma once
 
 #include <cstddef>
