@@ -167,10 +167,7 @@ void Key_Index::remove(std::size_t position)
 
 void Key_Index::clear()
 {
-    m_shape.clear();
-    m_keys.clear();
-    m_strangers = 0;
-    std::fill(m_slots.begin(), m_slots.end(), Slot());
+    *this = Key_Index();
 }
 
 int Key_Index::find(const Instance* key, const Array<Instance*>& list) const

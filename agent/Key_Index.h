@@ -2,8 +2,8 @@
 ///
 /// key_eq is not symmetric across classes, so the index answers only where it can be exact: for a key and elements of
 /// one shape (the same classes, or classes with the very same keys, in the instance and in all that its key references
-/// reach). A list that holds an
-/// instance of another shape, or is asked for one, is scanned. No locks: the owner of the list sees to that.
+/// reach). A list that holds an instance of another shape, or is asked for one, is scanned. No locks: the owner of the
+/// list sees to that.
 #pragma once
 
 #include <cstddef>
@@ -26,7 +26,7 @@ public:
     void append(const Entry& entry, const Array<Instance*>& list);
     /// Notes that the element at `position` has left the list.
     void remove(std::size_t position);
-    /// Forgets all elements and their shape, and keeps its memory for as many again.
+    /// Forgets all elements and their shape.
     void clear();
 
     /// The position of the first element of `list` whose keys agree with `key`'s, or -1.
@@ -49,8 +49,8 @@ private:
     std::vector<const Meta_Feature*> m_keys;
     /// A lookup reads one place of memory, and an element only where its hash agrees.
     struct Slot {
-        uint32 hash;
-        uint32 position; // behind it by one; 0: free
+        uint32 hash = 0;
+        uint32 position = 0; // behind it by one; 0: free
     };
     static void place(std::vector<Slot>& slots, const Slot& slot);
     std::size_t m_strangers = 0;
