@@ -471,7 +471,8 @@ class WithIll(unittest.TestCase):
 
     def assert_refused(self, data):
         """No answer, or one that says whose fault it is."""
-        self.assertRegex(self.raw(data)[:12] or b"HTTP/1.1 400", rb"^HTTP/1\.[01] [45]\d\d$", data[:300])
+        line = self.raw(data)[:12] or b"HTTP/1.1 400"
+        self.assertRegex(line, rb"^HTTP/1\.[01] (4\d\d|501|505)$", data[:300])
 
     def body(self, inner):
         return ('<?xml version="1.0"?><CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE ID="1" PROTOCOLVERSION="1.0">'
@@ -489,8 +490,10 @@ class WithIll(unittest.TestCase):
             self.assert_refused(self.HEAD + b"Content-Length: " + length + b"\r\n\r\n" + body)
         chunked = self.HEAD + b"Transfer-Encoding: chunked\r\n"
         for chunks in (b"", b"zz\r\n", b"-1\r\n", b"5\r\nab", b"ffffffffffffffffff\r\nx", b"5\r\nabcdefg\r\n0\r\n\r\n",
-                       b"0\r\n\r\n", b"5;" + b"x" * 100000):
+                       b"0\r\n\r\n"):
             self.assert_refused(chunked + b"\r\n" + chunks)
+        # A line without an end fills what libmicrohttpd has for a connection, which it takes for a fault of its own.
+        self.assertIn(self.raw(chunked + b"\r\n5;" + b"x" * 100000)[9:12], (b"", b"400", b"413", b"431", b"500"))
 
     def test_heads_that_are_none(self):
         for head in (b"", b"\r\n" * 1000, b"\0" * 1000, b"GET", b"POST /cimom", b"POST\r\n\r\n",
