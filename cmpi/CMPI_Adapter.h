@@ -1,9 +1,9 @@
 /// What stands behind the CMPI calls of one provider: its MI tables, its provider object, its lock, its life.
 ///
-/// An MI_Table_Set is the static record of a provider, made before any code of ours runs: it finds the adapter for calls that come
-/// through `hdl`. The adapter lives from the first factory call to the last clean-up, and on until no call runs in it
-/// and no thread context made from it is left. Any thread; `lock` makes one request after the other, `mutex` of the set
-/// guards what factories and clean-ups share.
+/// An MI_Table_Set is the static record of a provider, made before any code of ours runs: it finds the adapter for
+/// calls that come through `hdl`. The adapter lives from the first factory call to the last clean-up, and on until no
+/// call runs in it and no thread context made from it is left. Any thread; `lock` makes one request after the other,
+/// `mutex` of the set guards what factories and clean-ups share.
 #pragma once
 
 #include <cmpift.h>

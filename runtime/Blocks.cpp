@@ -23,8 +23,7 @@ constexpr std::size_t being_cut = SIZE_MAX / 2;
 
 thread_local Blocks* in_use = nullptr;
 
-// --- What the sanitizers know of a block
-// ----------------------------------------------------------------------------------
+// What the sanitizers know of a block.
 
 #if defined(__SANITIZE_ADDRESS__)
 void tell_mapped(void* block)
