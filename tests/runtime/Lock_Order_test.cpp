@@ -201,7 +201,8 @@ TEST_F(LockOrderDeathTest, ForgetsWhatIsTakenWhereNobodyElseCanReachIt)
             const Unreachable_Locks dying;
             hold(locks.b, locks.c);
         }
-        hold(locks.c, locks.a);
+        Locks others; // of the same names; the thread sanitizer goes by objects, and is to see no circle of them
+        hold(others.c, others.a);
     });
 }
 
