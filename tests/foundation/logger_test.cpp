@@ -13,6 +13,7 @@
 
 using namespace cimple;
 using nvrtest::Log_Capture;
+using nvrtest::logger;
 using nvrtest::syslog_spy;
 using testing::ElementsAre;
 using testing::IsEmpty;

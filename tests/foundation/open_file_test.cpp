@@ -41,8 +41,8 @@ void expect_refused(const char* mode, int error)
 TEST(LineReader, ReadsAsFgetsDoes)
 {
     const std::string longest(1000, 'x');
-    write_file(path, "one\n\n" + longest + "\nlast");
-    Line_Reader file(path.c_str());
+    write_file(opened, "one\n\n" + longest + "\nlast");
+    Line_Reader file(opened.c_str());
     ASSERT_TRUE(file.is_open());
     char line[600], small[5];
     for (const std::string& expected :
@@ -63,8 +63,8 @@ TEST(LineReader, OfWhatIsNotThereOrNoFile)
     char line[20];
     Line_Reader folder("/var/log");
     EXPECT_FALSE(folder.read(line));
-    ASSERT_EQ(::mkfifo(path.c_str(), 0600), 0);
-    Line_Reader fifo(path.c_str());
+    ASSERT_EQ(::mkfifo(opened.c_str(), 0600), 0);
+    Line_Reader fifo(opened.c_str());
     EXPECT_FALSE(fifo.read(line)) << "it waited for a writer";
 }
 
