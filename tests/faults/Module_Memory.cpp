@@ -7,18 +7,18 @@
 #include <cstddef>
 #include <cstring>
 #include <dlfcn.h>
-#include <link.h>
 #include <malloc.h>
 #include <mutex>
 #include <new>
 #include <pthread.h>
 #include <stdexcept>
-#include <string_view>
 #include <sys/mman.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 #include <unordered_map>
 #include <unwind.h>
+
+#include "tests/support/code_range.h"
 
 // The C library's own, under the names that it keeps for this.
 extern "C" {
@@ -33,35 +33,7 @@ namespace nvrtest {
 
 namespace {
 
-/// Where the code of a shared object lies; nowhere before it is found.
-struct Code {
-    std::atomic<std::uintptr_t> base{0}, first{0}, end{0};
-
-    bool holds(std::uintptr_t place) const { return place >= first && place < end; }
-    bool find(std::string_view name)
-    {
-        struct Search {
-            std::string_view name;
-            Code& code;
-        } search{name, *this};
-        return dl_iterate_phdr(
-                   [](dl_phdr_info* object, std::size_t, void* data) {
-                       auto& [wanted, code] = *static_cast<Search*>(data);
-                       if (std::string_view(object->dlpi_name).find(wanted) == std::string_view::npos) return 0;
-                       for (int i = 0; i < object->dlpi_phnum; i++) {
-                           const auto& segment = object->dlpi_phdr[i];
-                           if (segment.p_type != PT_LOAD || !(segment.p_flags & PF_X)) continue;
-                           code.base = object->dlpi_addr;
-                           code.end = object->dlpi_addr + segment.p_vaddr + segment.p_memsz;
-                           code.first = object->dlpi_addr + segment.p_vaddr;
-                       }
-                       return 1;
-                   },
-                   &search) == 1;
-    }
-};
-
-Code module, c_library, cxx_library;
+Code_Range module, c_library, cxx_library;
 char module_name[256]; // its file's, while it is being loaded
 std::atomic<bool> is_starting{false};
 
@@ -110,7 +82,7 @@ bool tells_enough(std::uintptr_t frame)
 /// The module's frames above a call of malloc; none if another one asks.
 Stack stack_of(std::uintptr_t caller)
 {
-    if (module.holds(caller) && tells_enough(caller - module.base)) return {{caller - module.base}, 1};
+    if (module.holds(caller) && tells_enough(module.offset(caller))) return {{module.offset(caller)}, 1};
     struct Walk {
         std::uintptr_t caller;
         Stack stack;
@@ -125,7 +97,7 @@ Stack stack_of(std::uintptr_t caller)
             if (++steps > 64) return _URC_END_OF_STACK;
             if (!is_at_caller) return _URC_NO_REASON;
             if (module.holds(place))
-                stack.frames[stack.size++] = place - module.base;
+                stack.frames[stack.size++] = module.offset(place);
             else if (!is_library(place))
                 return _URC_END_OF_STACK;
             const bool ends = stack.size == depth || (stack.size == 1 && tells_enough(stack.frames[0]));
@@ -210,7 +182,7 @@ void goes_out(void* block, Site& site)
 /// The place that asked for it, or null.
 Site* comes_back(void* block)
 {
-    if (!block || is_busy || module.first == 0) return nullptr;
+    if (!block || is_busy || !module.is_found()) return nullptr;
     const Busy busy;
     Shard& shard = shard_of(block);
     std::lock_guard<std::mutex> lock(shard.mutex);
@@ -227,7 +199,7 @@ Site* comes_back(void* block)
 Site* asked_by(std::uintptr_t caller)
 {
     if (is_busy) return nullptr;
-    if (module.first == 0) {
+    if (!module.is_found()) {
         if (!is_starting) return nullptr;
         const Busy busy;
         if (!module.find(module_name)) return nullptr;
@@ -266,7 +238,7 @@ void watch_memory_of(const std::string& file, std::size_t frames)
     is_starting = true;
     if (!dlopen(file.c_str(), RTLD_NOW)) throw std::runtime_error(dlerror());
     is_starting = false;
-    if (module.first == 0 && !module.find(name)) throw std::runtime_error("no code of " + name);
+    if (!module.is_found() && !module.find(name)) throw std::runtime_error("no code of " + name);
 }
 
 std::vector<Allocation_Site> allocation_sites()

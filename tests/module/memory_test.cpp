@@ -7,10 +7,8 @@
 #include <cstdlib>
 #include <filesystem>
 #include <iterator>
-#include <link.h>
 #include <new>
 #include <string>
-#include <string_view>
 #include <thread>
 #include <unwind.h>
 
@@ -18,38 +16,12 @@
 
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Rig.h"
+#include "tests/support/code_range.h"
 #include "tests/support/simulator.h"
 
 namespace {
 
-/// Where the code of a shared object lies; nowhere before it is loaded.
-struct Code {
-    std::atomic<std::uintptr_t> first{0}, end{0};
-
-    bool holds(std::uintptr_t place) const { return place >= first && place < end; }
-    void find(std::string_view name)
-    {
-        struct Search {
-            std::string_view name;
-            Code& code;
-        } search{name, *this};
-        dl_iterate_phdr(
-            [](dl_phdr_info* object, std::size_t, void* data) {
-                auto& [wanted, code] = *static_cast<Search*>(data);
-                if (std::string_view(object->dlpi_name).find(wanted) == std::string_view::npos) return 0;
-                for (int i = 0; i < object->dlpi_phnum; i++) {
-                    const auto& segment = object->dlpi_phdr[i];
-                    if (segment.p_type != PT_LOAD || !(segment.p_flags & PF_X)) continue;
-                    code.end = object->dlpi_addr + segment.p_vaddr + segment.p_memsz;
-                    code.first = object->dlpi_addr + segment.p_vaddr;
-                }
-                return 1;
-            },
-            &search);
-    }
-};
-
-Code module, library;
+nvrtest::Code_Range module, library;
 std::atomic<std::size_t> module_bytes{0}, module_blocks{0};
 
 /// Walks out of the standard library: true if the module called it.
@@ -77,7 +49,7 @@ void* allocate(std::size_t size, std::uintptr_t caller)
 {
     auto* block = static_cast<char*>(std::malloc(size + head));
     if (!block) throw std::bad_alloc();
-    const bool is_module = module.holds(caller) || (library.holds(caller) && module.first != 0 && called_by_module());
+    const bool is_module = module.holds(caller) || (library.holds(caller) && module.is_found() && called_by_module());
     *reinterpret_cast<std::size_t*>(block) = is_module ? size + head : 0;
     if (is_module) {
         module_bytes += size + head;
@@ -176,8 +148,7 @@ TEST_P(Memory, ARefreshLeavesTheSameInstancesAndNotAByteMore)
     Rig rig({host::Manner::strict(), GetParam() ? large_host() : "typical", refreshing_settings});
     library.find("libstdc++.so");
     ASSERT_THAT(rig.names("NVRHBA_FCPort"), succeeded());
-    module.find("libnorvane_fc_provider.so");
-    ASSERT_NE(module.first, 0u);
+    ASSERT_TRUE(module.find("libnorvane_fc_provider.so"));
     // From here on all is counted; what an earlier refresh holds goes with the next one.
     rig.refresh();
     rig.refresh();
@@ -202,8 +173,7 @@ TEST(MemoryOfDiagnostics, ARebuildTakesAllThatRunsLeft)
     Rig rig({host::Manner::strict(), "typical", refreshing_settings});
     library.find("libstdc++.so");
     ASSERT_THAT(rig.names("NVRHBA_FCPort"), succeeded());
-    module.find("libnorvane_fc_provider.so");
-    ASSERT_NE(module.first, 0u);
+    ASSERT_TRUE(module.find("libnorvane_fc_provider.so"));
     const auto with_id = [](const char* class_name, const host::Value& id) {
         host::Instance instance;
         instance.path.name_space = "root/norvane";
