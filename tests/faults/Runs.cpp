@@ -7,14 +7,16 @@
 #include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
+#include <iterator>
+#include <map>
 #include <new>
 #include <poll.h>
 #include <stdexcept>
-#include <sys/file.h>
 #include <sys/mman.h>
 #include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
+#include <utility>
 
 #include "tests/support/private_host_setup.h"
 
@@ -26,6 +28,8 @@ constexpr char complaint = 'c', message = 't';
 constexpr std::size_t longest_output = 6000;
 // Up to a run's first step: a busy machine makes hosts slowly.
 constexpr std::chrono::milliseconds longest_start = std::chrono::minutes(1);
+// Between two looks at how long a run stands, in milliseconds.
+constexpr int longest_wait = 100;
 
 void check(bool done, const char* what)
 {
@@ -103,6 +107,8 @@ void Run_Watch::send(char kind, const std::string& text)
 
 // The parent's side of a run.
 class One_Run {
+    using Clock = std::chrono::steady_clock;
+
 public:
     One_Run(const Run& run, bool prints) : m_run(run)
     {
@@ -119,45 +125,49 @@ public:
             live(ends[1], prints);
         }
         ::close(ends[1]);
+        ::fcntl(m_channel, F_SETFL, O_NONBLOCK);
     }
     ~One_Run()
     {
+        if (m_process > 0) {
+            ::kill(m_process, SIGKILL);
+            ::waitpid(m_process, nullptr, 0);
+        }
         ::close(m_channel);
         ::close(m_output);
     }
     One_Run(const One_Run&) = delete;
     One_Run& operator=(const One_Run&) = delete;
 
-    Run_Result wait()
+    /// What is to be read when it tells something, and when it ends.
+    pollfd channel() const { return {m_channel, POLLIN, 0}; }
+    /// Takes what it has told; ends it where it stands.
+    bool has_ended()
     {
-        using Clock = std::chrono::steady_clock;
-        std::string received, why;
-        auto seen_at = Clock::now();
-        unsigned seen = 0;
-        for (bool is_open = true; is_open;) {
-            pollfd channel = {m_channel, POLLIN, 0};
-            if (::poll(&channel, 1, 100) > 0) {
-                char bytes[65536];
-                const ssize_t got = ::read(m_channel, bytes, sizeof bytes);
-                is_open = got > 0;
-                if (got > 0) received.append(bytes, static_cast<std::size_t>(got));
-            }
-            if (const unsigned steps = m_shared->steps; steps != seen) {
-                seen = steps;
-                seen_at = Clock::now();
-            }
-            if (Clock::now() - seen_at > (seen == 0 ? longest_start : m_run.patience)) {
-                why = std::string("it stands at: ") + m_shared->newest + '\n';
-                ::kill(m_process, SIGKILL);
-                break;
-            }
+        char bytes[65536];
+        ssize_t got;
+        while ((got = ::read(m_channel, bytes, sizeof bytes)) > 0)
+            m_received.append(bytes, static_cast<std::size_t>(got));
+        if (got == 0) return true;
+        const auto now = Clock::now();
+        if (const unsigned steps = m_shared->steps; steps != m_seen) {
+            m_seen = steps;
+            m_seen_at = now;
         }
+        if (now - m_seen_at <= (m_seen == 0 ? longest_start : m_run.patience)) return false;
+        m_why = std::string("it stands at: ") + m_shared->newest + '\n';
+        ::kill(m_process, SIGKILL);
+        return true;
+    }
+    /// Once it has.
+    Run_Result result()
+    {
         int status = 0;
-        check(::waitpid(m_process, &status, 0) == m_process, "the end of a process");
+        check(::waitpid(std::exchange(m_process, -1), &status, 0) > 0, "the end of a process");
+        if (m_why.empty() && (m_why = how_it_ended(status)) != "")
+            m_why += std::string("at: ") + m_shared->newest + '\n';
         Run_Result result;
-        const std::string complaints = take_apart(received, result.told);
-        if (why.empty() && (why = how_it_ended(status)) != "") why += std::string("at: ") + m_shared->newest + '\n';
-        result.failure = complaints + why;
+        result.failure = take_apart(m_received, result.told) + m_why;
         if (!result.failure.empty()) result.failure += end_of(m_output);
         return result;
     }
@@ -172,6 +182,7 @@ private:
         Run_Watch watch(m_shared.get(), channel);
         try {
             separate_private_host();
+            ::setenv("TMPDIR", "/var/log", 1); // what a killed run left there goes with its host
             m_run.work(watch);
         } catch (const std::exception& error) {
             watch.complain(std::string("it threw: ") + error.what());
@@ -195,52 +206,39 @@ private:
     Shared_Memory<Run_Watch::Shared> m_shared;
     int m_channel = -1, m_output = -1;
     pid_t m_process = -1;
+    std::string m_received, m_why;
+    unsigned m_seen = 0; // of its steps
+    Clock::time_point m_seen_at = Clock::now();
 };
 
 Run_Result do_run(const Run& run, bool prints)
 {
-    return One_Run(run, prints).wait();
+    One_Run one(run, prints);
+    while (!one.has_ended()) {
+        pollfd channel = one.channel();
+        ::poll(&channel, 1, longest_wait);
+    }
+    return one.result();
 }
 
 void do_runs(const std::vector<Run>& runs, unsigned at_once,
              const std::function<void(std::size_t index, const Run_Result&)>& done)
 {
-    Shared_Memory<std::atomic<std::size_t>> next;
-    const int turn = ::memfd_create("turn", MFD_CLOEXEC);
-    check(turn >= 0, "a file in memory");
-    const std::string turn_path = "/proc/self/fd/" + std::to_string(turn);
-    std::fflush(nullptr);
-    std::vector<pid_t> workers;
-    for (unsigned i = 0; i < at_once; i++) {
-        const pid_t worker = ::fork();
-        check(worker >= 0, "a process");
-        workers.push_back(worker);
-        if (worker != 0) continue;
-        ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-        try {
-            const int own_turn = ::open(turn_path.c_str(), O_RDWR | O_CLOEXEC);
-            check(own_turn >= 0, "the turn");
-            for (std::size_t index; (index = (*next.get())++) < runs.size();) {
-                const Run_Result result = do_run(runs[index]);
-                ::flock(own_turn, LOCK_EX);
-                done(index, result);
-                std::fflush(nullptr);
-                ::flock(own_turn, LOCK_UN);
-            }
-        } catch (const std::exception& error) {
-            std::fprintf(stderr, "the runs end here: %s\n", error.what());
-            std::fflush(nullptr);
-            ::_exit(1);
+    std::map<std::size_t, One_Run> under_way; // by index
+    for (std::size_t next = 0; next < runs.size() || !under_way.empty();) {
+        for (; next < runs.size() && under_way.size() < at_once; next++)
+            under_way.try_emplace(next, runs[next], false);
+        std::vector<pollfd> channels;
+        for (const auto& [index, one] : under_way)
+            channels.push_back(one.channel());
+        ::poll(channels.data(), channels.size(), longest_wait);
+        for (auto at = under_way.begin(); at != under_way.end();) {
+            auto& [index, one] = *at;
+            const bool has_ended = one.has_ended();
+            if (has_ended) done(index, one.result());
+            at = has_ended ? under_way.erase(at) : std::next(at);
         }
-        ::_exit(0);
     }
-    ::close(turn);
-    bool whole = true;
-    for (const pid_t worker : workers) {
-        int status = 0;
-        whole = ::waitpid(worker, &status, 0) == worker && WIFEXITED(status) && WEXITSTATUS(status) == 0 && whole;
-    }
-    if (!whole) throw std::runtime_error("not all runs were made");
 }
 
 } // namespace nvrtest

@@ -57,8 +57,7 @@ struct Run_Result {
 /// `prints`: what it prints goes to standard error.
 Run_Result do_run(const Run& run, bool prints = false);
 
-/// Does them all, up to `at_once` at a time. `done` is asked after each, never twice at once, in one of some forked
-/// processes: what it is to remember it must put into memory that they share.
+/// Does them all, up to `at_once` at a time; `done` is asked after each, in the order in which they end.
 void do_runs(const std::vector<Run>& runs, unsigned at_once,
              const std::function<void(std::size_t index, const Run_Result&)>& done);
 
