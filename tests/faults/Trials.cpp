@@ -217,7 +217,7 @@ void try_call(const Sound_Session& sound, const std::string& call, std::uint64_t
     const std::uint64_t until_unload = sound.calls.at(call).until_unload;
     const bool is_in_unload = ordinal > until_unload;
     const auto arm = [&](std::uint64_t from) {
-        add_fault("call = \"" + call + "\", from = " + std::to_string(from) + ", times = 1, " + kind.fault);
+        add_fault("call = \"" + call + "\", from = " + std::to_string(from) + ", times = 1, " + kind.failure.fault);
     };
     Trial trial(watch);
     if (!is_in_unload) arm(ordinal);
@@ -229,7 +229,7 @@ void try_call(const Sound_Session& sound, const std::string& call, std::uint64_t
                  "an adapter stays open");
     const std::string published = trial.published();
     // A load whose library did not start, or that an exception ended, publishes no adapters up to its unload.
-    const bool may_end_load = call == "RM_InitLib" || (kind.name == std::string("throws") &&
+    const bool may_end_load = call == "RM_InitLib" || (kind.failure.name == std::string("throws") &&
                                                        is_one_of(call, {"HBA_LoadLibrary", "CPQFC_LoadLibrary"}));
     if (!may_end_load) trial.expect_published(sound.published, published, "after a refresh");
     if (is_in_unload) arm(ordinal - until_unload);
@@ -338,24 +338,14 @@ Sound_Session Sound_Session::hold()
 
 const std::vector<Failure_Kind>& failure_kinds()
 {
-    static const std::vector<Failure_Kind> all = {
-        {"status-1", "status = 1", false},
-        {"status-7", "status = 7", false},
-        {"status-8", "status = 8", false},
-        {"status-9", "status = 9", false},
-        {"status-191", "status = 191", false},
-        {"null", "damage = \"null\"", false},
-        {"ones", "damage = \"ones\"", false},
-        {"garbage", "damage = \"garbage\"", false},
-        {"unterminated", "damage = \"unterminated\"", false},
-        {"count-0", "value = 0", false},
-        {"count-300", "value = 300", false},
-        {"count-huge", "value = 4294967295", false},
-        {"more-than-there-is", "value = 4294967295, status = 7", false},
-        {"throws", "throws = true", false},
-        {"vanishes", "vanish = true", false},
-        {"slow", "delay_ms = 2000", true},
-    };
+    static const std::vector<Failure_Kind> all = [] {
+        std::vector<Failure_Kind> kinds;
+        for (const Library_Failure& failure : library_failures())
+            kinds.push_back({failure, false});
+        kinds.push_back({{"vanishes", "vanish = true"}, false});
+        kinds.push_back({{"slow", "delay_ms = 2000"}, true});
+        return kinds;
+    }();
     return all;
 }
 
@@ -367,7 +357,7 @@ std::vector<Run> library_call_trials(const Sound_Session& sound)
             for (std::uint64_t ordinal = 1; ordinal <= count.until_unload + count.in_unload; ordinal++)
                 for (const Failure_Kind& kind : failure_kinds()) {
                     if (kind.is_slow != is_slow) continue;
-                    trials.push_back({call + '#' + std::to_string(ordinal) + ':' + kind.name,
+                    trials.push_back({call + '#' + std::to_string(ordinal) + ':' + kind.failure.name,
                                       is_slow ? patience + delay : patience,
                                       [&sound, call = call, ordinal, &kind](Run_Watch& watch) {
                                           try_call(sound, call, ordinal, kind, watch);

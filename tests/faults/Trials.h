@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "tests/faults/Runs.h"
+#include "tests/support/simulator.h"
 
 namespace nvrtest {
 
@@ -32,9 +33,7 @@ struct Sound_Session {
 
 /// The ways in which a call fails.
 struct Failure_Kind {
-    const char* name;
-    /// The inside of a fault's table, but for call and place.
-    const char* fault;
+    Library_Failure failure;
     bool is_slow;
 };
 const std::vector<Failure_Kind>& failure_kinds();

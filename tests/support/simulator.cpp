@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <set>
 #include <sstream>
 #include <stdexcept>
 
@@ -64,6 +65,37 @@ std::uint64_t fault_hits()
         hits += std::strtoull(line.c_str() + at + word.size(), nullptr, 10);
     }
     return hits;
+}
+
+const std::vector<Library_Failure>& library_failures()
+{
+    static const std::vector<Library_Failure> all = {
+        {"status-1", "status = 1"},
+        {"status-7", "status = 7"},
+        {"status-8", "status = 8"},
+        {"status-9", "status = 9"},
+        {"status-191", "status = 191"},
+        {"null", "damage = \"null\""},
+        {"ones", "damage = \"ones\""},
+        {"garbage", "damage = \"garbage\""},
+        {"unterminated", "damage = \"unterminated\""},
+        {"count-0", "value = 0"},
+        {"count-300", "value = 300"},
+        {"count-huge", "value = 4294967295"},
+        {"more-than-there-is", "value = 4294967295, status = 7"},
+        {"throws", "throws = true"},
+    };
+    return all;
+}
+
+std::vector<std::string> called_operations()
+{
+    // The first word of each line of the log.
+    std::istringstream lines(text_of(nvrsim_log));
+    std::set<std::string> names;
+    for (std::string line; std::getline(lines, line);)
+        names.insert(line.substr(0, line.find(' ')));
+    return {names.begin(), names.end()};
 }
 
 std::uint64_t calls(const std::string& operation)

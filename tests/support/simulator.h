@@ -25,6 +25,18 @@ void clear_faults();
 /// Calls that faults have hit since they were added.
 std::uint64_t fault_hits();
 
+/// A way in which one call can fail, and which ends with its fault.
+struct Library_Failure {
+    const char* name;  ///< as a part of a test's name
+    const char* fault; ///< the inside of a fault's table, but for the call
+};
+/// The ways in which any call is made to fail: statuses, rubbish, counts that lie, an exception. What a test does
+/// beyond them is its own.
+const std::vector<Library_Failure>& library_failures();
+
+/// The operations among the newest calls, in alphabetical order.
+std::vector<std::string> called_operations();
+
 /// Calls of an operation since the load.
 std::uint64_t calls(const std::string& operation);
 /// A value of the port of that number, from 0, as nvrsim_get and nvrsim_set name it.
