@@ -1,7 +1,6 @@
 // All that clients do, on eight threads at once: nobody waits for ever, and nothing is different afterwards.
 //
 // NVR_ROUNDS=1000 in the environment makes the rounds so many.
-#include <array>
 #include <atomic>
 #include <chrono>
 #include <cstdio>
@@ -23,6 +22,7 @@
 #include "tests/module/support/Quiet_Output.h"
 #include "tests/module/support/Service_Methods.h"
 #include "tests/module/support/Test_Clock.h"
+#include "tests/support/Watch.h"
 #include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
@@ -53,57 +53,21 @@ unsigned rounds()
     return asked ? static_cast<unsigned>(std::atoi(asked)) : usual_rounds;
 }
 
-/// Ends the process, with the call's name, where a call waits too long. What clients tell it orders nothing between
-/// them, so that the thread sanitizer sees them as they are.
+/// A watch that ends the process, with the call's name, where a call waits too long.
 class Watchdog {
 public:
-    Watchdog() : m_thread([this] { watch(); }) {}
-    ~Watchdog()
-    {
-        m_over = true;
-        m_thread.join();
-    }
-    Watchdog(const Watchdog&) = delete;
-    Watchdog& operator=(const Watchdog&) = delete;
-
-    /// `what` is a literal.
     template <class Call>
-    auto during(unsigned client, const char* what, Call call)
+    auto during(const char* what, Call call)
     {
-        struct Turn {
-            Turn(Watched& watched, const char* what) : m_watched(watched)
-            {
-                m_watched.what.store(what, std::memory_order_relaxed);
-                m_watched.since.store(now(), std::memory_order_relaxed);
-            }
-            ~Turn() { m_watched.since.store(0, std::memory_order_relaxed); }
-            Watched& m_watched;
-        } turn(m_watched[client], what);
+        const Watch::Turn turn(m_watch, what);
         return call();
     }
 
 private:
-    struct Watched {
-        std::atomic<std::int64_t> since{0}; // 0: in no call
-        std::atomic<const char*> what{nullptr};
-    };
-    static std::int64_t now() { return std::chrono::steady_clock::now().time_since_epoch().count(); }
-    void watch()
-    {
-        while (!m_over) {
-            for (const Watched& one : m_watched) {
-                const std::int64_t since = one.since.load(std::memory_order_relaxed);
-                if (since == 0 || std::chrono::steady_clock::duration(now() - since) < patience) continue;
-                std::fprintf(stderr, "A call waits for ever: %s\n", one.what.load(std::memory_order_relaxed));
-                std::abort();
-            }
-            std::this_thread::sleep_for(50ms);
-        }
-    }
-
-    std::array<Watched, number_of_clients> m_watched;
-    std::atomic<bool> m_over{false};
-    std::thread m_thread;
+    Watch m_watch{patience, [](const std::string& what) {
+                      std::fprintf(stderr, "A call waits for ever: %s\n", what.c_str());
+                      std::abort();
+                  }};
 };
 
 /// Runs `body` on as many threads as there are clients, and waits for them.
@@ -130,11 +94,11 @@ public:
             m_methods.push_back({rig.names(method.service).paths.at(0), method.name, method.others});
     }
 
-    void act(unsigned client, unsigned seed)
+    void act(unsigned seed)
     {
         Dice dice(seed);
         for (unsigned i = 0; i < 25; i++)
-            (this->*actions[dice() % actions.size()])(client, dice);
+            (this->*actions[dice() % actions.size()])(dice);
     }
 
     void advance(std::chrono::seconds by)
@@ -154,7 +118,7 @@ public:
 
 private:
     using Dice = std::minstd_rand;
-    using Action = void (Clients::*)(unsigned client, Dice& dice);
+    using Action = void (Clients::*)(Dice& dice);
     static const std::vector<Action> actions;
     struct Method {
         host::Path service;
@@ -169,9 +133,9 @@ private:
     }
 
     template <class Request>
-    void ask(unsigned client, const char* what, Request request)
+    void ask(const char* what, Request request)
     {
-        const host::Answer answer = m_watchdog.during(client, what, [&] { return request(m_rig.server()); });
+        const host::Answer answer = m_watchdog.during(what, [&] { return request(m_rig.server()); });
         m_answered.fetch_add(answer.ok(), std::memory_order_relaxed);
         for (const host::Instance& instance : answer.instances)
             for (const host::Named_Value& property : instance.properties)
@@ -185,51 +149,51 @@ private:
         const std::lock_guard<std::mutex> lock(m_mutex);
         m_wrong.push_back(std::string(what) + ": " + status.message);
     }
-    void call(unsigned client, const host::Path& path, const char* name, const Arguments& arguments)
+    void call(const host::Path& path, const char* name, const Arguments& arguments)
     {
-        ask(client, name, [&](host::Host& server) { return server.call(path, name, arguments); });
+        ask(name, [&](host::Host& server) { return server.call(path, name, arguments); });
     }
 
-    void enumerate(unsigned client, Dice& dice)
+    void enumerate(Dice& dice)
     {
         const std::string& name = one_of(m_classes, dice);
         if (name == "NVRHBA_AlertIndication") return;
-        ask(client, "enumerate", [&](host::Host& server) {
+        ask("enumerate", [&](host::Host& server) {
             return dice() % 2 ? server.enumerate(name_space, name) : server.names(name_space, name);
         });
     }
-    void traverse(unsigned client, Dice& dice)
+    void traverse(Dice& dice)
     {
         const host::Path& from = one_of(dice() % 2 ? m_ports : m_controllers, dice);
         const char* const over = dice() % 2 ? "NVRHBA_FCPortConformsToProfile" : "NVRHBA_ControlledBy";
-        ask(client, "associators", [&](host::Host& server) { return server.associators(from, over); });
-        ask(client, "reference names", [&](host::Host& server) { return server.reference_names(from, over); });
+        ask("associators", [&](host::Host& server) { return server.associators(from, over); });
+        ask("reference names", [&](host::Host& server) { return server.reference_names(from, over); });
     }
-    void get_live_values(unsigned client, Dice& dice)
+    void get_live_values(Dice& dice)
     {
         advance(11s); // so that they are read again
-        ask(client, "get a port", [&](host::Host& server) { return server.get(one_of(m_ports, dice)); });
+        ask("get a port", [&](host::Host& server) { return server.get(one_of(m_ports, dice)); });
         const char* const name = dice() % 2 ? "NVRHBA_FCPortStatistics" : "NVRHBA_DriverParams";
-        ask(client, "enumerate live values", [&](host::Host& server) { return server.enumerate(name_space, name); });
+        ask("enumerate live values", [&](host::Host& server) { return server.enumerate(name_space, name); });
     }
-    void refresh(unsigned client, Dice&)
+    void refresh(Dice&)
     {
         advance(31min);
-        ask(client, "start a refresh", [](host::Host& server) { return server.enumerate(name_space, settings_class); });
+        ask("start a refresh", [](host::Host& server) { return server.enumerate(name_space, settings_class); });
     }
-    void change_a_setting(unsigned client, Dice& dice)
+    void change_a_setting(Dice& dice)
     {
         const std::size_t which = dice() % m_settings.size(); // the time-out, and two switches
-        change_setting(client, which, which == 0 ? 1 + dice() % 30 : dice() % 2);
+        change_setting(which, which == 0 ? 1 + dice() % 30 : dice() % 2);
     }
-    void serve(unsigned client, Dice& dice)
+    void serve(Dice& dice)
     {
         const Method& method = one_of(m_methods, dice);
         Arguments arguments = method.others;
         arguments.push_back({"Target", Value::reference(one_of(m_ports, dice))});
-        call(client, method.service, method.name, arguments);
+        call(method.service, method.name, arguments);
     }
-    void diagnose(unsigned client, Dice& dice)
+    void diagnose(Dice& dice)
     {
         const host::Path& test = one_of(m_tests, dice);
         host::Instance settings;
@@ -238,39 +202,39 @@ private:
         settings.set("InstanceID", *test.find("Name"));
         settings.set("LoopControlParameter", texts_value({"2"}));
         settings.set("TargetDevice", Value::string("50060E8005A10000"));
-        call(client, test, "RunDiagnosticService",
+        call(test, "RunDiagnosticService",
              {{"ManagedElement", Value::reference(one_of(m_controllers, dice))},
               {"DiagnosticSettings", Value::instance(settings)}});
-        if (dice() % 4 == 0) call(client, one_of(m_logs, dice), "ClearLog", {});
+        if (dice() % 4 == 0) call(one_of(m_logs, dice), "ClearLog", {});
     }
-    void listen(unsigned client, Dice&)
+    void listen(Dice&)
     {
         int id = 0;
-        const host::Status subscribed = m_watchdog.during(client, "subscribe", [&] {
+        const host::Status subscribed = m_watchdog.during("subscribe", [&] {
             return m_rig.server().subscribe(
                 name_space, "NVRHBA_AlertIndication", [](const host::Indication&) {}, id);
         });
         if (!subscribed.ok()) return found_wrong("subscribe", subscribed);
         for (unsigned i = 0; i < 3; i++)
-            m_watchdog.during(client, "an event", [] { return nvrsim_event("0", link_up, 0); });
+            m_watchdog.during("an event", [] { return nvrsim_event("0", link_up, 0); });
         // It may be gone: this server unloads what is idle, whoever listens.
-        m_watchdog.during(client, "unsubscribe", [&] { return m_rig.server().unsubscribe(id); });
+        m_watchdog.during("unsubscribe", [&] { return m_rig.server().unsubscribe(id); });
     }
-    void unload(unsigned client, Dice&)
+    void unload(Dice&)
     {
         const host::Unload_Result result =
-            m_watchdog.during(client, "unload what is idle", [&] { return m_rig.server().unload_idle(); });
+            m_watchdog.during("unload what is idle", [&] { return m_rig.server().unload_idle(); });
         m_unloads.fetch_add(static_cast<unsigned>(result.closed), std::memory_order_relaxed);
     }
 
-    void change_setting(unsigned client, std::size_t which, std::uint32_t value)
+    void change_setting(std::size_t which, std::uint32_t value)
     {
         host::Instance setting;
         setting.path = m_settings.at(which);
         for (const host::Named_Value& key : setting.path.keys)
             setting.set(key.name, key.value);
         setting.set("current", Value::uint32(value));
-        ask(client, "change a setting",
+        ask("change a setting",
             [&](host::Host& server) { return server.modify(setting, std::vector<std::string>{"current"}); });
     }
 
@@ -288,7 +252,7 @@ public:
     void restore_settings()
     {
         for (std::size_t which = 0; which < m_settings.size(); which++)
-            change_setting(0, which, which == 0 ? 10 : 1);
+            change_setting(which, which == 0 ? 10 : 1);
     }
 };
 
@@ -309,14 +273,14 @@ TEST(Threads, OfAllThatClientsDoWaitForNoneForEverAndChangeNothing)
     for (unsigned round = 0; round < rounds(); round++) {
         {
             const Quiet_Output quiet; // the bridge prints some of what it is asked
-            on_all_clients([&](unsigned client) { clients.act(client, 1 + round * number_of_clients + client); });
+            on_all_clients([&](unsigned client) { clients.act(1 + round * number_of_clients + client); });
         }
         EXPECT_THAT(clients.wrong(), IsEmpty()) << "round " << round;
         EXPECT_THAT(rig.server().report().violations, IsEmpty()) << "round " << round;
         // A life ends while a refresh runs.
         clients.advance(31min);
         ASSERT_THAT(rig.enumerate(settings_class), succeeded());
-        watchdog.during(0, "stop", [&] { rig.stop(); });
+        watchdog.during("stop", [&] { rig.stop(); });
         EXPECT_LE(left_beside_strings(rig.server().report()), clients.embedded()) << rig.server().report().to_text();
         EXPECT_EQ(rig.server().report().contexts_not_detached, 0u);
         // The tag library's closing call is looked for in another library than its opening one, and not found.
@@ -345,20 +309,17 @@ TEST(Threads, ThatLoadAndUnloadMeet)
     const auto live = [&](unsigned client, const CMPIBroker* broker, const CMPIContext* context) {
         for (unsigned life = 0; life < lives; life++) {
             const std::string& name = classes[(client + life) % classes.size()];
-            CMPIInstanceMI* mi =
-                watchdog.during(client, "a factory", [&] { return entries.instances(name, broker, context); });
+            CMPIInstanceMI* mi = watchdog.during("a factory", [&] { return entries.instances(name, broker, context); });
             ASSERT_TRUE(mi) << name;
             CMPIStatus status;
             CMPIObjectPath* path = broker->eft->newObjectPath(broker, name_space, name.c_str(), &status);
             for (unsigned i = 0; i < life % 3; i++)
-                watchdog.during(client, "names",
-                                [&] { return mi->ft->enumerateInstanceNames(mi, context, nullptr, path); });
+                watchdog.during("names", [&] { return mi->ft->enumerateInstanceNames(mi, context, nullptr, path); });
             path->ft->release(path);
-            const CMPIStatus cleaned =
-                watchdog.during(client, "a clean-up", [&] { return mi->ft->cleanup(mi, context, 1); });
+            const CMPIStatus cleaned = watchdog.during("a clean-up", [&] { return mi->ft->cleanup(mi, context, 1); });
             EXPECT_EQ(cleaned.rc, CMPI_RC_OK) << name;
             // What the refresh's questions made the server load, which holds the agent too.
-            watchdog.during(client, "unload what is idle", [&] { return rig.server().unload_idle(); });
+            watchdog.during("unload what is idle", [&] { return rig.server().unload_idle(); });
         }
     };
     on_all_clients([&](unsigned client) {

@@ -54,7 +54,7 @@ const host::Property_List current_alone = std::vector<std::string>{"current"};
 
 } // namespace
 
-Load::Load(nvrtest::Rig& rig, Watch& watch, Counts& counts) : m_rig(rig), m_watch(watch), m_counts(counts)
+Load::Load(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts) : m_rig(rig), m_watch(watch), m_counts(counts)
 {
     std::filesystem::create_directories(folder);
     std::filesystem::current_path(folder);
@@ -75,7 +75,7 @@ Load::Load(nvrtest::Rig& rig, Watch& watch, Counts& counts) : m_rig(rig), m_watc
 template <class Request>
 host::Answer Load::ask(const std::string& what, Request request)
 {
-    const Watch::Turn turn(m_watch, what);
+    const nvrtest::Watch::Turn turn(m_watch, what);
     host::Answer answer = request(m_rig.server());
     m_counts.requests++;
     m_counts.errors += !answer.ok();
@@ -288,11 +288,14 @@ void Load::reach_too_far(Random& random)
     ask("no such method of " + name, [&](host::Host& server) { return server.call(path, "NoSuchMethod"); });
 }
 
-void Load::restore_settings()
+bool Load::restore_settings()
 {
+    bool all = true;
     for (const auto& [name, value] : {std::pair("cachetimeout", 10u), {"adapterrefresh", 1u}, {"sanrefresh", 1u}})
-        ask("restore a setting",
-            [&, changed = setting(name, value)](host::Host& server) { return server.modify(changed, current_alone); });
+        all &= ask("restore a setting", [&, changed = setting(name, value)](host::Host& server) {
+                   return server.modify(changed, current_alone);
+               }).ok();
+    return all;
 }
 
 void Load::restore_files()

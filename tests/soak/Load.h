@@ -12,7 +12,7 @@
 #include "tests/module/support/Rig.h"
 #include "tests/soak/Counts.h"
 #include "tests/soak/Random.h"
-#include "tests/soak/Watch.h"
+#include "tests/support/Watch.h"
 
 namespace soak {
 
@@ -22,7 +22,7 @@ public:
     static constexpr char folder[] = "/var/log/soak";
 
     /// Asks each method once, without arguments, whether it is served.
-    Load(nvrtest::Rig& rig, Watch& watch, Counts& counts);
+    Load(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts);
 
     /// One act of a client: one request, or as many as it takes to come by the path of another.
     void act(Random& random);
@@ -30,8 +30,9 @@ public:
     void unsubscribe_all();
     /// Subscribes, has an event come, and unsubscribes.
     void meet_alert();
-    /// Brings all settings back to their defaults, but that each refresh reads the adapters.
-    void restore_settings();
+    /// Brings all settings back to their defaults, but that each refresh reads the adapters. False where one is not
+    /// published.
+    bool restore_settings();
     /// Writes the files that clients name, and removes all others.
     void restore_files();
     /// The paths of all instances, in order.
@@ -67,7 +68,7 @@ private:
     host::Value plain_value(CMPIType type, Random& random);
 
     nvrtest::Rig& m_rig;
-    Watch& m_watch;
+    nvrtest::Watch& m_watch;
     Counts& m_counts;
     std::vector<Class> m_classes, m_associations;
     std::vector<Method> m_methods;

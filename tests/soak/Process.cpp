@@ -1,8 +1,6 @@
 #include "tests/soak/Process.h"
 
-#include <algorithm>
 #include <dirent.h>
-#include <filesystem>
 #include <fstream>
 #include <malloc.h>
 #include <unistd.h>
@@ -37,23 +35,6 @@ Process Process::now()
     process.threads = entries_of("/proc/self/task");
     process.descriptors = entries_of("/proc/self/fd") - 1; // the folder itself was open
     return process;
-}
-
-std::chrono::nanoseconds Starvation::since_last()
-{
-    std::map<std::string, std::chrono::nanoseconds> now;
-    std::chrono::nanoseconds longest{0};
-    std::error_code none; // threads end meanwhile
-    for (const auto& task : std::filesystem::directory_iterator("/proc/self/task", none)) {
-        std::ifstream figures(task.path() / "schedstat");
-        long long ran = 0, waited = 0;
-        if (!(figures >> ran >> waited)) continue;
-        const std::string thread = task.path().filename();
-        now[thread] = std::chrono::nanoseconds(waited);
-        longest = std::max(longest, now[thread] - m_waited[thread]);
-    }
-    m_waited = std::move(now);
-    return longest;
 }
 
 } // namespace soak

@@ -1,10 +1,7 @@
 /// What this process holds of the machine, as the kernel and the allocator tell it. Any thread.
 #pragma once
 
-#include <chrono>
 #include <cstddef>
-#include <map>
-#include <string>
 
 namespace soak {
 
@@ -16,16 +13,6 @@ struct Process {
 
     /// As it is now. Free memory goes back to the kernel first, so that resident memory is what is in use.
     static Process now();
-};
-
-/// How long threads of this process were ready to run while no processor was free for them. One thread asks.
-class Starvation {
-public:
-    /// The longest such time of a thread since the last call.
-    std::chrono::nanoseconds since_last();
-
-private:
-    std::map<std::string, std::chrono::nanoseconds> m_waited; ///< by thread, since its start
 };
 
 } // namespace soak

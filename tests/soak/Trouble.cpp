@@ -1,8 +1,6 @@
 #include "tests/soak/Trouble.h"
 
-#include <algorithm>
-#include <set>
-#include <sstream>
+#include <iterator>
 #include <utility>
 
 #include "simulator/nvrsim.h"
@@ -16,41 +14,25 @@ namespace {
 constexpr std::size_t ports = 4;
 constexpr std::uint32_t event_types[] = {256, 257, 258, 259, 513, 514, 515, 516, 0, 4294967295u};
 
-const char* const kinds_of_fault[] = {
-    "status = 1",
-    "status = 7",
-    "status = 8",
-    "status = 9",
-    "status = 191",
-    "damage = \"garbage\"",
-    "damage = \"ones\"",
+// What the simulator does beside the failures that all tests share.
+const char* const more_faults[] = {
     "damage = \"zeros\"",
-    "damage = \"null\"",
-    "damage = \"unterminated\"",
     "damage = \"truncated\", keep = 3",
-    "value = 0",
-    "value = 300",
-    "value = 4294967295",
-    "value = 4294967295, status = 7",
     "absent = true",
-    "throws = true",
     "vanish = true",
 };
 
-} // namespace
-
-std::vector<std::string> called_operations()
+std::vector<const char*> all_faults()
 {
-    std::string log(nvrsim_log(nullptr, 0) + 1, '\0');
-    log.resize(std::min(log.size() - 1, nvrsim_log(log.data(), log.size())));
-    std::set<std::string> names;
-    std::istringstream lines(log);
-    for (std::string line; std::getline(lines, line);)
-        names.insert(line.substr(0, line.find(' ')));
-    return {names.begin(), names.end()};
+    std::vector<const char*> faults(std::begin(more_faults), std::end(more_faults));
+    for (const nvrtest::Library_Failure& failure : nvrtest::library_failures())
+        faults.push_back(failure.fault);
+    return faults;
 }
 
-Trouble::Trouble(nvrtest::Rig& rig, Watch& watch, Counts& counts, std::vector<std::string> calls)
+} // namespace
+
+Trouble::Trouble(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, std::vector<std::string> calls)
     : m_rig(rig), m_watch(watch), m_counts(counts), m_calls(std::move(calls))
 {
 }
@@ -58,7 +40,7 @@ Trouble::Trouble(nvrtest::Rig& rig, Watch& watch, Counts& counts, std::vector<st
 void Trouble::act(Random& random)
 {
     const std::string port = std::to_string(random.below(ports));
-    const Watch::Turn turn(m_watch, "trouble");
+    const nvrtest::Watch::Turn turn(m_watch, "trouble");
     switch (random.below(10)) {
     case 0:
     case 1:
@@ -96,7 +78,8 @@ void Trouble::add_fault(Random& random)
         m_watch.allow(std::chrono::milliseconds(times * delay));
         fault += "delay_ms = " + std::to_string(delay);
     } else {
-        fault += random.pick(kinds_of_fault);
+        static const std::vector<const char*> faults = all_faults();
+        fault += random.pick(faults);
     }
     nvrtest::add_fault(fault);
 }

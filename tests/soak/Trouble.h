@@ -10,14 +10,14 @@
 #include "tests/module/support/Rig.h"
 #include "tests/soak/Counts.h"
 #include "tests/soak/Random.h"
-#include "tests/soak/Watch.h"
+#include "tests/support/Watch.h"
 
 namespace soak {
 
 class Trouble {
 public:
     /// `calls`: the operations of the libraries that may fail.
-    Trouble(nvrtest::Rig& rig, Watch& watch, Counts& counts, std::vector<std::string> calls);
+    Trouble(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, std::vector<std::string> calls);
 
     /// One thing that happens.
     void act(Random& random);
@@ -31,13 +31,10 @@ private:
     void clear_faults();
 
     nvrtest::Rig& m_rig;
-    Watch& m_watch;
+    nvrtest::Watch& m_watch;
     Counts& m_counts;
     const std::vector<std::string> m_calls;
     bool m_is_spoiled = false;
 };
-
-/// The operations that the libraries were last asked for.
-std::vector<std::string> called_operations();
 
 } // namespace soak

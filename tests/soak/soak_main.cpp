@@ -29,6 +29,7 @@
 #include <vector>
 
 #include "simulator/nvrsim.h"
+#include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
 #include "tests/module/support/Test_Clock.h"
 #include "tests/soak/Crossing.h"
@@ -188,7 +189,7 @@ private:
 
     const Options m_options;
     Counts m_counts;
-    Watch m_watch;
+    nvrtest::Watch m_watch;
     nvrtest::Rig m_rig;
     Load m_load;
     std::string m_names; ///< of all instances, at the start
@@ -203,14 +204,15 @@ private:
     std::vector<Look> m_looks;
     std::size_t m_different = 0;
     std::uint64_t m_violations = 0, m_left = 0;
-    std::string m_told_left; ///< the first report with one of them
+    std::string m_told_left;       ///< the first report with one of them
+    std::string m_told_difference; ///< of the first look that saw other instances
     bool m_is_traced = true;
 };
 
 std::vector<std::string> Soak::warm_up()
 {
     m_names = rested_names();
-    return called_operations();
+    return nvrtest::called_operations();
 }
 
 void Soak::serve_client(std::uint64_t seed)
@@ -257,7 +259,7 @@ void Soak::wait_for_tick(std::size_t tick, std::size_t ticks)
 // never let go: it is there when this is called.
 void Soak::wait_for_refresh()
 {
-    const Watch::Turn turn(m_watch, "the end of a refresh");
+    const nvrtest::Watch::Turn turn(m_watch, "the end of a refresh");
     const std::uint64_t resting = m_options.manner->disable == host::Manner::Disable::never;
     while (m_rig.server().report().contexts_not_detached > resting)
         std::this_thread::sleep_for(std::chrono::milliseconds(1));
@@ -278,7 +280,7 @@ std::string Soak::rested_names()
 
 void Soak::begin_new_life()
 {
-    const Watch::Turn turn(m_watch, "the server's stop and start");
+    const nvrtest::Watch::Turn turn(m_watch, "the server's stop and start");
     m_rig.stop();
     const host::Report report = m_rig.server().report();
     m_violations += report.violation_count;
@@ -295,8 +297,13 @@ void Soak::look()
 {
     const Crossing::Hold hold(m_crossing);
     const std::uint64_t requests = m_counts.requests, errors = m_counts.errors; // of clients
-    if (m_trouble.end()) begin_new_life();
-    m_different += rested_names() != m_names;
+    const bool is_spoiled = m_trouble.end();
+    // A refresh that failed may have left no settings, and where adapters are not to be read, none brings them back.
+    if (!m_load.restore_settings() || is_spoiled) begin_new_life();
+    if (const std::string names = rested_names(); names != m_names) {
+        m_different++;
+        if (m_told_difference.empty()) m_told_difference = nvrtest::difference(m_names, names);
+    }
     const Process process = Process::now();
     m_looks.push_back({minutes(), process});
     m_counts.requests = requests;
@@ -361,8 +368,8 @@ bool Soak::judge()
     hold_against(after.threads <= m_before.threads, "%zu threads before, %zu after\n", m_before.threads, after.threads);
     hold_against(after.descriptors <= m_before.descriptors, "%zu descriptors before, %zu after\n", m_before.descriptors,
                  after.descriptors);
-    hold_against(m_different == 0, "other instances than at the start in %zu of %zu looks\n", m_different,
-                 m_looks.size());
+    hold_against(m_different == 0, "other instances than at the start in %zu of %zu looks\n%s", m_different,
+                 m_looks.size(), m_told_difference.c_str());
     hold_against(nvrsim_open_handles() == 0, "%zu handles of adapters open\n", nvrsim_open_handles());
     hold_against(m_violations == 0 && m_left == 0, "%llu rules of the server broken, %llu of its objects kept\n%s",
                  static_cast<unsigned long long>(m_violations), static_cast<unsigned long long>(m_left),

@@ -5,22 +5,28 @@
 ///     { Watch::Turn turn(watch, "enumerate NVRHBA_FCPort"); server.enumerate(...); }
 ///
 /// Its clock stands still while a thread of this process waits for a free processor.
-/// Any thread. The handler is called once, on the watch's own thread, while the request still waits.
+/// Any thread. What the threads tell it orders nothing between them, so that the thread sanitizer sees them as they
+/// are. The handler is called once, on the watch's own thread, while the request still waits.
 #pragma once
 
+#include <array>
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <cstddef>
 #include <functional>
-#include <list>
 #include <mutex>
 #include <string>
 #include <thread>
 
-namespace soak {
+namespace nvrtest {
 
 class Watch {
+    struct Place;
+
 public:
     using Clock = std::chrono::steady_clock;
+    static constexpr std::size_t most_turns = 256; ///< at once; another one waits for a place
 
     Watch(Clock::duration limit, std::function<void(const std::string& what)> on_hang);
     ~Watch();
@@ -39,24 +45,31 @@ public:
         Turn& operator=(const Turn&) = delete;
 
     private:
-        friend class Watch;
-        Watch& m_watch;
         const std::string m_what;
-        Clock::duration m_until;
-        std::list<Turn*>::iterator m_place;
+        Place& m_place;
     };
 
 private:
+    enum class State { vacant, being_taken, taken, being_read };
+    // Where a turn shows itself.
+    struct Place {
+        std::atomic<State> state{State::vacant};
+        std::atomic<Clock::rep> until{0}; // by the watch's clock
+        std::atomic<const std::string*> what{nullptr};
+    };
+
+    Place& vacant_place();
     void run();
+    bool tells_of(Place& place);
 
     const Clock::duration m_limit;
     const std::function<void(const std::string&)> m_on_hang;
+    std::array<Place, most_turns> m_places;
+    std::atomic<Clock::rep> m_now{0};
     std::mutex m_mutex;
     std::condition_variable m_changed;
-    std::list<Turn*> m_turns;
-    Clock::duration m_now{};
     bool m_ends = false;
     std::thread m_thread;
 };
 
-} // namespace soak
+} // namespace nvrtest

@@ -1,11 +1,11 @@
-#include "tests/soak/Watch.h"
+#include "tests/support/Watch.h"
 
 #include <future>
 #include <string>
 
 #include <gmock/gmock.h>
 
-using soak::Watch;
+using nvrtest::Watch;
 
 TEST(Watch, TellsOfARequestThatTakesTooLong)
 {
