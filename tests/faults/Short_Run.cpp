@@ -1,22 +1,13 @@
 #include "tests/faults/Short_Run.h"
 
-#include <algorithm>
-#include <csignal>
-#include <cstdlib>
 #include <cstring>
 #include <exception>
-#include <fcntl.h>
 #include <filesystem>
-#include <fstream>
-#include <iostream>
 #include <iterator>
-#include <map>
-#include <poll.h>
 #include <sstream>
 #include <stdexcept>
-#include <sys/wait.h>
 #include <thread>
-#include <unistd.h>
+#include <type_traits>
 
 #include "tests/faults/Session.h"
 #include "tests/module/support/Instance_Text.h"
@@ -26,28 +17,76 @@ namespace nvrtest {
 
 namespace {
 
-// Left by the survey for all runs.
-constexpr char published_path[] = "/var/log/survey.published";
-constexpr char blocks_path[] = "/var/log/survey.blocks.";     // by part and load
-constexpr char settings_path[] = "/var/log/survey.settings."; // by part
-constexpr char words_path[] = "/var/log/run.words";           // what a process writes on its standard error
-
-// --- In the process of a run
-
-/// The way to the process that waits; one line each: a word, a blank, a text.
-class Teller {
+/// What a run tells: things one behind the other, numbers as they lie in memory, for both sides are this program. The
+/// same words write and read; where nothing is left to read, things stay as they are.
+class Record {
 public:
-    explicit Teller(int file) : m_file(file) {}
-    void tell(const std::string& word, const std::string& text)
+    template <class Thing>
+    static std::string of(Thing thing)
     {
-        std::string line = word + ' ' + text;
-        std::replace(line.begin(), line.end(), '\n', '\t');
-        line += '\n';
-        if (::write(m_file, line.data(), line.size()) < 0) ::_exit(1);
+        Record record;
+        record.pass(thing);
+        return record.m_bytes;
+    }
+    template <class Thing>
+    static Thing read(const std::string& bytes)
+    {
+        Record record;
+        record.m_bytes = bytes;
+        record.m_reads = true;
+        Thing thing;
+        record.pass(thing);
+        return thing;
     }
 
 private:
-    const int m_file;
+    void pass(Short_Outcome& outcome) { pass_all(outcome.refused, outcome.is_idle, outcome.request); }
+    void pass(Survey& survey)
+    {
+        pass_all(survey.sites, survey.published, survey.settings, survey.first, survey.second);
+    }
+    void pass(Surveyed_Site& site) { pass_all(site.part, site.site.id, site.site.asked, site.site.stack); }
+    void pass(Blocks& blocks)
+    {
+        std::vector<Blocks::key_type> frames;
+        std::vector<Blocks::mapped_type> counts;
+        for (const auto& [frame, count] : blocks) {
+            frames.push_back(frame);
+            counts.push_back(count);
+        }
+        pass_all(frames, counts);
+        for (std::size_t i = 0; i < frames.size(); i++)
+            blocks[frames[i]] = counts[i];
+    }
+    template <class Thing>
+    void pass(Thing& thing)
+    {
+        if constexpr (std::is_arithmetic_v<Thing>) {
+            pass_bytes(&thing, sizeof thing);
+        } else {
+            std::size_t size = thing.size();
+            pass(size);
+            thing.resize(size);
+            for (auto& one : thing)
+                pass(one);
+        }
+    }
+    template <class... Things>
+    void pass_all(Things&... things)
+    {
+        (pass(things), ...);
+    }
+    void pass_bytes(void* bytes, std::size_t size)
+    {
+        if (!m_reads)
+            m_bytes.append(static_cast<const char*>(bytes), size);
+        else if (m_bytes.size() - m_at >= size)
+            m_at += m_bytes.copy(static_cast<char*>(bytes), size, m_at);
+    }
+
+    std::string m_bytes;
+    bool m_reads = false;
+    std::size_t m_at = 0;
 };
 
 std::size_t entries_of(const char* folder)
@@ -62,9 +101,6 @@ struct Left {
     std::size_t semaphores = entries_of("/dev/shm");
 };
 
-/// Blocks by the innermost frame that asked for them.
-using Blocks = std::map<std::uintptr_t, std::int64_t>;
-
 Blocks blocks()
 {
     Blocks held;
@@ -73,28 +109,9 @@ Blocks blocks()
     return held;
 }
 
-std::string text_of(const Blocks& held)
+std::vector<std::string> settings()
 {
-    std::ostringstream text;
-    for (const auto& [frame, count] : held)
-        text << std::hex << frame << ' ' << std::dec << count << '\n';
-    return text.str();
-}
-
-Blocks blocks_of(const std::string& text)
-{
-    std::istringstream lines(text);
-    Blocks held;
-    for (std::uintptr_t frame; lines >> std::hex >> frame;)
-        lines >> std::dec >> held[frame];
-    return held;
-}
-
-std::string hex(std::uint64_t number)
-{
-    std::ostringstream text;
-    text << std::hex << number;
-    return text.str();
+    return {read_file(conf_path), read_file(dmp_path)};
 }
 
 /// Without the driver's log, which a clearing that failed leaves as it was.
@@ -109,12 +126,13 @@ std::string without_driver_log(const std::string& published)
     return rest;
 }
 
-/// The whole course of a process: a session, a look, a reload.
+/// The whole course of a run: a session, a look, a reload.
 class Course {
 public:
-    /// Of the session, only the load, this part and the unload; empty: all parts. `refused`: null in a survey.
-    Course(int file, std::string part, const Refused_Ask* refused)
-        : m_teller(file), m_part(std::move(part)), m_refused(refused)
+    /// A survey. Of the session, only the load, this part and the unload; empty: all parts.
+    Course(Run_Watch& watch, std::string part) : m_watch(watch), m_part(std::move(part)) {}
+    Course(Run_Watch& watch, std::string part, const Survey& expected, const Refused_Ask& ask)
+        : m_watch(watch), m_part(std::move(part)), m_expected(&expected), m_ask(&ask)
     {
     }
 
@@ -122,27 +140,27 @@ public:
     {
         const Left before;
         wait_for_refreshes_by([this] { return threads_of_module() <= lasting_threads(); });
-        if (m_refused) refuse(m_refused->site, m_refused->time, m_refused->refusal);
+        begin_refusal();
         drive_session();
         end_refusal();
         // What is made once a process may be made by the second load only.
-        if (!m_refused || m_part.empty() || !is_as_surveyed("first")) {
+        if (!m_ask || m_part.empty() || m_survey.first != m_expected->first) {
             load_again();
-            tell_blocks();
+            look_at_blocks();
         }
-        tell_what_is_left(before);
-        if (!m_refused) tell_sites();
-        if (refused()) m_teller.tell("refused", std::to_string(refused()) + ' ' + m_place);
+        look_at_the_rest(before);
+        m_outcome.refused = refused();
+        m_watch.tell(m_ask ? Record::of(m_outcome) : Record::of(m_survey));
     }
 
 private:
-    /// Before each request: it is a sign of life, and tells where a refusal falls.
+    /// Before each request.
     std::function<void(const std::string&)> listener()
     {
         return [this](const std::string& what) {
             note_refusal();
             m_request = what;
-            m_teller.tell("at", what);
+            m_watch.step(what);
         };
     }
     /// Alerts have a thread as long as somebody is subscribed.
@@ -150,72 +168,63 @@ private:
     {
         return m_request == "subscribe" || m_request == "alerts" || m_request == "unsubscribe" ? 1 : 0;
     }
+    void begin_refusal()
+    {
+        if (m_ask) refuse(m_ask->place.site, m_ask->time, m_ask->refusal);
+    }
     void note_refusal()
     {
-        if (m_place.empty() && refused()) m_place = m_request.empty() ? "no request" : m_request;
+        if (m_outcome.request.empty() && refused()) m_outcome.request = m_request.empty() ? "no request" : m_request;
     }
-    void finding(const std::string& text) { m_teller.tell("finding", text); }
 
     void drive_session()
     {
-        std::string conf, dmp;
+        std::vector<std::string> settings_before;
         {
             Session session(listener());
-            conf = read_file(conf_path);
-            dmp = read_file(dmp_path);
+            settings_before = settings();
             for (const Session::Part& part : Session::parts()) {
                 const bool is_last = &part == &Session::parts().back();
                 const bool is_first = &part == &Session::parts().front();
                 if (!m_part.empty() && m_part != part.name && !is_first && !is_last) continue;
                 // What comes behind a refusal, the look asks for.
-                if (m_refused && refused() && !is_last) continue;
+                if (refused() && !is_last) continue;
                 if (is_last) look_before_the_end(session);
                 try {
                     session.run(part);
                 } catch (const std::exception& error) {
                     // What a client asks for may be missing; what must be there, the look asks for.
-                    if (!refused()) finding("in " + std::string(part.name) + ": " + error.what());
+                    if (!refused()) m_watch.complain(std::string("in ") + part.name + ": " + error.what());
                 }
                 note_refusal();
-                if (m_refused && refused()) end_refusal();
-                tell_new_sites(part.name);
+                if (refused()) end_refusal();
+                survey_sites(part.name);
             }
-            tell_report(session.rig().server().report());
+            look_at_report(session);
         }
         wait_for_threads();
-        look_at_settings(conf, dmp);
-        if (!m_refused) write_file(blocks_path + m_part + ".first", text_of(blocks()));
+        look_at_settings(settings_before);
+        m_survey.first = blocks();
     }
 
-    /// Both files, as the unload leaves them: written as in the survey, or not at all. A part that sets them may have
-    /// failed.
-    void look_at_settings(const std::string& conf, const std::string& dmp)
+    void survey_sites(const char* part)
     {
-        const bool may_differ = m_part == "modifications" || m_part == "logs" || m_part.empty();
-        for (const auto& [path, before] : {std::pair(conf_path, conf), std::pair(dmp_path, dmp)}) {
-            const std::string now = read_file(path);
-            const std::string surveyed = settings_path + m_part + (path == conf_path ? ".conf" : ".dmp");
-            if (!m_refused)
-                write_file(surveyed, now);
-            else if (!may_differ && now != before && now != read_file(surveyed))
-                finding("loses settings: " + now);
-        }
-    }
-
-    void count_asks()
-    {
-        for (const Allocation_Site& site : allocation_sites())
-            m_asked[site.id] = site.asked;
+        if (m_ask) return;
+        const std::vector<Allocation_Site> sites = allocation_sites();
+        for (; m_known < sites.size(); m_known++)
+            m_survey.sites.push_back({sites[m_known], part});
     }
 
     /// A refusal that still lies ahead is one of the last part: it waits.
     void look_before_the_end(Session& session)
     {
         end_refusal();
-        if (!m_refused) count_asks();
+        const std::vector<Allocation_Site> sites = allocation_sites();
+        for (std::size_t i = 0; i < m_survey.sites.size(); i++)
+            m_survey.sites[i].site = sites[i];
         look(session);
-        if (!m_refused) m_told = allocation_sites().size(); // what only this asks for is not refused
-        if (m_refused && !refused()) refuse(m_refused->site, m_refused->time, m_refused->refusal);
+        m_known = allocation_sites().size(); // what only this asks for is not refused
+        if (!refused()) begin_refusal();
     }
 
     void load_again()
@@ -226,10 +235,17 @@ private:
             session.run(Session::parts().front());
             look(session);
             session.run(Session::parts().back());
-            tell_report(session.rig().server().report());
+            look_at_report(session);
         }
         wait_for_threads();
-        if (!m_refused) write_file(blocks_path + m_part + ".second", text_of(blocks()));
+        m_survey.second = blocks();
+    }
+
+    void wait_for_threads()
+    {
+        m_watch.step("the end of the module's threads");
+        while (threads_of_module() > 0)
+            std::this_thread::sleep_for(std::chrono::milliseconds(1));
     }
 
     /// From a thread of its own, which owns none of the locks that may be left.
@@ -238,217 +254,120 @@ private:
         std::thread([&] {
             try {
                 const std::string published = without_driver_log(session.published());
-                if (!exists(published_path)) write_file(published_path, published); // the first survey's
-                const std::string expected = read_file(published_path);
+                if (m_survey.published.empty()) m_survey.published = published;
+                const std::string& expected = m_ask ? m_expected->published : m_survey.published;
                 if (published == expected) return;
                 const std::string difference = nvrtest::difference(expected, published);
                 // An agent that could not be built stays so until the next load, and has nothing of the host.
-                if (!m_is_reloaded && m_place == "the first request" && difference.find("\n+") == std::string::npos &&
-                    lines_of_class(published, "NVRHBA_FCPort").empty())
-                    m_teller.tell("idle", "");
+                if (!m_is_reloaded && m_outcome.request == "the first request" &&
+                    difference.find("\n+") == std::string::npos && lines_of_class(published, "NVRHBA_FCPort").empty())
+                    m_outcome.is_idle = true;
                 else
-                    finding("publishes something else:\n" + difference.substr(0, 2000));
+                    m_watch.complain("it publishes something else:\n" + difference.substr(0, 2000));
             } catch (const std::exception& error) {
-                finding(std::string("does not publish: ") + error.what());
+                m_watch.complain(std::string("it does not publish: ") + error.what());
             }
         }).join();
     }
 
-    void tell_report(const host::Report& report)
+    void look_at_report(Session& session)
     {
+        const host::Report report = session.rig().server().report();
         for (const std::string& violation : report.violations)
-            finding("breaks a rule: " + violation);
+            m_watch.complain("it breaks a rule: " + violation);
         if (left_beside_strings(report) != 0 || report.clones_alive() != 0 || report.contexts_not_detached != 0)
-            finding("leaves objects of the server's: " + report.to_text());
+            m_watch.complain("it leaves objects of the server's: " + report.to_text());
     }
 
-    void tell_new_sites(const char* part)
+    /// As the unload leaves them: written as in the survey, or not at all. A part that sets them may have failed.
+    void look_at_settings(const std::vector<std::string>& before)
     {
-        if (m_refused) return;
-        const std::vector<Allocation_Site> sites = allocation_sites();
-        for (; m_told < sites.size(); m_told++)
-            m_parts[m_told] = part;
+        m_survey.settings = settings();
+        if (!m_ask || m_part == "modifications" || m_part == "logs" || m_part.empty()) return;
+        for (std::size_t i = 0; i < before.size(); i++)
+            if (const std::string& now = m_survey.settings[i]; now != before[i] && now != m_expected->settings[i])
+                m_watch.complain("it loses settings: " + now);
     }
 
-    void wait_for_threads()
+    void look_at_blocks()
     {
-        m_teller.tell("at", "the end of the module's threads");
-        while (threads_of_module() > 0)
-            std::this_thread::sleep_for(std::chrono::milliseconds(1));
-    }
-
-    void tell_sites()
-    {
-        const std::vector<Allocation_Site> sites = allocation_sites();
-        for (const auto& [number, part] : m_parts) {
-            const Allocation_Site& site = sites[number];
-            std::ostringstream line;
-            line << part << '\t' << std::hex << site.id << ' ' << std::dec
-                 << std::max<std::uint64_t>(m_asked[site.id], 1) << std::hex;
-            for (const std::uintptr_t frame : site.stack)
-                line << ' ' << frame;
-            m_teller.tell("site", line.str());
+        if (!m_ask) return;
+        Blocks more = m_survey.second;
+        for (const auto& [frame, count] : m_expected->second)
+            more[frame] -= count;
+        std::int64_t sum = 0;
+        std::string places;
+        for (const auto& [frame, count] : more) {
+            sum += count;
+            if (count > 0) places += '\n' + std::to_string(count) + " of @" + hex(frame);
         }
+        if (sum > 0)
+            m_watch.complain("it leaves " + std::to_string(sum) + " blocks more than without a refusal:" + places);
     }
 
-    void tell_what_is_left(const Left& before)
+    void look_at_the_rest(const Left& before)
     {
         const Left after;
         if (after.files != before.files)
-            finding("leaves " + std::to_string(after.files) + " files open, of " + std::to_string(before.files));
+            m_watch.complain("it leaves " + std::to_string(after.files) + " files open, of " +
+                             std::to_string(before.files));
         // The sign that the library has been initialised once stays.
-        if (after.semaphores > 1) finding("leaves " + std::to_string(after.semaphores) + " semaphores");
+        if (after.semaphores > 1) m_watch.complain("it leaves " + std::to_string(after.semaphores) + " semaphores");
     }
 
-    std::string surveyed(const char* load) const { return read_file(blocks_path + m_part + '.' + load); }
-    bool is_as_surveyed(const char* load) const { return text_of(blocks()) == surveyed(load); }
-
-    void tell_blocks()
-    {
-        const Blocks expected = blocks_of(surveyed("second")), found = blocks();
-        std::int64_t more = 0;
-        std::string places;
-        for (const auto& [frame, count] : found) {
-            const auto known = expected.find(frame);
-            const std::int64_t extra = count - (known == expected.end() ? 0 : known->second);
-            more += extra;
-            if (extra > 0) places += "\n" + std::to_string(extra) + " of @" + hex(frame);
-        }
-        for (const auto& [frame, count] : expected)
-            if (found.find(frame) == found.end()) more -= count;
-        if (more > 0) finding("leaves " + std::to_string(more) + " blocks more than without a refusal:" + places);
-    }
-
-    Teller m_teller;
+    Run_Watch& m_watch;
     const std::string m_part;
-    const Refused_Ask* const m_refused;
-    std::string m_request, m_place;
+    const Survey* const m_expected = nullptr; // null in a survey, as is the next
+    const Refused_Ask* const m_ask = nullptr;
+    Survey m_survey; // of this run
+    Short_Outcome m_outcome;
+    std::string m_request;
     bool m_is_reloaded = false;
-    std::size_t m_told = 0;                         // sites that are known, in their order
-    std::map<std::size_t, const char*> m_parts;     // of the session, by the sites that they were the first to ask at
-    std::map<std::uint64_t, std::uint64_t> m_asked; // how often, in the session without the look
-};
-
-// --- In the process that waits
-
-/// The lines that another process tells, as they come.
-class Listener {
-public:
-    Listener(int file, pid_t process, std::chrono::seconds patience)
-        : m_file(file), m_process(process), m_patience(patience)
-    {
-    }
-
-    Short_Run listen()
-    {
-        Short_Run run;
-        std::string last = "the start";
-        for (;;) {
-            pollfd waits{m_file, POLLIN, 0};
-            const int milliseconds = static_cast<int>(std::chrono::milliseconds(m_patience).count());
-            const int ready = ::poll(&waits, 1, milliseconds);
-            if (ready == 0) {
-                ::kill(m_process, SIGKILL);
-                ::waitpid(m_process, nullptr, 0);
-                run.findings.push_back("tells nothing for " + std::to_string(m_patience.count()) + " s at " + last);
-                return run;
-            }
-            char buffer[65536];
-            const ssize_t size = ::read(m_file, buffer, sizeof buffer);
-            if (size <= 0) break;
-            m_rest.append(buffer, static_cast<std::size_t>(size));
-            for (std::size_t end; (end = m_rest.find('\n')) != std::string::npos; m_rest.erase(0, end + 1))
-                take(m_rest.substr(0, end), last, run);
-        }
-        int status = 0;
-        ::waitpid(m_process, &status, 0);
-        if (status != 0)
-            run.findings.push_back((WIFSIGNALED(status) ? std::string("ends by ") + strsignal(WTERMSIG(status))
-                                                        : "ends with " + std::to_string(WEXITSTATUS(status))) +
-                                   " at " + last + '\t' + read_file(words_path));
-        return run;
-    }
-
-private:
-    static void take(const std::string& line, std::string& last, Short_Run& run)
-    {
-        const std::size_t blank = line.find(' ');
-        const std::string word = line.substr(0, blank);
-        const std::string text = line.substr(blank + 1);
-        std::istringstream words(text);
-        if (word == "at") last = text;
-        if (word == "idle") run.is_idle = true;
-        if (word == "finding") run.findings.push_back(text);
-        if (word == "refused") {
-            words >> run.refused;
-            std::getline(words >> std::ws, run.place);
-        }
-        if (word == "site") {
-            Surveyed_Site site;
-            std::getline(words, site.part, '\t');
-            words >> std::hex >> site.site.id >> std::dec >> site.site.asked >> std::hex;
-            for (std::uintptr_t frame; words >> frame;)
-                site.site.stack.push_back(frame);
-            run.sites.push_back(site);
-        }
-    }
-
-    const int m_file;
-    const pid_t m_process;
-    const std::chrono::seconds m_patience;
-    std::string m_rest;
+    std::size_t m_known = 0; // sites, in their order
 };
 
 } // namespace
 
-Short_Runs::Short_Runs(std::size_t frames, std::chrono::seconds patience) : m_patience(patience)
+Surveys hold_surveys(unsigned at_once, std::chrono::milliseconds patience)
 {
-    module_registrations(); // read once for all runs
-    watch_memory_of(NVR_MODULE, frames);
-}
-
-template <class Act>
-Short_Run Short_Runs::in_process(Act act)
-{
-    for (const auto& left : std::filesystem::directory_iterator("/dev/shm"))
-        std::filesystem::remove(left.path()); // of a process that was ended
-    int ends[2];
-    if (::pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("no pipe");
-    const pid_t process = ::fork();
-    if (process < 0) throw std::runtime_error("no process");
-    if (process == 0) {
-        ::close(ends[0]);
-        if (!std::freopen(words_path, "w", stderr)) ::_exit(1);
-        act(ends[1]);
-        std::_Exit(0);
-    }
-    ::close(ends[1]);
-    Short_Run run = Listener(ends[0], process, m_patience).listen();
-    ::close(ends[0]);
-    return run;
-}
-
-Short_Run Short_Runs::survey()
-{
-    const auto survey_part = [this](const std::string& part) {
-        Short_Run survey = in_process([&part](int file) { Course(file, part, nullptr).run(); });
-        if (!survey.findings.empty())
-            throw std::runtime_error("without a refusal the module " + survey.findings.front());
-        if (survey.sites.empty()) throw std::runtime_error("the module asks for no memory");
-        return survey;
+    std::vector<Run> runs;
+    const auto add = [&](const std::string& part) {
+        runs.push_back({part, patience, [part](Run_Watch& watch) { Course(watch, part).run(); }});
     };
-    Short_Run survey = survey_part("");
+    add("");
     for (const Session::Part& part : Session::parts())
-        survey_part(part.name);
-    return survey;
+        add(part.name);
+    Surveys surveys;
+    do_runs(runs, at_once, [&](std::size_t index, const Run_Result& result) {
+        if (!result.failure.empty()) throw std::runtime_error("without a refusal: " + result.failure);
+        surveys[runs[index].name] = Record::read<Survey>(result.told);
+    });
+    for (const auto& [part, survey] : surveys) {
+        if (survey.sites.empty()) throw std::runtime_error("the module asks for no memory");
+        if (survey.published != surveys[""].published)
+            throw std::runtime_error("without a refusal it publishes something else after " + part);
+    }
+    return surveys;
 }
 
-Short_Run Short_Runs::run(const Refused_Ask& refused)
+Run short_run(const Surveys& surveys, const Refused_Ask& ask, std::chrono::milliseconds patience)
 {
-    // Most places ask in their part, whatever comes before it.
-    Short_Run run = in_process([&refused](int file) { Course(file, refused.part, &refused).run(); });
-    if (run.refused != 0 || !run.findings.empty() || refused.part.empty()) return run;
-    return in_process([&refused](int file) { Course(file, "", &refused).run(); });
+    return {hex(ask.place.site.id) + ':' + std::to_string(ask.time), patience, [&surveys, ask](Run_Watch& watch) {
+                const std::string part = ask.is_in_whole ? "" : ask.place.part;
+                Course(watch, part, surveys.at(part), ask).run();
+            }};
+}
+
+Short_Outcome outcome_of(const Run_Result& result)
+{
+    return Record::read<Short_Outcome>(result.told);
+}
+
+std::string hex(std::uint64_t number)
+{
+    std::ostringstream text;
+    text << std::hex << number;
+    return text.str();
 }
 
 } // namespace nvrtest

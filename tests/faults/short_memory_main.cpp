@@ -1,31 +1,22 @@
-// nvr_short_memory: refuses the module each allocation once.
+// The module's memory: refuses the module each allocation once.
 //
 // A survey drives the module through a session and tells each place, by its call stack in the module, that asks for
 // memory. Then there is one session for each of them, in a process of its own, whose first ask there is refused.
 #include <algorithm>
-#include <atomic>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <exception>
-#include <fcntl.h>
-#include <iostream>
 #include <map>
-#include <memory>
-#include <mutex>
 #include <random>
 #include <set>
-#include <sstream>
 #include <stdexcept>
 #include <string>
-#include <sys/wait.h>
-#include <thread>
-#include <unistd.h>
 #include <vector>
 
 #include <CLI/CLI.hpp>
 
 #include "tests/faults/Short_Run.h"
+#include "tests/module/support/Rig.h"
 #include "tests/support/private_host_setup.h"
 
 using namespace nvrtest;
@@ -42,133 +33,7 @@ struct Options {
     unsigned depth = 8;
     unsigned patience = 10;
     bool lists = false;
-    bool works = false; ///< a worker
 };
-
-std::string hex(std::uint64_t number)
-{
-    std::ostringstream text;
-    text << std::hex << number;
-    return text.str();
-}
-
-// --- The worker: it has the private host, and makes one run for each line on its standard input.
-
-int work(const Options& options)
-{
-    std::FILE* answers = ::fdopen(::dup(STDOUT_FILENO), "w");
-    const auto tell = [&](const Short_Run& run) {
-        for (const Surveyed_Site& site : run.sites) {
-            std::fprintf(answers, "site %s\t%s %llu", site.part.c_str(), hex(site.site.id).c_str(),
-                         static_cast<unsigned long long>(site.site.asked));
-            for (const std::uintptr_t frame : site.site.stack)
-                std::fprintf(answers, " %s", hex(frame).c_str());
-            std::fputc('\n', answers);
-        }
-        for (const std::string& finding : run.findings)
-            std::fprintf(answers, "finding %s\n", finding.c_str());
-        std::fprintf(answers, "end %llu %d %s\n", static_cast<unsigned long long>(run.refused), run.is_idle,
-                     run.place.c_str());
-        std::fflush(answers);
-    };
-    Short_Runs runs(options.depth, std::chrono::seconds(options.patience));
-    tell(runs.survey());
-    for (std::string line; std::getline(std::cin, line);) {
-        Refused_Ask refused;
-        bool lasting = false;
-        std::uintptr_t frame = 0;
-        std::istringstream(line) >> std::hex >> refused.site.id >> frame >> std::dec >> refused.time >> lasting >>
-            refused.part;
-        refused.site.stack = {frame};
-        refused.refusal = lasting ? Refusal::lasting : Refusal::once;
-        tell(runs.run(refused));
-    }
-    return 0;
-}
-
-/// A worker as the other side sees it.
-class Worker {
-public:
-    explicit Worker(const Options& options)
-    {
-        int orders[2], answers[2];
-        if (::pipe2(orders, O_CLOEXEC) != 0 || ::pipe2(answers, O_CLOEXEC) != 0) throw std::runtime_error("no pipe");
-        m_process = ::fork();
-        if (m_process < 0) throw std::runtime_error("no process");
-        if (m_process == 0) {
-            ::dup2(orders[0], STDIN_FILENO);
-            ::dup2(answers[1], STDOUT_FILENO);
-            const std::string patience = std::to_string(options.patience);
-            const std::string depth = std::to_string(options.depth);
-            ::execl("/proc/self/exe", "nvr_short_memory", "--work", "--patience", patience.c_str(), "--depth",
-                    depth.c_str(), nullptr);
-            ::_exit(1);
-        }
-        ::close(orders[0]);
-        ::close(answers[1]);
-        m_orders = ::fdopen(orders[1], "w");
-        m_answers = ::fdopen(answers[0], "r");
-    }
-    Worker(const Worker&) = delete;
-    Worker& operator=(const Worker&) = delete;
-    ~Worker()
-    {
-        std::fclose(m_orders);
-        std::fclose(m_answers);
-        ::waitpid(m_process, nullptr, 0);
-    }
-
-    Short_Run survey() { return read(); }
-    Short_Run run(const Refused_Ask& refused)
-    {
-        std::fprintf(m_orders, "%s %s %llu %d %s\n", hex(refused.site.id).c_str(),
-                     hex(refused.site.stack.front()).c_str(), static_cast<unsigned long long>(refused.time),
-                     refused.refusal == Refusal::lasting, refused.part.c_str());
-        std::fflush(m_orders);
-        return read();
-    }
-
-private:
-    Short_Run read()
-    {
-        Short_Run run;
-        char* line = nullptr;
-        std::size_t size = 0;
-        for (;;) {
-            if (::getline(&line, &size, m_answers) < 0) throw std::runtime_error("a worker ended");
-            std::istringstream words(line);
-            std::string word;
-            words >> word;
-            words.get();
-            if (word == "end") {
-                words >> run.refused >> run.is_idle;
-                std::getline(words >> std::ws, run.place);
-                break;
-            }
-            if (word == "finding") {
-                std::string text;
-                std::getline(words, text);
-                run.findings.push_back(text);
-            }
-            if (word == "site") {
-                Surveyed_Site site;
-                std::getline(words, site.part, '\t');
-                words >> std::hex >> site.site.id >> std::dec >> site.site.asked >> std::hex;
-                for (std::uintptr_t frame; words >> frame;)
-                    site.site.stack.push_back(frame);
-                run.sites.push_back(site);
-            }
-        }
-        std::free(line);
-        return run;
-    }
-
-    pid_t m_process;
-    std::FILE* m_orders;
-    std::FILE* m_answers;
-};
-
-// --- The other side
 
 /// Stacks as a person reads them, one frame a line.
 class Symbols {
@@ -199,8 +64,10 @@ private:
     void ask(const std::vector<std::uintptr_t>& frames)
     {
         std::string command = "addr2line -aCpfse " NVR_MODULE;
-        for (const std::uintptr_t frame : frames)
+        for (const std::uintptr_t frame : frames) {
             command += " 0x" + hex(frame - 1); // in the call, not behind it
+            m_names[frame] = "    0x" + hex(frame) + '\n';
+        }
         std::FILE* lines = ::popen((command + " 2>/dev/null").c_str(), "r");
         if (!lines) return;
         char line[4096];
@@ -215,8 +82,7 @@ private:
     std::map<std::uintptr_t, std::string> m_names;
 };
 
-std::vector<std::pair<Surveyed_Site, Refused_Ask>> asks_to_refuse(const Options& options,
-                                                                  std::vector<Surveyed_Site> sites)
+std::vector<Refused_Ask> asks_to_refuse(const Options& options, std::vector<Surveyed_Site> sites)
 {
     std::mt19937_64 chance(options.seed);
     std::uint64_t only = 0, only_time = 1;
@@ -234,44 +100,37 @@ std::vector<std::pair<Surveyed_Site, Refused_Ask>> asks_to_refuse(const Options&
             std::swap(sites[i], sites[i + chance() % (sites.size() - i)]);
         sites.resize(options.sample);
     }
-    std::vector<std::pair<Surveyed_Site, Refused_Ask>> asks;
+    std::vector<Refused_Ask> asks;
     for (const Surveyed_Site& site : sites) {
         const std::uint64_t time = only ? only_time : options.any_time ? 1 + chance() % site.site.asked : 1;
-        asks.push_back(
-            {site, {site.site, time == 1 ? site.part : "", time, options.lasting ? Refusal::lasting : Refusal::once}});
+        // Most places ask first in their part, whatever comes before it; later times count from the load on.
+        asks.push_back({site, time, options.lasting ? Refusal::lasting : Refusal::once, time != 1});
     }
     return asks;
 }
 
 class Campaign {
 public:
-    explicit Campaign(const Options& options) : m_options(options) {}
+    explicit Campaign(const Options& options)
+        : m_options(options), m_patience(options.patience), m_surveys(hold_surveys(options.jobs, m_patience))
+    {
+    }
 
     int run()
     {
-        std::vector<std::unique_ptr<Worker>> workers;
-        for (unsigned i = 0; i < m_options.jobs; i++)
-            workers.push_back(std::make_unique<Worker>(m_options));
-        const Short_Run survey = workers[0]->survey();
-        for (unsigned i = 1; i < m_options.jobs; i++)
-            workers[i]->survey();
-        m_asks = asks_to_refuse(m_options, survey.sites);
-        if (m_options.lists) return list(survey.sites);
-
-        std::vector<std::thread> threads;
-        for (const auto& worker : workers)
-            threads.emplace_back([this, &worker] { serve(*worker); });
-        for (std::thread& thread : threads)
-            thread.join();
+        const std::vector<Surveyed_Site>& sites = m_surveys.at("").sites;
+        const std::vector<Refused_Ask> asks = asks_to_refuse(m_options, sites);
+        if (m_options.lists) return list(sites);
+        refuse_all(refuse_all(asks));
         std::uint64_t asked = 0;
-        for (const Surveyed_Site& site : survey.sites)
+        for (const Surveyed_Site& site : sites)
             asked += site.site.asked;
         std::printf(
             "%zu places asked for memory %llu times; %zu runs, %llu asks refused in %zu of them (%zu of a load, "
-            "which was refused then), %zu with findings\n",
-            survey.sites.size(), static_cast<unsigned long long>(asked), m_asks.size(),
-            static_cast<unsigned long long>(m_refused), m_reached, m_idle, m_found);
-        return m_found == 0 ? 0 : 1;
+            "which was refused then), %zu failed\n",
+            sites.size(), static_cast<unsigned long long>(asked), asks.size(),
+            static_cast<unsigned long long>(m_refused), m_reached, m_idle, m_failed);
+        return m_failed == 0 ? 0 : 1;
     }
 
 private:
@@ -288,57 +147,55 @@ private:
         return 0;
     }
 
-    void serve(Worker& worker)
+    /// Result: those that were not reached in their part, to be refused in the session with all.
+    std::vector<Refused_Ask> refuse_all(const std::vector<Refused_Ask>& asks)
     {
-        for (std::size_t i; (i = m_next++) < m_asks.size();)
-            tell(m_asks[i].first, m_asks[i].second, worker.run(m_asks[i].second));
+        std::vector<Run> runs;
+        for (const Refused_Ask& ask : asks)
+            runs.push_back(short_run(m_surveys, ask, m_patience));
+        std::vector<Refused_Ask> missed;
+        do_runs(runs, m_options.jobs, [&](std::size_t index, const Run_Result& result) {
+            const Short_Outcome outcome = outcome_of(result);
+            if (outcome.refused == 0 && result.failure.empty() && !asks[index].is_in_whole) {
+                missed.push_back(asks[index]);
+                missed.back().is_in_whole = true;
+                return;
+            }
+            m_refused += outcome.refused;
+            m_reached += outcome.refused != 0;
+            m_idle += outcome.is_idle;
+            if (!result.failure.empty()) {
+                m_failed++;
+                std::printf("FAILED  nvr_short_memory --depth %u%s --only %s\n%s  asked in %s, refused in %s, by\n%s\n",
+                            m_options.depth, m_options.lasting ? " --lasting" : "", runs[index].name.c_str(),
+                            readable(result.failure).c_str(), asks[index].place.part.c_str(), outcome.request.c_str(),
+                            m_symbols.text(asks[index].place.site).c_str());
+            }
+            if (++m_done % 100 == 0) std::printf("%zu done, %zu failed\n", m_done, m_failed);
+        });
+        return missed;
     }
 
-    void tell(const Surveyed_Site& site, const Refused_Ask& ask, const Short_Run& run)
+    /// With names in place of addresses.
+    std::string readable(std::string failure)
     {
-        std::lock_guard<std::mutex> lock(m_mutex);
-        m_done++;
-        m_refused += run.refused;
-        m_reached += run.refused != 0;
-        m_idle += run.is_idle;
-        m_found += !run.findings.empty();
-        if (!run.findings.empty()) {
-            std::printf("\n%s, refused in %s (%s):\n", hex(ask.site.id).c_str(), site.part.c_str(), run.place.c_str());
-            for (const std::string& finding : run.findings)
-                std::printf("  the module %s\n", readable(finding).c_str());
-            std::printf("%s  again: nvr_short_memory --only %s:%llu%s\n", m_symbols.text(site.site).c_str(),
-                        hex(ask.site.id).c_str(), static_cast<unsigned long long>(ask.time),
-                        m_options.lasting ? " --lasting" : "");
-            std::fflush(stdout);
-        }
-        if (::isatty(STDERR_FILENO) || m_done % 100 == 0)
-            std::fprintf(stderr, "%zu of %zu, %zu with findings%s", m_done, m_asks.size(), m_found,
-                         ::isatty(STDERR_FILENO) ? "\r" : "\n");
-    }
-
-    /// With names in place of addresses, and its lines as lines.
-    std::string readable(std::string finding)
-    {
-        for (std::size_t at = 0; (at = finding.find('@', at)) != std::string::npos; at++) {
-            const std::size_t end = std::min(finding.find_first_not_of("0123456789abcdef", at + 1), finding.size());
+        for (std::size_t at = 0; (at = failure.find('@', at)) != std::string::npos; at++) {
+            const std::size_t end = std::min(failure.find_first_not_of("0123456789abcdef", at + 1), failure.size());
             if (end - at < 5) continue;
             Allocation_Site site;
-            site.stack = {std::stoul(finding.substr(at + 1, end - at - 1), nullptr, 16)};
+            site.stack = {std::stoul(failure.substr(at + 1, end - at - 1), nullptr, 16)};
             std::string name = m_symbols.text(site).substr(4);
             name.pop_back();
-            finding.replace(at, end - at, name);
+            failure.replace(at, end - at, name);
         }
-        for (std::size_t at = 0; (at = finding.find('\t', at)) != std::string::npos;)
-            finding.replace(at, 1, "\n    ");
-        return finding;
+        return failure;
     }
 
     const Options& m_options;
-    std::vector<std::pair<Surveyed_Site, Refused_Ask>> m_asks;
-    std::atomic<std::size_t> m_next{0};
-    std::mutex m_mutex;
+    const std::chrono::seconds m_patience;
+    const Surveys m_surveys;
     Symbols m_symbols;
-    std::size_t m_done = 0, m_reached = 0, m_idle = 0, m_found = 0;
+    std::size_t m_done = 0, m_reached = 0, m_idle = 0, m_failed = 0;
     std::uint64_t m_refused = 0;
 };
 
@@ -359,18 +216,17 @@ int main(int argc, char** argv)
     app.add_option("--depth", options.depth, "Frames of the module that tell places apart")
         ->capture_default_str()
         ->check(CLI::Range(1, 16));
-    app.add_option("--patience", options.patience, "Seconds without a sign of life that end a session")
-        ->capture_default_str();
+    app.add_option("--patience", options.patience, "Seconds that a step of a session may take")->capture_default_str();
     app.add_flag("--list", options.lists, "Only tell the places");
-    app.add_flag("--work", options.works)->group("");
     CLI11_PARSE(app, argc, argv);
+    std::setvbuf(stdout, nullptr, _IOLBF, 0);
     try {
-        if (!options.works) return Campaign(options).run();
-        ::setenv("TMPDIR", "/var/log", 1);
         enter_private_host(argv);
-        return work(options);
+        module_registrations(); // read once for all runs
+        watch_memory_of(NVR_MODULE, options.depth);
+        return Campaign(options).run();
     } catch (const std::exception& error) {
         std::fprintf(stderr, "nvr_short_memory: %s\n", error.what());
-        return 1;
+        return 2;
     }
 }
