@@ -2,10 +2,18 @@
 
 #include <atomic>
 #include <cstdint>
+#include <cstring>
 #include <new>
 #include <sys/mman.h>
 
-#if defined(__SANITIZE_ADDRESS__)
+#if defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define NVR_ADDRESS_SANITIZER
+#endif
+#elif defined(__SANITIZE_ADDRESS__)
+#define NVR_ADDRESS_SANITIZER
+#endif
+#ifdef NVR_ADDRESS_SANITIZER
 #include <sanitizer/asan_interface.h>
 #include <sanitizer/lsan_interface.h>
 #endif
@@ -23,27 +31,48 @@ constexpr std::size_t being_cut = SIZE_MAX / 2;
 
 thread_local Blocks* in_use = nullptr;
 
-// What the sanitizers know of a block.
+// What the address sanitizer knows of a block: nothing of it may be touched but the pieces that are out. In front of
+// each lies its size, which is as forbidden, as a red zone.
 
-#if defined(__SANITIZE_ADDRESS__)
+#ifdef NVR_ADDRESS_SANITIZER
+constexpr std::size_t red_zone = alignment;
+
 void tell_mapped(void* block)
 {
     __lsan_register_root_region(block, block_size);
-    ASAN_POISON_MEMORY_REGION(static_cast<char*>(block) + alignment, block_size - alignment);
 }
 void tell_unmapped(void* block)
 {
     ASAN_UNPOISON_MEMORY_REGION(block, block_size);
     __lsan_unregister_root_region(block, block_size);
 }
-void tell_cut(void* piece, std::size_t size)
+void tell_empty(char* begin, char* end)
 {
-    ASAN_UNPOISON_MEMORY_REGION(piece, size);
+    ASAN_POISON_MEMORY_REGION(begin, static_cast<std::size_t>(end - begin));
+}
+void tell_out(char* piece, std::size_t size)
+{
+    char* front = piece - red_zone;
+    ASAN_UNPOISON_MEMORY_REGION(front, red_zone + size);
+    std::memcpy(front, &size, sizeof size);
+    ASAN_POISON_MEMORY_REGION(front, red_zone);
+}
+void tell_back(char* piece)
+{
+    char* front = piece - red_zone;
+    ASAN_UNPOISON_MEMORY_REGION(front, red_zone);
+    std::size_t size;
+    std::memcpy(&size, front, sizeof size);
+    ASAN_POISON_MEMORY_REGION(front, red_zone + size);
 }
 #else
+constexpr std::size_t red_zone = 0;
+
 void tell_mapped(void*) {}
 void tell_unmapped(void*) {}
-void tell_cut(void*, std::size_t) {}
+void tell_empty(char*, char*) {}
+void tell_out(char*, std::size_t) {}
+void tell_back(char*) {}
 #endif
 
 void* map_block() noexcept
@@ -53,7 +82,7 @@ void* map_block() noexcept
     char* start = static_cast<char*>(mapped);
     const std::size_t before = (block_size - reinterpret_cast<std::uintptr_t>(start) % block_size) % block_size;
     if (before) munmap(start, before);
-    if (before != block_size) munmap(start + before + block_size, block_size - before);
+    munmap(start + before + block_size, block_size - before);
     return start + before;
 }
 
@@ -93,21 +122,20 @@ void* Blocks::allocate(std::size_t size, bool& is_cut)
 
 void Blocks::deallocate(void* piece, bool is_cut) noexcept
 {
-    if (is_cut)
-        Block::of(piece)->count_down(1);
-    else
-        ::operator delete(piece);
+    if (!is_cut) return ::operator delete(piece);
+    tell_back(static_cast<char*>(piece));
+    Block::of(piece)->count_down(1);
 }
 
 void* Blocks::cut(std::size_t size) noexcept
 {
     if (size > largest_piece) return nullptr;
-    const std::size_t room = (size + alignment - 1) & ~(alignment - 1);
+    const std::size_t room = red_zone + ((size + alignment - 1) & ~(alignment - 1));
     if (static_cast<std::size_t>(m_end - m_next) < room && !open()) return nullptr;
-    void* piece = m_next;
+    char* piece = m_next + red_zone;
     m_next += room;
     ++m_pieces;
-    tell_cut(piece, size);
+    tell_out(piece, size);
     return piece;
 }
 
@@ -123,6 +151,7 @@ void Blocks::start() noexcept
     m_next = reinterpret_cast<char*>(m_block + 1);
     m_end = reinterpret_cast<char*>(m_block) + block_size;
     m_pieces = 0;
+    tell_empty(m_next, m_end);
 }
 
 bool Blocks::open() noexcept

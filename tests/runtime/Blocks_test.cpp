@@ -7,6 +7,10 @@
 #include <thread>
 #include <vector>
 
+#ifdef __SANITIZE_ADDRESS__
+#include <sanitizer/asan_interface.h>
+#endif
+
 #include "runtime/Blocks.h"
 #include "runtime/Instance.h"
 #include "tests/runtime/Test_Classes.h"
@@ -30,6 +34,11 @@ void* __wrap_mmap(void* place, std::size_t size, int protection, int flags, int 
 namespace {
 
 constexpr std::uintptr_t block_size = std::uintptr_t{2} << 20;
+#ifdef __SANITIZE_ADDRESS__
+constexpr std::size_t red_zone = 16; // between two pieces
+#else
+constexpr std::size_t red_zone = 0;
+#endif
 
 std::uintptr_t block_of(const void* piece)
 {
@@ -69,11 +78,29 @@ TEST(Blocks, CutsPiecesOneBehindTheOtherAlignedForAnyType)
         EXPECT_EQ(reinterpret_cast<std::uintptr_t>(place) % alignof(std::max_align_t), 0u);
         if (end) {
             EXPECT_GE(place, end);
-            EXPECT_LT(place, end + alignof(std::max_align_t));
+            EXPECT_LT(place, end + red_zone + alignof(std::max_align_t));
         }
         end = place + size;
     }
 }
+
+#ifdef __SANITIZE_ADDRESS__
+TEST(Blocks, HidesNothingFromTheAddressSanitizer)
+{
+    Blocks blocks;
+    const auto first = piece(&blocks, 16);
+    auto second = piece(&blocks, 32), third = piece(&blocks, 20);
+    char* const gone = static_cast<char*>(second->place);
+    EXPECT_EQ(__asan_region_is_poisoned(gone, 32), nullptr);
+    EXPECT_TRUE(__asan_address_is_poisoned(static_cast<char*>(first->place) + 16)) << "behind a piece";
+    EXPECT_TRUE(__asan_address_is_poisoned(static_cast<char*>(third->place) - 1)) << "in front of a piece";
+    second.reset();
+    EXPECT_TRUE(__asan_address_is_poisoned(gone)) << "a piece that was given back";
+    EXPECT_TRUE(__asan_address_is_poisoned(gone + 31));
+    third.reset();
+    EXPECT_EQ(__asan_region_is_poisoned(first->place, 16), nullptr);
+}
+#endif
 
 TEST(Blocks, TakesTheHeapOutsideOfAUseAndForALargePiece)
 {
