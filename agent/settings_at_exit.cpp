@@ -47,7 +47,7 @@ void saveAtEnd()
 {
     const Auto_Mutex lock(mutex);
     if (NvrConfigFile* config = std::exchange(living, nullptr)) {
-        CLogger::instance()->saveSettings();
+        CLogger::instance()->saveSettingsAtEnd();
         config->saveForGood();
     }
 }

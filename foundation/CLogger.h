@@ -19,6 +19,7 @@
 
 namespace cimple {
 
+class Line_Reader;
 class NVR_SysLogger;
 
 enum NVR_LogLevel : sint32 { NVR_INVALID = 0, NVR_CRIT = 1, NVR_WARN = 2, NVR_ERR = 3, NVR_INFO = 4, NVR_DBG = 5 };
@@ -63,7 +64,10 @@ public:
     /// Writes mode, level, enabled flag and the trace file's path (of the first attached NVR_FileLogger) to
     /// "/etc/norvane_fc_provider.dmp". A file that cannot be opened is logged and that is all.
     void saveSettings();
-    /// The same for a process that ends: logs nothing, and leaves the file as it is if another thread keeps the
+    /// The same at the end of a life, but for a file that could not be read and that nobody has written since: what it
+    /// holds would be lost.
+    void saveSettingsAtEnd();
+    /// As at the end, for a process that ends: logs nothing, and leaves the file as it is if another thread keeps the
     /// dispatch mutex.
     void saveSettingsAtExit();
 
@@ -93,12 +97,14 @@ private:
     bool setTracePath(const char* path);
     String tracePath() const;
     bool writeSettings() const;
+    void applySettings(Line_Reader& file);
 
     std::atomic<uint32> m_mode{0};
     std::atomic<sint32> m_level{0};
     std::atomic<sint32> m_enabled{0};
     std::vector<NVR_LoggerInterface*> m_loggers;
-    bool m_ending = false; ///< the exit has written the settings: no other thread truncates them any more
+    std::atomic<bool> m_unread{false}; ///< the settings file holds what nobody knows
+    bool m_ending = false;             ///< the exit has written the settings: no other thread truncates them any more
 
     template <class>
     friend class Immortal;

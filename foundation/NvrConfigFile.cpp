@@ -75,6 +75,7 @@ void NvrConfigFile::load(const char* path)
         if (errno == ENOENT) return; // also a stale one: only errno is tested
     }
     Line_Reader file(m_path.c_str());
+    m_unread = file.has_failed();
     if (!file.is_open()) {
         NVR_LOG("Unable to open provider config setting file - %s", m_path.c_str());
         return;
@@ -97,6 +98,7 @@ void NvrConfigFile::load(const char* path)
         else if (!seen_san_data && std::strcmp(key, key_refresh_san_data) == 0)
             seen_san_data = read_flag(value, m_refreshSANData);
     }
+    m_unread = file.has_failed();
 }
 
 void NvrConfigFile::save()
@@ -120,7 +122,7 @@ void NvrConfigFile::saveForGood()
 {
     if (m_saved_for_good) return;
     m_saved_for_good = true;
-    save();
+    if (!m_unread) save();
 }
 
 uint32 NvrConfigFile::getCacheTimeout() const
@@ -142,6 +144,7 @@ int NvrConfigFile::setCacheTimeout(uint32 minutes)
 {
     if (minutes < min_cache_timeout || minutes > max_cache_timeout) return -1;
     m_cacheTimeout = minutes;
+    m_unread = false;
     return 0;
 }
 
@@ -149,6 +152,7 @@ int NvrConfigFile::setRefreshAdapterData(uint32 flag)
 {
     if (flag > 1) return -1;
     m_refreshAdapterData = flag == 1;
+    m_unread = false;
     return 0;
 }
 
@@ -156,6 +160,7 @@ int NvrConfigFile::setRefreshSANData(uint32 flag)
 {
     if (flag > 1) return -1;
     m_refreshSANData = flag == 1;
+    m_unread = false;
     return 0;
 }
 

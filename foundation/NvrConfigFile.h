@@ -15,7 +15,7 @@ namespace cimple {
 class NvrConfigFile {
 public:
     NvrConfigFile() = default;
-    /// Saves, unless that was done for good.
+    /// Saves for good, unless that was done.
     ~NvrConfigFile();
     NvrConfigFile(const NvrConfigFile&) = delete;
     NvrConfigFile& operator=(const NvrConfigFile&) = delete;
@@ -25,7 +25,9 @@ public:
     void load(const char* path);
     /// Writes the file anew at the stored path, if it can be opened.
     void save();
-    /// The same once: the object leaves the file alone afterwards. Not to be called by two threads at once.
+    /// The same once: the object leaves the file alone afterwards. So it does at once where the file could not be read
+    /// and no value was set since: the defaults in force are not what the administrator wrote there. Not to be called
+    /// by two threads at once.
     void saveForGood();
 
     /// Minutes, 1 to 30.
@@ -44,6 +46,7 @@ private:
     std::atomic<uint32> m_cacheTimeout{10};
     String m_path;
     bool m_saved_for_good = false;
+    std::atomic<bool> m_unread{false}; ///< the file holds what nobody knows
 };
 
 /// The agent's settings file.

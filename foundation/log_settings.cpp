@@ -45,7 +45,13 @@ void CLogger::saveSettings()
         const Hold hold;
         written = m_ending || writeSettings();
     }
+    m_unread = false;
     if (!written) NVR_LOG("Unable to open file for storing config data");
+}
+
+void CLogger::saveSettingsAtEnd()
+{
+    if (!m_unread) saveSettings();
 }
 
 void CLogger::saveSettingsAtExit()
@@ -53,7 +59,7 @@ void CLogger::saveSettingsAtExit()
     const Hold hold(std::try_to_lock);
     if (!hold.held()) return;
     m_ending = true;
-    static_cast<void>(writeSettings());
+    if (!m_unread) static_cast<void>(writeSettings());
 }
 
 void CLogger::loadSettings()
@@ -62,11 +68,15 @@ void CLogger::loadSettings()
     struct stat status;
     if (::stat(log_settings_path, &status) != 0) return;
     Line_Reader file(log_settings_path);
-    if (!file.is_open()) {
+    if (file.is_open())
+        applySettings(file);
+    else
         NVR_LOG("Unable to open config data file - %s", log_settings_path);
-        return;
-    }
+    m_unread = file.has_failed();
+}
 
+void CLogger::applySettings(Line_Reader& file)
+{
     char line[20];
     if (!file.read(line)) return;
     char* rest = nullptr;

@@ -1,8 +1,10 @@
 #include "foundation/open_file.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/uio.h>
 #include <unistd.h>
 
 namespace cimple {
@@ -26,14 +28,18 @@ File stream_of(int fd, const char* mode)
     return file;
 }
 
-/// Writes all of it; false, with errno set, once something is refused.
-bool write_all(int fd, std::string_view bytes)
+/// Writes all of it, with the first call if the system lets it; false, with errno set, once something is refused.
+bool write_all(int fd, std::string_view bytes, std::string_view rest = {})
 {
-    while (!bytes.empty()) {
-        const ssize_t written = ::write(fd, bytes.data(), bytes.size());
+    while (!bytes.empty() || !rest.empty()) {
+        const iovec parts[] = {{const_cast<char*>(bytes.data()), bytes.size()},
+                               {const_cast<char*>(rest.data()), rest.size()}};
+        const ssize_t written = ::writev(fd, parts, 2);
         if (written < 0 && errno == EINTR) continue;
         if (written <= 0) return false;
-        bytes.remove_prefix(static_cast<std::size_t>(written));
+        const auto size = static_cast<std::size_t>(written);
+        rest.remove_prefix(size - std::min(size, bytes.size()));
+        bytes.remove_prefix(std::min(size, bytes.size()));
     }
     return true;
 }
@@ -78,7 +84,10 @@ File open_file(const char* path, const char* mode)
     return fd < 0 ? nullptr : stream_of(fd, mode);
 }
 
-Line_Reader::Line_Reader(const char* path) : m_fd(::open(path, O_RDONLY | always)) {}
+Line_Reader::Line_Reader(const char* path)
+    : m_fd(::open(path, O_RDONLY | always)), m_failed(m_fd < 0 && errno != ENOENT)
+{
+}
 
 Line_Reader::~Line_Reader()
 {
@@ -93,6 +102,7 @@ int Line_Reader::next()
         do
             size = ::read(m_fd, m_bytes, sizeof m_bytes);
         while (size < 0 && errno == EINTR);
+        if (size < 0) m_failed = true;
         if (size <= 0) return EOF;
         m_at = 0;
         m_end = static_cast<std::size_t>(size);
@@ -123,7 +133,7 @@ bool write_text(const char* path, std::string_view text, std::string_view rest)
 {
     const int fd = ::open(path, O_WRONLY | O_CREAT | O_TRUNC | always, 0666);
     if (fd < 0) return false;
-    if (write_all(fd, text)) write_all(fd, rest);
+    write_all(fd, text, rest);
     ::close(fd);
     return true;
 }

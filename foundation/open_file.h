@@ -27,25 +27,30 @@ public:
     Line_Reader& operator=(const Line_Reader&) = delete;
 
     bool is_open() const { return m_fd >= 0; }
-    /// As fgets: a line with its end, or as much of it as there is room for; false at the end of the file.
+    /// As fgets: a line with its end, or as much of it as there is room for; false at the end of the file, or of what
+    /// could be read of it.
     template <std::size_t Size>
     bool read(char (&line)[Size])
     {
         return read(line, Size);
     }
 
+    /// Something of the file was not read: it could not be opened, or a read was refused. That it is not there is none.
+    bool has_failed() const { return m_failed; }
+
 private:
     bool read(char* line, std::size_t size);
     int next();
 
     const int m_fd;
+    bool m_failed;
     char m_bytes[512];
     std::size_t m_at = 0, m_end = 0;
 };
 
 /// Empties the file or makes it, and writes the text and what comes behind it; false if it cannot be opened, with errno
-/// set. What does not fit is lost. Asks for no memory and takes no lock, also none of the C library's: to be called by
-/// a process that ends, too.
+/// set. Both in one write, so that no reader finds the one without the other; what does not fit is lost. Asks for no
+/// memory and takes no lock, also none of the C library's: to be called by a process that ends, too.
 bool write_text(const char* path, std::string_view text, std::string_view rest = {});
 
 /// As open_file, for paths that clients name, which may lead anywhere: as fopen with mode "rb" or "wb", but for regular

@@ -220,6 +220,35 @@ TEST(ConfigFileEnd, SavesAlsoWhereNoFileWas)
     }
 }
 
+TEST(ConfigFileEnd, KeepsAFileThatCouldNotBeRead)
+{
+    const std::string kept = written(7, "TRUE", "FALSE");
+    write_file(path, kept);
+    const auto load_without_descriptors = [](NvrConfigFile& config) {
+        const No_Descriptors none;
+        errno = 0;
+        config.load(provider_config_path);
+    };
+    {
+        NvrConfigFile config;
+        load_without_descriptors(config);
+        EXPECT_EQ(config.getCacheTimeout(), 10u);
+    }
+    EXPECT_EQ(read_file(path), kept);
+    {
+        NvrConfigFile config;
+        load_without_descriptors(config);
+        EXPECT_EQ(config.setCacheTimeout(31), -1);
+    }
+    EXPECT_EQ(read_file(path), kept);
+    {
+        NvrConfigFile config;
+        load_without_descriptors(config);
+        EXPECT_EQ(config.setCacheTimeout(30), 0) << "a client wants this one";
+    }
+    EXPECT_EQ(read_file(path), written(30, "FALSE", "TRUE"));
+}
+
 TEST(ConfigFileEnd, WithoutALoadWritesNothing)
 {
     {

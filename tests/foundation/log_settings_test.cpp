@@ -281,6 +281,29 @@ TEST_F(LogSettings, AreSavedAtExitWithoutAWord)
     remove(settings);
 }
 
+TEST_F(LogSettings, StayAsTheyAreAtTheEndIfTheyCouldNotBeRead)
+{
+    write_file(settings, "2,5,1\n" + trace);
+    const auto load_without_descriptors = [] {
+        const No_Descriptors none;
+        logger().loadSettings();
+    };
+    load_without_descriptors();
+    expect(0, 0, false);
+    logger().saveSettingsAtEnd();
+    EXPECT_EQ(read_file(settings), "2,5,1\n" + trace);
+    logger().saveSettings(); // a client changed them
+    EXPECT_EQ(read_file(settings), "0,0,0\n");
+    logger().setLevel(5);
+    logger().saveSettingsAtEnd();
+    EXPECT_EQ(read_file(settings), "0,5,0\n") << "and so they are known again";
+
+    write_file(settings, "2,5,1\n" + trace);
+    load_without_descriptors();
+    logger().saveSettingsAtExit();
+    EXPECT_EQ(read_file(settings), "2,5,1\n" + trace);
+}
+
 TEST_F(LogSettings, StayAsTheyAreAtExitIfAnotherThreadKeepsTheLogger)
 {
     write_file(settings, "as it was");

@@ -58,14 +58,27 @@ TEST(LineReader, ReadsAsFgetsDoes)
 
 TEST(LineReader, OfWhatIsNotThereOrNoFile)
 {
-    EXPECT_FALSE(Line_Reader("/var/log/missing").is_open());
+    Line_Reader missing("/var/log/missing");
+    EXPECT_FALSE(missing.is_open());
     EXPECT_EQ(errno, ENOENT);
+    EXPECT_FALSE(missing.has_failed());
     char line[20];
     Line_Reader folder("/var/log");
+    EXPECT_FALSE(folder.has_failed());
     EXPECT_FALSE(folder.read(line));
+    EXPECT_TRUE(folder.has_failed());
     ASSERT_EQ(::mkfifo(opened.c_str(), 0600), 0);
     Line_Reader fifo(opened.c_str());
     EXPECT_FALSE(fifo.read(line)) << "it waited for a writer";
+}
+
+TEST(LineReader, TellsWhatCannotBeOpenedFromWhatIsNotThere)
+{
+    write_file(opened, "one\n");
+    const No_Descriptors none;
+    Line_Reader file(opened.c_str());
+    EXPECT_FALSE(file.is_open());
+    EXPECT_TRUE(file.has_failed());
 }
 
 TEST(OpenRegularFile, ReadsWritesAndMakesFiles)

@@ -99,6 +99,19 @@ void make_unopenable(const std::string& path)
     bind_over(cover, path);
 }
 
+No_Descriptors::No_Descriptors()
+{
+    if (::getrlimit(RLIMIT_NOFILE, &m_limit) != 0) fail("read the limit of descriptors");
+    rlimit none = m_limit;
+    none.rlim_cur = 0;
+    if (::setrlimit(RLIMIT_NOFILE, &none) != 0) fail("take the descriptors away");
+}
+
+No_Descriptors::~No_Descriptors()
+{
+    ::setrlimit(RLIMIT_NOFILE, &m_limit);
+}
+
 Small_Disk::Small_Disk(std::string folder) : m_folder(std::move(folder))
 {
     if (::mount("tmpfs", m_folder.c_str(), "tmpfs", 0, "size=64k,mode=0755") != 0) fail("a disk on " + m_folder);

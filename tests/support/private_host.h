@@ -7,6 +7,7 @@
 #pragma once
 
 #include <string>
+#include <sys/resource.h>
 
 namespace nvrtest {
 
@@ -28,6 +29,18 @@ void link(const std::string& target, const std::string& path);
 /// opened.
 void cover_file(const std::string& path, const std::string& content);
 void make_unopenable(const std::string& path);
+
+/// While it lives, this process can open nothing: it has no descriptors left.
+class No_Descriptors {
+public:
+    No_Descriptors();
+    ~No_Descriptors();
+    No_Descriptors(const No_Descriptors&) = delete;
+    No_Descriptors& operator=(const No_Descriptors&) = delete;
+
+private:
+    rlimit m_limit;
+};
 
 /// A disk of 64 KiB over an existing folder; gone, with all that is on it, at the object's end.
 class Small_Disk {
