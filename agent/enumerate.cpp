@@ -1,5 +1,7 @@
 #include "agent/enumerate.h"
 
+#include <cstdint>
+
 #include "agent/Agent_Wait.h"
 #include "foundation/CLogger.h"
 #include "runtime/Selection.h"
@@ -53,9 +55,9 @@ bool copyMap(const Instance_Map& source, Instance_Map& copies, const Enum_Handle
 void prefetch(const Instance* instance, std::size_t size)
 {
     constexpr std::size_t line = 64;
-    const char* place = reinterpret_cast<const char*>(instance);
+    const auto place = reinterpret_cast<std::uintptr_t>(instance); // what is behind it is no part of the object
     for (std::size_t i = 0; i < size; i += line)
-        __builtin_prefetch(place + i);
+        __builtin_prefetch(reinterpret_cast<const void*>(place + i));
 }
 
 /// Elements of a map that nobody writes to, each held by a count.

@@ -80,6 +80,7 @@ Ref<NVRHBA_SCSIProtocolEndpoint> SAN_Update::makeEndpoint(Target_Scope& scope)
     const Blocks::Use use(&m_agent.m_SANEndpointBlocks);
     const Target& target = scope.target;
     auto endpoint = make<NVRHBA_SCSIProtocolEndpoint>(m_nameSpace);
+    // The units say it too, and come later: made here, it lies with what else the endpoint says.
     scope.inquiry = text("%.8s %.16s Revision %.4s Serial Number %.40s", target.Vendor.c_str(), target.Product.c_str(),
                          target.Revision.c_str(), target.SerialNumber.c_str());
     set(endpoint->TargetWWPN, m_texts(target.PortName));

@@ -9,7 +9,6 @@
 #include <cmpift.h>
 
 #include <atomic>
-#include <pthread.h>
 #include <type_traits>
 #include <utility>
 
@@ -111,7 +110,7 @@ private:
     friend class Running_Call;
 
     std::atomic<uint32> m_users;
-    Mutex m_calls_mutex{false, "m_calls_mutex", Lock_Place::innermost}; // innermost; guards the next three
+    Mutex m_calls_mutex{false, "m_calls_mutex", Lock_Place::innermost}; // guards the next three
     Cond m_call_ended;
     uint32 m_calls = 0; // that run
     bool m_unloaded = false;
@@ -131,8 +130,9 @@ public:
     CMPI_Adapter* get() const { return m_adapter; }
     CMPI_Adapter* operator->() const { return m_adapter; }
     CMPI_Adapter& operator*() const { return *m_adapter; }
-    /// Takes over a count, resp. hands it over.
+    /// Takes over a count.
     void adopt(CMPI_Adapter* adapter) { m_adapter = adapter; }
+    /// Hands it over.
     CMPI_Adapter* release() { return std::exchange(m_adapter, nullptr); }
     void give_back();
 

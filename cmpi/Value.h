@@ -74,7 +74,7 @@ public:
     const Array_Base* get_scalars() const;
     const void* data() const { return m_at; }
 
-    /// Appends to a Value that is (and owns) an array of scalars, resp. of instances (counted up, null allowed).
+    /// Appends to a Value that is (and owns) an array of scalars, or of instances (counted up, null allowed).
     void append(const Value& scalar);
     void append(Instance* instance);
     void set_not_null() { m_null = false; }

@@ -51,7 +51,7 @@ struct Report {
     /// One line each, in order of appearance; at most 1,000 are kept.
     std::vector<std::string> violations;
     std::uint64_t violation_count = 0;
-    /// Most objects that lived at once since the last reset, to within 16 for each thread.
+    /// Most objects that lived at once since the last reset, to within 16 for each shard of the count.
     std::uint64_t peak_objects = 0;
     /// Contexts of prepareAttachThread that were neither detached nor released.
     std::uint64_t contexts_not_detached = 0;

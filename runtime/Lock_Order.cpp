@@ -36,9 +36,9 @@ const char* name_at(unsigned node)
     return names[node].load(std::memory_order_relaxed);
 }
 
-bool was_locked_under(unsigned inner, unsigned outer)
+bool was_locked_under(unsigned inner, unsigned outer, std::memory_order order)
 {
-    return locked_under[outer][inner / word_bits].load(std::memory_order_relaxed) >> inner % word_bits & 1;
+    return locked_under[outer][inner / word_bits].load(order) >> inner % word_bits & 1;
 }
 
 [[noreturn]] void end_process()
@@ -66,10 +66,11 @@ struct Way {
     bool find(unsigned inner, unsigned outer)
     {
         tried.set(outer);
-        bool found = was_locked_under(inner, outer);
+        bool found = was_locked_under(inner, outer, std::memory_order_seq_cst);
         if (found) nodes[length++] = inner;
         for (unsigned between = 0; !found && between < max_names && name_at(between); between++)
-            found = was_locked_under(between, outer) && !tried[between] && find(inner, between);
+            found =
+                was_locked_under(between, outer, std::memory_order_seq_cst) && !tried[between] && find(inner, between);
         if (found) nodes[length++] = outer;
         return found;
     }
@@ -79,7 +80,7 @@ struct Way {
 /// first: of two threads that come from both sides at once, one sees the other.
 void observe(unsigned inner, unsigned outer)
 {
-    if (was_locked_under(inner, outer)) return;
+    if (was_locked_under(inner, outer, std::memory_order_relaxed)) return;
     locked_under[outer][inner / word_bits].fetch_or(std::uint64_t{1} << inner % word_bits);
     Way back;
     if (!back.find(outer, inner)) return;

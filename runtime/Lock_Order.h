@@ -6,7 +6,8 @@
 /// rule, or locks a plain mutex twice, ends a debug process with the names on standard error, whether or not it would
 /// have waited that time. Other builds have nothing of it, not even the names.
 ///
-/// The check itself takes no lock, so that it hides no race from the thread sanitizer.
+/// The check itself takes no lock, and orders threads only where one lock is first seen under another: so it hides
+/// hardly a race from the thread sanitizer.
 #pragma once
 
 #ifdef NORVANE_LOCK_ORDER
@@ -44,8 +45,9 @@ public:
 
     /// The calling thread is about to wait for it. Ends the process if it must not.
     void check() const;
-    /// It has it, resp. is about to let go of it.
+    /// It has it.
     void taken() const;
+    /// It is about to let go of it.
     void given() const;
 
 private:
