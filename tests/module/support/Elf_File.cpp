@@ -65,6 +65,7 @@ void Elf_File::read_symbols(std::size_t at, std::size_t size, std::size_t string
     for (std::size_t i = 1; i < size / sizeof(Elf64_Sym); i++) {
         const auto symbol = record<Elf64_Sym>(at + i * sizeof(Elf64_Sym));
         const int visibility = ELF64_ST_VISIBILITY(symbol.st_other);
+        if (symbol.st_shndx == SHN_UNDEF) m_imported.push_back(text(strings + symbol.st_name));
         if (symbol.st_shndx == SHN_UNDEF || (visibility != STV_DEFAULT && visibility != STV_PROTECTED)) continue;
         m_exported.push_back(text(strings + symbol.st_name));
         m_symbols.push_back({m_exported.back(), at + i * sizeof(Elf64_Sym)});

@@ -18,6 +18,8 @@ public:
     std::uint64_t dynamic_entry(std::int64_t tag) const;
     /// Functions that run when it is loaded.
     std::size_t initializers() const;
+    /// Names that it looks for in others.
+    const std::vector<std::string>& imported() const { return m_imported; }
     /// Libraries that it names.
     const std::vector<std::string>& needed() const { return m_needed; }
     /// True if an address of the loaded file lies in what is made read-only when relocation is done.
@@ -47,7 +49,7 @@ private:
     std::vector<Symbol> m_symbols; // that it defines
     std::vector<Range> m_read_only;
     std::vector<Entry> m_dynamic;
-    std::vector<std::string> m_exported, m_needed;
+    std::vector<std::string> m_exported, m_imported, m_needed;
 };
 
 } // namespace nvrtest
