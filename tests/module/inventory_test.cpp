@@ -340,6 +340,38 @@ TEST(InventoryOfBrokenSensors, LeavesTemperaturesNull)
     EXPECT_EQ(packages.instances[0].get("TemperatureUnit").as_text(), "Celsius");
 }
 
+// What the first port measures as 0, the second one does not tell; and each sees a unit that does not tell its size.
+TEST(InventoryOfZeros, TellsThemFromWhatIsMissing)
+{
+    Rig rig({host::Manner::strict(), R"(
+[[adapter]]
+[[adapter.port]]
+transceiver = { temperature = 0.0, tx_bias = 0.0, tx_power = 0.0, rx_power = 0.0 }
+statistics = { 1030 = 0, 1041 = 0 }
+[[adapter]]
+[[adapter.port]]
+transceiver = { diagnostics = false }
+statistics = { 1030 = false, 1041 = -1 }
+[[target]]
+[[target.lun]]
+[[target.lun]]
+number = 1
+capacity_status = 1
+)"});
+    const auto values = [&](const char* class_name, const char* property) {
+        std::vector<std::string> texts;
+        for (const host::Instance& instance : rig.enumerate(class_name).instances)
+            texts.push_back(instance.get(property).is_null() ? "none" : instance.get(property).to_text());
+        return texts;
+    };
+    for (const char* reading : {"Temperature", "TxBiasCurrent", "TxPower", "RxPower"})
+        EXPECT_THAT(values("NVRHBA_Transceiver", reading), testing::ElementsAre("0", "none")) << reading;
+    for (const char* counter : {"PacketsTransmitted", "LossOfSyncCounter"})
+        EXPECT_THAT(values("NVRHBA_FCPortStatistics", counter), testing::ElementsAre("0", "4294967295")) << counter;
+    EXPECT_THAT(values("NVRHBA_StorageVolume", "NumberOfBlocks"),
+                testing::ElementsAre("16777215", "none", "16777215", "none"));
+}
+
 TEST(InventoryWithoutPCIRegisters, PublishesADeviceOfZeros)
 {
     Rig rig;
