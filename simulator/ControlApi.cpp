@@ -182,6 +182,11 @@ NVRSIM_EXPORT void nvrsim_drain_events(void)
     Events::instance().drain();
 }
 
+NVRSIM_EXPORT size_t nvrsim_threads(void)
+{
+    return Events::instance().threads();
+}
+
 NVRSIM_EXPORT size_t nvrsim_get(const char* port, const char* name, char* buffer, size_t size)
 {
     return guarded<size_t>(0, [&] {

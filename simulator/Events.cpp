@@ -64,10 +64,15 @@ size_t Events::registered()
     return m_registrations.size();
 }
 
+size_t Events::threads()
+{
+    std::lock_guard<std::mutex> lock(m_mutex);
+    return m_started;
+}
+
 void Events::deliver()
 {
-    // So that whoever counts threads can tell it from the caller's: it stays until the process ends.
-    pthread_setname_np(pthread_self(), "nvrsim-events");
+    pthread_setname_np(pthread_self(), "nvrsim-events"); // it stays until the process ends
     std::unique_lock<std::mutex> lock(m_mutex);
     for (;;) {
         m_changed.wait(lock, [&] { return !m_queue.empty(); });

@@ -25,6 +25,8 @@ public:
     /// Waits until all events posted so far are delivered. Not to be called from a callback.
     void drain();
     size_t registered();
+    /// That deliver events: one from the first event on.
+    size_t threads();
 
 private:
     Events() = default;

@@ -55,6 +55,8 @@ int nvrsim_link(const char* port, int up);
 int nvrsim_event(const char* port, uint32_t type, uint32_t fabric_port_id);
 /* Waits until all events are delivered. Never from a callback. */
 void nvrsim_drain_events(void);
+/* The library's own threads in this process: one, which stays, since the first event that had a callback. */
+size_t nvrsim_threads(void);
 
 /* A value of a port as text: "wwpn", "wwnn", "state", "speed", "fc_id", "beacon", "enabled", "boot_code", "resets",
  * "retention", "pending", "firmware", "present", "targets", "paths", "test" (the newest diagnostic test with its

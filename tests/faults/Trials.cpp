@@ -1,12 +1,8 @@
 #include "tests/faults/Trials.h"
 
-#include <dirent.h>
-#include <fstream>
 #include <functional>
 #include <sstream>
 #include <stdexcept>
-#include <thread>
-#include <unistd.h>
 
 #include "foundation/management_api.h"
 #include "simulator/nvrsim.h"
@@ -15,18 +11,13 @@
 #include "tests/module/support/Instance_Text.h"
 #include "tests/support/private_host.h"
 #include "tests/support/private_host_setup.h"
+#include "tests/support/process_state.h"
 #include "tests/support/simulator.h"
 
 namespace nvrtest {
 
 namespace {
 
-// Longer than any request takes on a busy machine.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr std::chrono::seconds patience{50};
-#else
-constexpr std::chrono::seconds patience{10};
-#endif
 constexpr std::chrono::seconds delay{2};
 
 const std::vector<std::string> all_libraries = {"HBAAPI", "lrmapi", "rmapi", "tssdm"};
@@ -39,45 +30,11 @@ const std::vector<std::string> tag_names = {NVR_CPQFC_OPERATIONS(NVR_NAME)};
 #undef NVR_NAME
 const std::vector<std::vector<std::string>> all_names = {management_names, plain_names, hba_names, tag_names};
 
-std::size_t open_files()
-{
-    std::size_t count = 0;
-    DIR* entries = opendir("/proc/self/fd");
-    while (readdir(entries))
-        count++;
-    closedir(entries);
-    return count;
-}
-
-// All but the one on which the simulator delivers its events.
-std::size_t threads()
-{
-    std::size_t count = 0;
-    DIR* entries = opendir("/proc/self/task");
-    while (const dirent* entry = readdir(entries)) {
-        std::string name;
-        std::getline(std::ifstream(std::string("/proc/self/task/") + entry->d_name + "/comm"), name);
-        count += !name.empty() && name != "nvrsim-events"; // none: it has just ended
-    }
-    closedir(entries);
-    return count;
-}
-
-// Before anything: the thread sanitizer starts one of its own with the first.
-std::size_t threads_from_the_start()
-{
-    std::string first;
-    std::thread([&] { first = "/proc/self/task/" + std::to_string(::gettid()); }).join();
-    while (exists(first))
-        std::this_thread::yield();
-    return threads();
-}
-
 /// The life of one trial, from what a process is before it to what is left.
 class Trial {
 public:
     explicit Trial(Run_Watch& watch)
-        : m_watch(watch), m_files(open_files()), m_threads(threads_from_the_start()),
+        : m_watch(watch), m_files(open_files().size()), m_threads(number_of_threads_from_the_start()),
           m_session(std::make_unique<Session>([&](const std::string& what) { m_watch.step(what); }))
     {
     }
@@ -134,9 +91,8 @@ public:
     {
         m_session.reset();
         m_watch.step("the end of the threads");
-        while (threads() > m_threads)
-            std::this_thread::yield();
-        expect(open_files() <= m_files, "a descriptor stays open");
+        wait_for_threads(m_threads + nvrsim_threads());
+        expect(open_files().size() <= m_files, "a descriptor stays open");
         expect(nvrsim_callbacks() == 0 || may_keep_callbacks, "a callback stays registered");
     }
 
@@ -328,12 +284,14 @@ std::uint64_t Sound_Session::all_calls() const
     return sum;
 }
 
-Sound_Session Sound_Session::hold()
+Sound_Session Sound_Session::hold(std::chrono::seconds patience)
 {
     const Run_Result result = do_run(
         {"the session without a failure", patience, [](Run_Watch& watch) { watch.tell(describe(measure(watch))); }});
     if (!result.failure.empty()) throw std::runtime_error("the session without a failure fails:\n" + result.failure);
-    return understand(result.told);
+    Sound_Session sound = understand(result.told);
+    sound.patience = patience;
+    return sound;
 }
 
 const std::vector<Failure_Kind>& failure_kinds()
@@ -358,7 +316,7 @@ std::vector<Run> library_call_trials(const Sound_Session& sound)
                 for (const Failure_Kind& kind : failure_kinds()) {
                     if (kind.is_slow != is_slow) continue;
                     trials.push_back({call + '#' + std::to_string(ordinal) + ':' + kind.failure.name,
-                                      is_slow ? patience + delay : patience,
+                                      is_slow ? sound.patience + delay : sound.patience,
                                       [&sound, call = call, ordinal, &kind](Run_Watch& watch) {
                                           try_call(sound, call, ordinal, kind, watch);
                                       }});
@@ -375,7 +333,7 @@ std::vector<Run> missing_symbol_trials(const Sound_Session& sound)
 {
     std::vector<Run> trials;
     const auto add = [&](const std::string& name, const Lack& lack) {
-        trials.push_back({name, patience, [&sound, lack](Run_Watch& watch) { try_without(sound, lack, watch); }});
+        trials.push_back({name, sound.patience, [&sound, lack](Run_Watch& watch) { try_without(sound, lack, watch); }});
     };
     for (const Installation& installation : installations())
         for (const Installation::Lookup& lookup : installation.lookups)

@@ -6,6 +6,7 @@
 /// thread, descriptor, handle or callback; a second load publishes the same again.
 #pragma once
 
+#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <map>
@@ -17,6 +18,13 @@
 
 namespace nvrtest {
 
+/// How long a request may take where no library is slow: longer than any does on a busy machine.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr std::chrono::seconds usual_patience{50};
+#else
+constexpr std::chrono::seconds usual_patience{10};
+#endif
+
 /// What a session without a failure does.
 struct Sound_Session {
     struct Calls {
@@ -25,10 +33,11 @@ struct Sound_Session {
     std::map<std::string, Calls> calls; ///< by the name of the operation
     std::size_t handles = 0;            ///< open at the end of the script, of the libraries
     std::string published;
+    std::chrono::seconds patience = usual_patience; ///< that each trial has with a request
 
     std::uint64_t all_calls() const;
     /// Held in a process of its own. Throws std::runtime_error if it is not sound.
-    static Sound_Session hold();
+    static Sound_Session hold(std::chrono::seconds patience = usual_patience);
 };
 
 /// The ways in which a call fails.

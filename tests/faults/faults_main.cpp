@@ -25,6 +25,7 @@ struct Wanted {
     std::uint64_t seed = 1;
     std::string only;
     unsigned at_once = 2;
+    unsigned patience = usual_patience.count(); // seconds
 };
 
 // In an order by the seed, those behind the skipped ones. The same on every machine, unlike std::shuffle.
@@ -70,7 +71,7 @@ int run_only(const std::vector<Run>& runs, const std::string& name)
 int run(const Wanted& wanted)
 {
     module_registrations(); // read once for all runs, as is the schema
-    const Sound_Session sound = Sound_Session::hold();
+    const Sound_Session sound = Sound_Session::hold(std::chrono::seconds(wanted.patience));
     const std::vector<Run> calls = library_call_trials(sound), missing = missing_symbol_trials(sound);
     std::printf("%llu library calls of %zu operations in a session, %zu kinds of failure: %zu runs; "
                 "%zu runs without a symbol or a library\n",
@@ -86,8 +87,11 @@ int run(const Wanted& wanted)
         for (const Run& run : all)
             std::printf("%s\n", run.name.c_str());
     if (!wanted.only.empty()) return run_only(all, wanted.only);
-    if (wanted.sample > 0)
-        return make(sample_of(all, wanted), wanted.at_once, "a sample by the seed " + std::to_string(wanted.seed)) > 0;
+    if (wanted.sample > 0) {
+        const std::vector<Run> sample = sample_of(all, wanted);
+        if (sample.empty()) throw std::runtime_error("there are no more than " + std::to_string(all.size()) + " runs");
+        return make(sample, wanted.at_once, "a sample by the seed " + std::to_string(wanted.seed)) > 0;
+    }
     if (wanted.is_first) return make(all, wanted.at_once, "the first call of each operation") > 0;
     if (!wanted.is_all && !wanted.is_absent) return 0;
     std::size_t failed = make(missing, wanted.at_once, "without a symbol or a library");
@@ -116,6 +120,9 @@ int main(int argc, char** argv)
     app.add_flag("--list", wanted.is_list, "Print their names");
     app.add_option("--at-once", wanted.at_once, "Up to so many at a time")
         ->check(CLI::Range(1, 64))
+        ->capture_default_str();
+    app.add_option("--patience", wanted.patience, "Seconds that a request may take")
+        ->check(CLI::Range(1, 3600))
         ->capture_default_str();
     CLI11_PARSE(app, argc, argv);
     std::setvbuf(stdout, nullptr, _IOLBF, 0);

@@ -1,11 +1,7 @@
 // The module's life in a server: counters of factories and cleanups, what stays behind an unload, and what does not.
-#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <cstdlib>
-#include <cstring>
-#include <dirent.h>
-#include <fstream>
 #include <set>
 #include <sstream>
 #include <string>
@@ -19,6 +15,7 @@
 #include "tests/module/support/Entries.h"
 #include "tests/module/support/Rig.h"
 #include "tests/support/private_host.h"
+#include "tests/support/process_state.h"
 #include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
@@ -31,34 +28,10 @@ namespace {
 
 constexpr char unloaded[] = "Norvane Provider Unloaded";
 
-std::size_t entries_of(const char* folder)
-{
-    DIR* entries = opendir(folder);
-    std::size_t count = 0;
-    while (readdir(entries))
-        count++;
-    closedir(entries);
-    return count;
-}
-
-std::size_t resident_kilobytes()
-{
-    std::ifstream status("/proc/self/statm");
-    std::size_t size = 0, resident = 0;
-    status >> size >> resident;
-    return resident * static_cast<std::size_t>(sysconf(_SC_PAGESIZE)) / 1024;
-}
-
 // Of this process alone: its children have left theirs there.
 std::vector<std::string> shared_memory()
 {
-    const std::string own = '_' + std::to_string(getpid());
-    std::vector<std::string> names;
-    DIR* entries = opendir("/dev/shm");
-    while (const dirent* entry = readdir(entries))
-        if (strstr(entry->d_name, own.c_str())) names.push_back(entry->d_name);
-    closedir(entries);
-    return names;
+    return names_in("/dev/shm", '_' + std::to_string(getpid()));
 }
 
 // Result: the elements of string arrays in the answers.
@@ -237,14 +210,14 @@ TEST_P(Lives, TenRoundsInOneProcessLeaveNothingBehind)
         EXPECT_EQ(nvrsim_open_handles(), 0u);
         if (round == 3) {
             memory = resident_kilobytes();
-            files = entries_of("/proc/self/fd");
-            threads = entries_of("/proc/self/task");
+            files = open_files().size();
+            threads = number_of_threads();
         }
     }
     rig.stop();
     EXPECT_EQ(rig.server().report().contexts_not_detached, 0u);
-    EXPECT_LE(entries_of("/proc/self/fd"), files);
-    EXPECT_LE(entries_of("/proc/self/task"), threads);
+    EXPECT_LE(open_files().size(), files);
+    EXPECT_TRUE(wait_for_threads(threads, std::chrono::seconds(20))) << number_of_threads() << " of " << threads;
 #if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
     EXPECT_LE(resident_kilobytes(), memory + 2048);
 #endif

@@ -5,8 +5,6 @@
 #include <atomic>
 #include <chrono>
 #include <cstdlib>
-#include <filesystem>
-#include <iterator>
 #include <new>
 #include <string>
 #include <thread>
@@ -17,6 +15,7 @@
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Rig.h"
 #include "tests/support/code_range.h"
+#include "tests/support/process_state.h"
 #include "tests/support/simulator.h"
 
 namespace {
@@ -108,19 +107,10 @@ struct Held {
     friend void PrintTo(const Held& held, std::ostream* os) { *os << held.bytes << " bytes in " << held.blocks; }
 };
 
-std::size_t threads()
-{
-    const std::filesystem::directory_iterator tasks("/proc/self/task");
-    return static_cast<std::size_t>(std::distance(begin(tasks), end(tasks)));
-}
-
 /// What is held once no more than `resting` threads run: that of the last refresh, which has told its end, is gone.
 Held held_at_rest(std::size_t resting)
 {
-    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(20);
-    while (threads() > resting && std::chrono::steady_clock::now() < deadline)
-        std::this_thread::yield();
-    EXPECT_LE(threads(), resting);
+    EXPECT_TRUE(wait_for_threads(resting, std::chrono::seconds(20))) << number_of_threads() << " of " << resting;
     return {module_bytes, module_blocks};
 }
 
@@ -144,7 +134,7 @@ class Memory : public testing::TestWithParam<bool> {};
 
 TEST_P(Memory, ARefreshLeavesTheSameInstancesAndNotAByteMore)
 {
-    const std::size_t resting = threads();
+    const std::size_t resting = number_of_threads();
     Rig rig({host::Manner::strict(), GetParam() ? large_host() : "typical", refreshing_settings});
     library.find("libstdc++.so");
     ASSERT_THAT(rig.names("NVRHBA_FCPort"), succeeded());
@@ -169,7 +159,7 @@ TEST_P(Memory, ARefreshLeavesTheSameInstancesAndNotAByteMore)
 // All nine tests on each port, with overrides and without, jobs that go at once and logs that are cleared.
 TEST(MemoryOfDiagnostics, ARebuildTakesAllThatRunsLeft)
 {
-    const std::size_t resting = threads();
+    const std::size_t resting = number_of_threads();
     Rig rig({host::Manner::strict(), "typical", refreshing_settings});
     library.find("libstdc++.so");
     ASSERT_THAT(rig.names("NVRHBA_FCPort"), succeeded());
