@@ -1,40 +1,46 @@
 #include "host/ModuleSymbols.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <elf.h>
 #include <fstream>
-#include <iterator>
 
 namespace host {
 namespace {
 
-/// The bytes of a file; reads that do not lie inside answer false.
-class Bytes {
+/// A file whose tables are read one by one, each where it lies inside and not at all where it does not.
+class Tables {
 public:
-    explicit Bytes(std::string content) : m_content(std::move(content)) {}
+    explicit Tables(std::istream& stream) : m_stream(stream)
+    {
+        m_stream.seekg(0, std::ios::end);
+        m_size = static_cast<std::uint64_t>(std::max<std::streamoff>(m_stream.tellg(), 0));
+    }
+
+    std::string read(std::uint64_t at, std::uint64_t size) const
+    {
+        std::string bytes;
+        if (at > m_size || m_size - at < size) return bytes;
+        bytes.resize(size);
+        m_stream.seekg(static_cast<std::streamoff>(at));
+        m_stream.read(bytes.data(), static_cast<std::streamsize>(size));
+        if (!m_stream) bytes.clear(); // it has been cut meanwhile
+        m_stream.clear();
+        return bytes;
+    }
 
     template <class T>
     bool read(std::uint64_t at, T& record) const
     {
-        if (at > m_content.size() || m_content.size() - at < sizeof record) return false;
-        std::memcpy(&record, m_content.data() + at, sizeof record);
-        return true;
+        const std::string bytes = read(at, sizeof record);
+        if (!bytes.empty()) std::memcpy(&record, bytes.data(), sizeof record);
+        return !bytes.empty();
     }
-
-    std::string text(const Elf64_Shdr& section, std::uint64_t at) const
-    {
-        if (at >= section.sh_size || section.sh_offset > m_content.size() ||
-            m_content.size() - section.sh_offset < section.sh_size)
-            return "";
-        std::uint64_t start = section.sh_offset + at;
-        return m_content.substr(start, strnlen(m_content.data() + start, section.sh_size - at));
-    }
-
-    std::size_t size() const { return m_content.size(); }
 
 private:
-    std::string m_content;
+    std::istream& m_stream;
+    std::uint64_t m_size = 0;
 };
 
 } // namespace
@@ -47,23 +53,25 @@ std::vector<std::string> exported_functions(const std::string& file, std::string
         error = file + ": " + std::strerror(errno);
         return names;
     }
-    Bytes bytes(std::string(std::istreambuf_iterator<char>(stream), {}));
+    const Tables file_tables(stream);
     Elf64_Ehdr head{};
-    if (!bytes.read(0, head) || std::memcmp(head.e_ident, ELFMAG, SELFMAG) != 0 ||
+    if (!file_tables.read(0, head) || std::memcmp(head.e_ident, ELFMAG, SELFMAG) != 0 ||
         head.e_ident[EI_CLASS] != ELFCLASS64 || head.e_type != ET_DYN || head.e_shentsize != sizeof(Elf64_Shdr)) {
         error = file + ": not a 64-bit shared object";
         return names;
     }
     for (unsigned i = 0; i < head.e_shnum; ++i) {
-        Elf64_Shdr table{}, strings{};
-        if (!bytes.read(head.e_shoff + i * sizeof table, table) || table.sh_type != SHT_DYNSYM) continue;
-        if (table.sh_size > bytes.size() || !bytes.read(head.e_shoff + table.sh_link * sizeof strings, strings))
-            continue;
-        for (std::uint64_t at = 0; at + sizeof(Elf64_Sym) <= table.sh_size; at += sizeof(Elf64_Sym)) {
+        Elf64_Shdr table{}, texts{};
+        if (!file_tables.read(head.e_shoff + i * sizeof table, table) || table.sh_type != SHT_DYNSYM) continue;
+        if (!file_tables.read(head.e_shoff + table.sh_link * sizeof texts, texts)) continue;
+        const std::string symbols = file_tables.read(table.sh_offset, table.sh_size);
+        const std::string strings = file_tables.read(texts.sh_offset, texts.sh_size);
+        for (std::size_t at = 0; at + sizeof(Elf64_Sym) <= symbols.size(); at += sizeof(Elf64_Sym)) {
             Elf64_Sym symbol{};
-            if (!bytes.read(table.sh_offset + at, symbol)) break;
+            std::memcpy(&symbol, symbols.data() + at, sizeof symbol);
             if (ELF64_ST_TYPE(symbol.st_info) != STT_FUNC || symbol.st_shndx == SHN_UNDEF) continue;
-            names.push_back(bytes.text(strings, symbol.st_name));
+            // The last text need not end.
+            names.push_back(symbol.st_name < strings.size() ? strings.c_str() + symbol.st_name : "");
         }
     }
     if (names.empty()) error = file + ": exports no function";
