@@ -71,8 +71,11 @@ void NvrConfigFile::load(const char* path)
     m_path = path;
     {
         struct stat status;
-        static_cast<void>(::stat(m_path.c_str(), &status));
-        if (errno == ENOENT) return; // also a stale one: only errno is tested
+        const bool is_there = ::stat(m_path.c_str(), &status) == 0;
+        if (errno == ENOENT) { // also a stale one: only errno is tested
+            m_unread = is_there;
+            return;
+        }
     }
     Line_Reader file(m_path.c_str());
     m_unread = file.has_failed();

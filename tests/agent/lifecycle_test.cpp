@@ -81,6 +81,7 @@ TEST_F(Lifecycle, OnlyTheCallersStaleErrnoDecidesAboutTheSettingsFile)
     ASSERT_EQ(load(), 0);
     EXPECT_EQ(agent().m_cacheTimeout, 10u);
     unload();
+    EXPECT_EQ(read_file("/etc/norvane_fc_provider.conf"), "NVR_PROVIDER_CACHE_TIMEOUT = 7\n") << "it was not read";
 }
 
 TEST_F(Lifecycle, AMissingManagementLibraryRefusesEveryLoadAndTheNextAgentRecovers)

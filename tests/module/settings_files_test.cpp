@@ -1,10 +1,12 @@
 // The module's settings files, sound and broken in every line: no fault in them stops the module.
+#include <cerrno>
 #include <string>
 #include <sys/stat.h>
 #include <vector>
 
 #include <gmock/gmock.h>
 
+#include "tests/module/support/Entries.h"
 #include "tests/module/support/Rig.h"
 #include "tests/support/private_host.h"
 #include "tests/support/trace.h"
@@ -104,6 +106,41 @@ TEST(SettingsFile, ThatCannotBeOpenedIsPassedOver)
     make_unopenable(conf_path);
     EXPECT_EQ(currents(rig), "10 0 1");
     rig.stop();
+}
+
+TEST(SettingsFile, ThatCannotBeReadIsLeftAsItIs)
+{
+    Rig rig({host::Manner::strict(), "small", "NVR_PROVIDER_CACHE_TIMEOUT = 20\n"});
+    rig.server().on_request_thread([](const CMPIBroker* broker, const CMPIContext* context) {
+        Entries entries;
+        errno = ENOENT; // of the server's own doing; it keeps the file from being read
+        CMPIInstanceMI* ports = entries.instances("NVRHBA_FCPort", broker, context);
+        ASSERT_TRUE(ports);
+        EXPECT_EQ(ports->ft->cleanup(ports, context, 1).rc, CMPI_RC_OK);
+    });
+    EXPECT_EQ(read_file(conf_path), "NVR_PROVIDER_CACHE_TIMEOUT = 20\n");
+    EXPECT_EQ(currents(rig), "20 0 1");
+}
+
+TEST(SettingsFiles, OnAFullDiskTakeWhatWasSet)
+{
+    make_folder("/var/log/disk");
+    const Small_Disk disk("/var/log/disk");
+    write_file("/var/log/disk/conf", "NVR_PROVIDER_CACHE_TIMEOUT = 20\n");
+    write_file("/var/log/disk/dmp", "2,5,1\n" + std::string(trace_path));
+    Rig rig({host::Manner::strict(), "small"});
+    link("/var/log/disk/conf", conf_path);
+    link("/var/log/disk/dmp", dmp_path);
+    disk.fill();
+    host::Instance setting = rig.enumerate("NVRHBA_ProviderConfigSetting").instances.at(0);
+    setting.set("current", host::Value::uint32(3));
+    ASSERT_THAT(rig.server().modify(setting, std::vector<std::string>{"current"}), succeeded());
+    rig.restart();
+    EXPECT_EQ(currents(rig), "3 0 1");
+    EXPECT_EQ(read_file(dmp_path), "2,5,1\n" + std::string(trace_path));
+    rig.stop();
+    remove(conf_path);
+    remove(dmp_path);
 }
 
 // --- The log's settings
