@@ -92,10 +92,15 @@ TEST(Exports, TheModuleStaysLoadedAndBindsItsOwnNamesToItself)
 
 TEST(Exports, NoManagementLibraryIsLinked)
 {
+    // The languages' own, and what the sanitizers bring.
+    const std::vector<std::string> wanted = {"libstdc++.so", "libgcc_s.so", "libc.so",     "libm.so",
+                                             "ld-linux",     "libasan.so",  "libubsan.so", "libtsan.so"};
     const Elf_File module(NVR_MODULE);
+    EXPECT_THAT(module.needed(), testing::Not(testing::IsEmpty()));
     for (const std::string& library : module.needed())
-        for (const char* word : {"HBAAPI", "rmapi", "tssdm", "curl", "nvrsim"})
-            EXPECT_EQ(library.find(word), std::string::npos) << library;
+        EXPECT_TRUE(std::any_of(wanted.begin(), wanted.end(), [&](const std::string& name) {
+            return library.rfind(name, 0) == 0;
+        })) << library;
 }
 
 // All of these add an initialiser to every unit.
