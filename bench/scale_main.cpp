@@ -39,21 +39,20 @@ struct Point {
 };
 
 constexpr Point points[] = {
-    {"64", 2, 4, 8},  {"S", 2, 8, 8},        {"1000", 4, 10, 25}, {"M", 4, 16, 16},
-    {"L", 8, 32, 16}, {"10000", 10, 20, 50}, {"XL", 16, 32, 32},  {"XXL", 16, 125, 50},
+    {"16", 2, 2, 4},  {"64", 2, 4, 8},       {"S", 2, 8, 8},     {"1000", 4, 10, 25},  {"M", 4, 16, 16},
+    {"L", 8, 32, 16}, {"10000", 10, 20, 50}, {"XL", 16, 32, 32}, {"XXL", 16, 125, 50},
 };
 
 constexpr char name_space[] = "root/norvane";
 constexpr char mapping_call[] = "HBA_GetFcpTargetMapping";
 constexpr char volume_class[] = "NVRHBA_StorageVolume";
 
-/// The figures of a point by name. Times in microseconds, memory in bytes.
+/// The figures of a point by name. Times in microseconds, memory in bytes. Those of all enumerations and traversals
+/// that grow with the SAN are named by their question, which has a space in it.
 using Figures = std::map<std::string, double>;
 
-const char* const figure_names[] = {
-    "first_answer", "refresh",     "refresh_total", "resident",     "peak_ratio", "instances",    "instances_floor",
-    "names",        "names_floor", "get",           "volume_paths", "volume_all", "port_devices",
-};
+/// Between these two points each question's growth is told.
+constexpr char smaller_point[] = "M", larger_point[] = "XXL";
 
 // --- One point
 // -------------------------------------------------------------------------------------------------------
@@ -127,7 +126,10 @@ void require(bool is_so, const char* what)
 void measure_memory(nvrbench::Bench_Host& host, const Point& point, Figures& figures)
 {
     const double resident_before = resident();
+    const auto start = std::chrono::steady_clock::now();
     figures["first_answer"] = microseconds_of([&] { (void)host.enumerate("NVRHBA_TapeDrive"); });
+    figures["first_elapsed"] =
+        std::chrono::duration<double, std::micro>(std::chrono::steady_clock::now() - start).count();
     const double steady = resident() - resident_before;
     figures["resident"] = steady / point.paths();
     forget_peak();
@@ -191,6 +193,29 @@ void measure_lookups(nvrbench::Bench_Host& host, const Point& point, Figures& fi
                               static_cast<double>(ends);
 }
 
+/// Each question whose answer grows with the SAN: all classes, and each association class from the host, from a port
+/// and from the port's endpoint. An answered instance.
+void measure_all(host::Host& server, const Point& point, Figures& figures)
+{
+    const auto measure_question = [&](const std::string& question, auto ask) {
+        std::size_t answered = 0;
+        const double least = least_of([&] { answered = ask().handed_on; });
+        if (answered >= point.targets * point.luns) figures[question] = least / static_cast<double>(answered);
+    };
+    for (const host::Registration& one : server.registrations())
+        if (one.kinds & host::instance_kind)
+            measure_question("enumerate " + one.class_name,
+                             [&] { return server.enumerate(name_space, one.class_name, {}, &nowhere()); });
+    for (const char* from : {"CIM_ComputerSystem", "NVRHBA_FCPort", "NVRHBA_SCSIProtocolInitiatorEndpoint"}) {
+        const host::Path source = server.names(name_space, from).paths.at(0);
+        for (const host::Registration& one : server.registrations())
+            if (one.kinds & host::association_kind)
+                measure_question(std::string(from) + " over " + one.class_name, [&] {
+                    return server.associators(source, one.class_name, "", "", "", {}, &nowhere());
+                });
+    }
+}
+
 void measure_floor(const Point& point, Figures& figures)
 {
     void* library = dlopen(NVR_FLOOR, RTLD_NOW | RTLD_LOCAL);
@@ -220,10 +245,12 @@ void measure(const Point& point)
         measure_refresh(host, point, figures);
         measure_enumerations(host.server(), point, "", figures);
         measure_lookups(host, point, figures);
+        if (point.name == std::string(smaller_point) || point.name == std::string(larger_point))
+            measure_all(host.server(), point, figures);
         measure_floor(point, figures);
     }
-    for (const char* name : figure_names)
-        dprintf(answer, "%.6g\n", figures.at(name));
+    for (const auto& [name, figure] : figures)
+        dprintf(answer, "%.6g %s\n", figure, name.c_str());
 }
 
 // --- The tables
@@ -235,20 +262,23 @@ Figures measured_apart(const char* name)
     FILE* child = popen(command.c_str(), "r");
     require(child, "no process could be started");
     Figures figures;
-    for (const char* figure : figure_names)
-        if (std::fscanf(child, "%lf", &figures[figure]) != 1) figures[figure] = 0;
+    double figure;
+    char figure_name[200];
+    while (std::fscanf(child, "%lf %199[^\n]", &figure, figure_name) == 2)
+        figures[figure_name] = figure;
     require(pclose(child) == 0, "a point of scale failed");
     return figures;
 }
 
 void print_row(const Point& point, const Figures& f)
 {
-    std::printf("| %s | %u | %.3f | %.1f | %.1f | %.0f | %.2f | %.1f | %.2f | %.1f | %.2f | %.0f | %.1f | %.1f | %.1f "
-                "|\n",
-                point.name, point.paths(), f.at("first_answer") * 1e-6, f.at("refresh"), f.at("refresh_total"),
-                f.at("resident"), f.at("peak_ratio"), f.at("instances"), f.at("instances") / f.at("instances_floor"),
-                f.at("names"), f.at("names") / f.at("names_floor"), f.at("get"), f.at("volume_paths") * 1e-3,
-                f.at("volume_all") * 1e-3, f.at("port_devices"));
+    std::printf(
+        "| %s | %u | %.3f | %.3f | %.1f | %.1f | %.0f | %.2f | %.1f | %.2f | %.1f | %.2f | %.0f | %.1f | %.1f | %.1f "
+        "|\n",
+        point.name, point.paths(), f.at("first_answer") * 1e-6, f.at("first_elapsed") * 1e-6, f.at("refresh"),
+        f.at("refresh_total"), f.at("resident"), f.at("peak_ratio"), f.at("instances"),
+        f.at("instances") / f.at("instances_floor"), f.at("names"), f.at("names") / f.at("names_floor"), f.at("get"),
+        f.at("volume_paths") * 1e-3, f.at("volume_all") * 1e-3, f.at("port_devices"));
     std::fflush(stdout);
 }
 
@@ -274,19 +304,31 @@ void print_growth(const std::map<std::string, Figures>& measured)
     }
 }
 
+void print_questions(const Figures& smaller, const Figures& larger)
+{
+    std::printf("\n| question | us at %s | us at %s | ratio |\n|---|---|---|---|\n", smaller_point, larger_point);
+    for (const auto& [question, us] : larger) {
+        const auto found = smaller.find(question);
+        if (question.find(' ') == std::string::npos || found == smaller.end()) continue;
+        std::printf("| %s | %.1f | %.1f | %.2f |\n", question.c_str(), found->second, us, us / found->second);
+    }
+}
+
 void print_table(const std::vector<std::string>& names)
 {
     std::map<std::string, Figures> measured;
     std::puts(
-        "| point | paths | first answer s | refresh us/path | with libraries | resident B/path | peak | "
+        "| point | paths | first answer s | elapsed s | refresh us/path | with libraries | resident B/path | peak | "
         "instances us | of floor | names us | of floor | get us | associators ms | all classes ms | from a port us |");
-    std::puts("|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|");
+    std::puts("|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|");
     for (const std::string& name : names) {
         const Point& point = point_of(name);
         measured[name] = measured_apart(point.name);
         print_row(point, measured[name]);
     }
     if (measured.count("1000")) print_growth(measured);
+    if (measured.count(smaller_point) && measured.count(larger_point))
+        print_questions(measured[smaller_point], measured[larger_point]);
 }
 
 } // namespace
