@@ -12,11 +12,20 @@ namespace cimple {
 /// Return values that several methods share.
 enum Method_Answer : uint32 {
     ANSWER_DONE = 0,
+    ANSWER_UNKNOWN = 1,
+    ANSWER_FAILED = 4,            ///< also the wrong service, a file that cannot be written
+    ANSWER_INVALID_PARAMETER = 5, ///< also a file that cannot be looked at
     ANSWER_NULL_ARGUMENT = 4097,
     ANSWER_FILE_NOT_FOUND = 4107,
     ANSWER_BAD_ARGUMENT = 32968,
     ANSWER_FOREIGN_INSTANCE = 33068
 };
+
+/// The return value for a status of the management library other than 0.
+constexpr uint32 libraryAnswer(uint32 status)
+{
+    return 40000 + status;
+}
 
 /// Ends a method with that return value.
 inline Invoke_Method_Status answer(Property<uint32>& return_value, uint32 value)

@@ -3,12 +3,12 @@
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
 #include "agent/instance_table.h"
+#include "agent/method_answer.h"
 #include "classes/CIM_RecordForLog.h"
 #include "classes/NVRHBA_DiagnosticCompletionRecord.h"
 #include "classes/NVRHBA_DiagnosticServiceRecord.h"
 #include "classes/NVRHBA_LogManagesRecord.h"
 #include "classes/NVRHBA_RecordAppliesToElement.h"
-#include "diagnostics/diagnostic_answer.h"
 #include "diagnostics/diagnostic_tests.h"
 #include "foundation/CLogger.h"
 
@@ -51,16 +51,16 @@ uint32 clearLog(ProviderAgent& agent, const Instance* self)
     const auto* log = agent.m_NVRHBA_DiagnosticsLog_map.lookup_own(self);
     if (!log) {
         NVR_LOG("Invalid instance of Diagnostic Log");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
     const String test = log->InstanceID.value;
     if (!find_diagnostic_test(test)) {
         NVR_LOG("Exiting the NVRHBA CDM Clear log");
-        return ANSWER_OK;
+        return ANSWER_DONE;
     }
     if (!clearRecords(agent, test)) return ANSWER_FAILED;
     NVR_LOG("Exiting NVRHBA_DiagnosticsLog_Provider::ClearLog");
-    return ANSWER_OK;
+    return ANSWER_DONE;
 }
 
 } // namespace

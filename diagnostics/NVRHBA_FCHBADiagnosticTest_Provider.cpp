@@ -4,6 +4,7 @@
 #include "agent/enumerate.h"
 #include "agent/instance_table.h"
 #include "agent/library_name.h"
+#include "agent/method_answer.h"
 #include "classes/NVRHBA_ConcreteJob.h"
 #include "classes/NVRHBA_DiagnosticSettingDataRecord.h"
 #include "classes/NVRHBA_FCHBADiagnosticSettingData.h"
@@ -11,7 +12,6 @@
 #include "classes/NVRHBA_PortController.h"
 #include "diagnostics/NVR_DiagTestFunc.h"
 #include "diagnostics/NVR_Diagnostics.h"
-#include "diagnostics/diagnostic_answer.h"
 #include "diagnostics/diagnostic_tests.h"
 #include "foundation/CLogger.h"
 
@@ -77,12 +77,12 @@ uint32 runTest(ProviderAgent& agent, const Instance* self, const Instance* eleme
     const auto* invoked = agent.m_NVRHBA_FCHBADiagnosticTest_map.lookup_own(self);
     if (!invoked) {
         NVR_LOG("Invalid instance: NVRHBA_FCHBADiagnosticTest");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
     const auto* named = agent.m_NVRHBA_PortController_map.lookup_own(element);
     if (!named) {
         NVR_LOG("Invalid instance: NVRHBA_PortController");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
     const String deviceId = named->DeviceID.value;
     const NVRHBA_PortController* controller = findController(agent, deviceId);
@@ -90,23 +90,23 @@ uint32 runTest(ProviderAgent& agent, const Instance* self, const Instance* eleme
     HBA_WWN port = {};
     if (!library_name(port, deviceId.c_str(), "NVRHBA_FCHBADiagnosticTest_Provider::Id2HBAName failed",
                       "NVRHBA_FCHBADiagnosticTest_Provider::str2HBAName failed"))
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
 
     const String name = invoked->Name.value;
     const NVRHBA_JobSettingData* jobSetting = jobSettingOf(agent, givenJobSetting);
     const NVRHBA_FCHBADiagnosticSettingData* setting = settingOf(agent, givenSetting, name);
     if (!jobSetting || !setting) {
         NVR_LOG("Unable to get the Job/Diagnostic SettingData, Not able to continue");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
     const Diagnostic_Test* test = find_diagnostic_test(name);
     if (!test) {
         NVR_LOG("Invalid Test Name");
-        return ANSWER_UNKNOWN_TEST;
+        return ANSWER_UNKNOWN;
     }
     if (test->takesTarget() && setting->TargetDevice.value.size() != wwpn_size) {
         NVR_LOG("Invalid TargetDevice, Enter Target WWPN");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
 
     NVR_LOG("Started Diagnostic : %s", test->name);
@@ -118,7 +118,7 @@ uint32 runTest(ProviderAgent& agent, const Instance* self, const Instance* eleme
         NVR_LOG("%s Failed to Run", test->name);
     job = std::move(run.job);
     if (job && setting->OverridedSettingData.value == 1) recordSettings(agent, *setting, job->InstanceID.value);
-    return status == 0 ? uint32{ANSWER_OK} : ANSWER_STATUS + status;
+    return status == 0 ? uint32{ANSWER_DONE} : libraryAnswer(status);
 }
 
 } // namespace

@@ -3,7 +3,7 @@
 #include "agent/Agent_Wait.h"
 #include "agent/enumerate.h"
 #include "agent/instance_table.h"
-#include "diagnostics/diagnostic_answer.h"
+#include "agent/method_answer.h"
 #include "foundation/CLogger.h"
 
 namespace cimple {
@@ -31,21 +31,21 @@ uint32 help(ProviderAgent& agent, const Instance* self, const Property<String>& 
     const auto* service = agent.m_NVRHBA_HelpService_map.lookup_own(self);
     if (!service) {
         NVR_LOG("Invalid instance of Help Service");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
     if (document.null || delivery.null || format.null) {
         NVR_LOG("Invalid Requested Document");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
     service = findDocument(agent.m_NVRHBA_HelpService_map, service->Name.value, document.value);
     if (!service) return ANSWER_FAILED;
     if (delivery.value != as_string || format.value != as_string) {
         NVR_LOG("Unsupported Delivery options, Use '1' for proper support");
-        return ANSWER_INVALID;
+        return ANSWER_INVALID_PARAMETER;
     }
     const Array<String>& descriptions = service->DocumentDescriptions.value;
     set(info, descriptions.size() > 0 ? descriptions[0] : String());
-    return ANSWER_OK;
+    return ANSWER_DONE;
 }
 
 } // namespace

@@ -20,9 +20,6 @@ namespace cimple {
 
 namespace {
 
-// Return values of this service alone.
-constexpr uint32 ANSWER_UNUSABLE = 4;          // the wrong service, a file that cannot be written
-constexpr uint32 ANSWER_INVALID_PARAMETER = 5; // an option, a file that cannot be looked at
 constexpr uint32 reset_not_supported = 2;
 
 constexpr char provider_name[] = "NVRHBA_SoftwareInstallationService_Provider";
@@ -116,7 +113,7 @@ uint32 prepareDownload(const NVRHBA_SoftwareInstallationService* self, const cha
     if (!portName(port, target, provider_name)) return ANSWER_NULL_ARGUMENT;
     if (isNamed(self, firmware_service)) return ANSWER_DONE;
     NVR_LOG("Error - The SoftwareInstallationService instance selected is incorrect ");
-    return ANSWER_UNUSABLE;
+    return ANSWER_FAILED;
 }
 
 /// Resets the adapter once for each time that the options say so. `refresh`: none of them does.
@@ -252,7 +249,7 @@ uint32 installFromByteStream(ProviderAgent& agent, const NVRHBA_SoftwareInstalla
     NVR_LOG("filename is : %s", path);
     if (!writeImage(path, image)) {
         NVR_LOG("Could not open file to copy the firmware from ByteStream");
-        return ANSWER_UNUSABLE;
+        return ANSWER_FAILED;
     }
     Passing_File file(path, true);
     if (const uint32 fault = findImage(path)) return fault;

@@ -17,12 +17,6 @@ namespace cimple {
 
 class ProviderAgent;
 
-/// The return value for a status of the management library other than 0.
-constexpr uint32 libraryAnswer(uint32 status)
-{
-    return 40000 + status;
-}
-
 /// True if a method that is invoked on `self` is meant for the service in `services`: `self` is of the service's class,
 /// and has the keys of the first one, or of any, unless there is none yet.
 bool isFirstService(const Instance_Map& services, const Instance* self);

@@ -20,7 +20,7 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-constexpr char target_class[] = "NVRHBA_FCPort";
+constexpr char fc_port_class[] = "NVRHBA_FCPort";
 
 class Runner {
 public:
@@ -77,7 +77,7 @@ private:
 /// The port that the user named, or the only one. 0, or the exit status.
 int Runner::find_port()
 {
-    const Answer names = m_server.names(m_options.name_space, target_class);
+    const Answer names = m_server.names(m_options.name_space, fc_port_class);
     if (!names.ok()) return failed(names.status);
     std::string known;
     const Path* found = nullptr;
@@ -99,7 +99,7 @@ int Runner::find_port()
 /// The service's instance, or the port itself. 0, or the exit status.
 int Runner::find_target()
 {
-    const std::string& name = m_action.service.empty() ? target_class : m_action.service;
+    const std::string& name = m_action.service.empty() ? fc_port_class : m_action.service;
     const Class_Record* record = m_server.schema().find(name);
     if (!record) return failed({CMPI_RC_ERR_INVALID_CLASS, "there is no class " + name, Fault::request});
     if (m_action.service.empty()) {
