@@ -46,7 +46,7 @@ protected:
                                                        for (const std::string& word : words())
                                                            all.insert(word);
                                                    });
-        EXPECT_GT(pieces, 40);
+        EXPECT_GT(pieces, 50);
         EXPECT_EQ(status, 0u) << "the last one had all that it wanted";
         return all;
     }
