@@ -1,43 +1,34 @@
 """A client of the field, wbemcli, and raw CIM-XML against `nvrcim serve`, over a simulated host."""
 
 import html
-import http.client
 import http.server
 import json
 import os
 import queue
 import re
 import shlex
-import shutil
-import socket
 import subprocess
 import sys
 import tempfile
 import threading
 import unittest
 
+from served import NAMESPACE, PRIVATE, Server
+
 NVRCIM, NVRSIMCTL, SCENARIO = sys.argv.pop(1), sys.argv.pop(1), sys.argv.pop(1)
-NAMESPACE = "root/norvane"
-# The module keeps its settings in /etc when it goes.
-PRIVATE = ["sh", os.path.join(os.path.dirname(os.path.abspath(__file__)), "../../scripts/private_etc.sh"), NVRCIM]
 
 
 def setUpModule():  # pylint: disable=invalid-name
-    global SERVER, PORT, WORK  # pylint: disable=global-statement
-    WORK = tempfile.mkdtemp()
-    SERVER = subprocess.Popen(
-        [*PRIVATE, "--scenario", SCENARIO, "serve", "--port", "0"], stdout=subprocess.PIPE, text=True,
-        env={**os.environ, "NVRSIM_SOCKET": WORK + "/socket"})
-    first = SERVER.stdout.readline()
-    assert "for trying and testing" in first and "http://127.0.0.1:" in first, first
-    PORT = int(re.search(r":(\d+)/cimom", first).group(1))
+    global SERVER  # pylint: disable=global-statement
+    SERVER = Server(NVRCIM, SCENARIO)
 
 
 def tearDownModule():  # pylint: disable=invalid-name
-    SERVER.terminate()
-    status = SERVER.wait(60)
-    shutil.rmtree(WORK)
-    assert status == 0, f"nvrcim serve ended with {status}"
+    SERVER.stop()
+
+
+def request(*arguments, **options):
+    return SERVER.request(*arguments, **options)
 
 
 def wbemcli(*arguments):
@@ -48,12 +39,12 @@ def wbemcli(*arguments):
 
 
 def url(path):
-    return f"http://localhost:{PORT}/{path}"
+    return f"http://localhost:{SERVER.port}/{path}"
 
 
 def object_url(line):
     """What wbemcli printed as a path, as its argument."""
-    return "http://" + re.sub(r"^[^/]*", f"localhost:{PORT}", line)
+    return "http://" + re.sub(r"^[^/]*", f"localhost:{SERVER.port}", line)
 
 
 def names(class_name):
@@ -94,9 +85,10 @@ def listed_instances(lines):
 def nvrcim_each(commands):
     """The answers to many commands, run where they share one copy of the settings."""
     with tempfile.TemporaryDirectory() as folder:
-        script = "".join(f"{shlex.join([NVRCIM, '--scenario', SCENARIO, '--json', *command])} >{folder}/{i} 2>/dev/null\n"
+        nvrcim_json = [NVRCIM, "--scenario", SCENARIO, "--json"]
+        script = "".join(f"{shlex.join([*nvrcim_json, *command])} >{folder}/{i} 2>/dev/null\n"
                          for i, command in enumerate(commands))
-        subprocess.run([*PRIVATE[:-1], "sh"], input=script, text=True, check=False)
+        subprocess.run([*PRIVATE, "sh"], input=script, text=True, check=False)
         answers = []
         for i, command in enumerate(commands):
             with open(f"{folder}/{i}", encoding="utf-8") as file:
@@ -108,31 +100,9 @@ def nvrcim_each(commands):
 
 
 def nvrcim(*arguments):
-    done = subprocess.run([*PRIVATE, "--scenario", SCENARIO, "--json", *arguments], capture_output=True, text=True,
-                          check=False)
+    done = subprocess.run([*PRIVATE, NVRCIM, "--scenario", SCENARIO, "--json", *arguments], capture_output=True,
+                          text=True, check=False)
     return json.loads(done.stdout)
-
-
-def request(operation, parameters, namespace=NAMESPACE, extrinsic=None):
-    spaces = "".join(f'<NAMESPACE NAME="{part}"/>' for part in namespace.split("/"))
-    spaces = f"<LOCALNAMESPACEPATH>{spaces}</LOCALNAMESPACEPATH>"
-    if extrinsic:
-        inner = (f'<METHODCALL NAME="{operation}"><LOCALINSTANCEPATH>{spaces}{extrinsic}</LOCALINSTANCEPATH>'
-                 f"{parameters}</METHODCALL>")
-    else:
-        inner = f'<IMETHODCALL NAME="{operation}">{spaces}{parameters}</IMETHODCALL>'
-    body = ('<?xml version="1.0" encoding="utf-8"?><CIM CIMVERSION="2.0" DTDVERSION="2.0">'
-            f'<MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ>{inner}</SIMPLEREQ></MESSAGE></CIM>')
-    connection = http.client.HTTPConnection("localhost", PORT, timeout=60)
-    connection.request("POST", "/cimom", body.encode(), {
-        "Content-Type": 'application/xml; charset="utf-8"', "CIMOperation": "MethodCall", "CIMMethod": operation,
-        "CIMObject": namespace.replace("/", "%2F")})
-    answer = connection.getresponse()
-    text = answer.read().decode()
-    connection.close()
-    if answer.status != 200:
-        raise AssertionError(f"{answer.status} {answer.headers.get('CIMError')}: {text}")
-    return text
 
 
 def xml_instance(class_name, **properties):
@@ -326,7 +296,8 @@ class WithWbemcliAfterwards(unittest.TestCase):
                 if value is not None:
                     self.assertIn(told_value(value), told(answered), f"{method}, {name}")
         self.assertIn("10000000", json.dumps(answers[0]["out"]).replace(":", "").upper())
-        as_xml = " ".join(wbemcli("cmx", object_url(services["NVRHBA_FCHBAWWNService"]), f"ReadWWN.Type=3,Target={port}"))
+        as_xml = " ".join(wbemcli("cmx", object_url(services["NVRHBA_FCHBAWWNService"]),
+                                  f"ReadWWN.Type=3,Target={port}"))
         self.assertIn('<RETURNVALUE PARAMTYPE="uint32"><VALUE>0</VALUE></RETURNVALUE>', as_xml)
 
     def test_a_filter_is_created_and_deleted(self):
@@ -345,7 +316,8 @@ class WithWbemcliAfterwards(unittest.TestCase):
 
 def instance_ends(association):
     """The two ends of an association's first instance, as "namespace:Class.keys"."""
-    text = request("EnumerateInstances", f'<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="{association}"/></IPARAMVALUE>')
+    text = request("EnumerateInstances",
+                   f'<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="{association}"/></IPARAMVALUE>')
     for named in re.findall(r"<INSTANCENAME.*?<INSTANCE CLASSNAME", text):
         ends = re.findall(r"<LOCALINSTANCEPATH>(.*?)</LOCALINSTANCEPATH>", named)
         paths = [path_text(end) for end in ends[:2]]
@@ -401,7 +373,7 @@ class WithXml(unittest.TestCase):
         self.assertIn('ERROR CODE="1"', self.delete(filter_name), "a filter in use stays")
 
         port = re.search(r'DeviceID="(\w+)"', names("NVRHBA_FCPort")[0]).group(1)
-        subprocess.run([NVRSIMCTL, "--socket", WORK + "/socket", "link", "down", port], check=True)
+        subprocess.run([NVRSIMCTL, "--socket", SERVER.socket, "link", "down", port], check=True)
         method, body = Listener.received.get(timeout=60)
         self.assertEqual(method, "ExportIndication")
         self.assertIn('<INSTANCE CLASSNAME="NVRHBA_AlertIndication">', body)
@@ -420,12 +392,13 @@ class WithXml(unittest.TestCase):
             reference = f"<VALUE.REFERENCE>{name_of('NVRHBA_PortController', '10000000C9A00001')}</VALUE.REFERENCE>"
             return request("RunDiagnosticService",
                            f'<PARAMVALUE NAME="ManagedElement" PARAMTYPE="reference">{reference}</PARAMVALUE>'
-                           f'<PARAMVALUE NAME="DiagnosticSettings" PARAMTYPE="string"><VALUE>{settings}</VALUE></PARAMVALUE>',
+                           '<PARAMVALUE NAME="DiagnosticSettings" PARAMTYPE="string">'
+                           f"<VALUE>{settings}</VALUE></PARAMVALUE>",
                            extrinsic=name_of("NVRHBA_FCHBADiagnosticTest", "Internal Loopback"))
 
         settings = ('<INSTANCE CLASSNAME="NVRHBA_FCHBADiagnosticSettingData"><PROPERTY NAME="InstanceID" TYPE="string">'
-                    '<VALUE>NVR:FCHBA Internal Loopback Test</VALUE></PROPERTY><PROPERTY NAME="HaltOnError" TYPE="boolean">'
-                    '<VALUE>TRUE</VALUE></PROPERTY></INSTANCE>')
+                    '<VALUE>NVR:FCHBA Internal Loopback Test</VALUE></PROPERTY>'
+                    '<PROPERTY NAME="HaltOnError" TYPE="boolean"><VALUE>TRUE</VALUE></PROPERTY></INSTANCE>')
         for written in (html.escape(settings), f"<![CDATA[{settings}]]>"):
             answer = run(written)
             self.assertIn('<RETURNVALUE PARAMTYPE="uint32"><VALUE>0</VALUE></RETURNVALUE>', answer)
@@ -441,128 +414,6 @@ class WithXml(unittest.TestCase):
             self.assertIn('ERROR CODE="5"', request(operation, class_name), operation)
         for operation in ("GetInstance", "DeleteInstance", "GetProperty", "Associators", "References"):
             self.assertIn('ERROR CODE="4"', request(operation, ""), operation)
-
-
-class WithIll(unittest.TestCase):
-    """Clients that mean ill: whatever they send, the next honest one is answered as before."""
-
-    PORTS = '<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="NVRHBA_FCPort"/></IPARAMVALUE>'
-    HEAD = b"POST /cimom HTTP/1.1\r\nHost: here\r\nContent-Type: application/xml\r\nConnection: close\r\n"
-
-    def setUp(self):
-        self.before = request("EnumerateInstanceNames", self.PORTS)
-
-    def tearDown(self):
-        self.assertEqual(request("EnumerateInstanceNames", self.PORTS), self.before)
-        self.assertIsNone(SERVER.poll())
-
-    def raw(self, data):
-        """All that comes back for these bytes."""
-        with socket.create_connection(("127.0.0.1", PORT), timeout=60) as connection:
-            answer = b""
-            try:
-                connection.sendall(data)
-                connection.shutdown(socket.SHUT_WR)
-                while part := connection.recv(65536):
-                    answer += part
-            except (BrokenPipeError, ConnectionResetError):  # it does not read on
-                pass
-        return answer
-
-    def assert_refused(self, data):
-        """No answer, or one that says whose fault it is."""
-        line = self.raw(data)[:12] or b"HTTP/1.1 400"
-        self.assertRegex(line, rb"^HTTP/1\.[01] (4\d\d|501|505)$", data[:300])
-
-    def body(self, inner):
-        return ('<?xml version="1.0"?><CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE ID="1" PROTOCOLVERSION="1.0">'
-                f"<SIMPLEREQ>{inner}</SIMPLEREQ></MESSAGE></CIM>").encode()
-
-    def post(self, body):
-        return self.HEAD + b"Content-Length: %d\r\n\r\n" % len(body) + body
-
-    def test_lengths_that_lie(self):
-        body = self.body('<IMETHODCALL NAME="EnumerateInstanceNames"><LOCALNAMESPACEPATH><NAMESPACE NAME="root"/>'
-                         f'<NAMESPACE NAME="norvane"/></LOCALNAMESPACEPATH>{self.PORTS}</IMETHODCALL>')
-        self.assertTrue(self.raw(self.post(body)).startswith(b"HTTP/1.1 200"))
-        for length in (b"0", b"1", b"%d" % (len(body) - 1), b"%d" % (len(body) + 1), b"-1", b"+5", b"0x10", b"ten",
-                       b"18446744073709551615", b"18446744073709551616", b"9" * 1000, b""):
-            self.assert_refused(self.HEAD + b"Content-Length: " + length + b"\r\n\r\n" + body)
-        chunked = self.HEAD + b"Transfer-Encoding: chunked\r\n"
-        for chunks in (b"", b"zz\r\n", b"-1\r\n", b"5\r\nab", b"ffffffffffffffffff\r\nx", b"5\r\nabcdefg\r\n0\r\n\r\n",
-                       b"0\r\n\r\n"):
-            self.assert_refused(chunked + b"\r\n" + chunks)
-        # A line without an end fills what libmicrohttpd has for a connection, which it takes for a fault of its own.
-        self.assertIn(self.raw(chunked + b"\r\n5;" + b"x" * 100000)[9:12], (b"", b"400", b"413", b"431", b"500"))
-
-    def test_heads_that_are_none(self):
-        for head in (b"", b"\r\n" * 1000, b"\0" * 1000, b"GET", b"POST /cimom", b"POST\r\n\r\n",
-                     b"POST /cimom HTTP/9.9\r\n\r\n",
-                     b"POST " + b"/" * 100000 + b" HTTP/1.1\r\n\r\n", b"POST /cimom HTTP/1.1\r\n" + b"A: b\r\n" * 20000 + b"\r\n",
-                     b"POST /cimom HTTP/1.1\r\n: no name\r\n\r\n", bytes(range(256)) * 100, b"\x16\x03\x01\x02\x00" * 50):
-            self.assert_refused(head)
-
-    def test_bodies_that_are_none(self):
-        entities = "".join(f'<!ENTITY e{i} "{f"&e{i - 1};" * 10 if i else "x" * 10}">' for i in range(20))
-        for body in (b"", b"<", b"\0" * 1000, b"<CIM", b"<CIM>" * 100000, b"<" * 1000000, b"&" * 100000, b"]]>",
-                     ("<CIM" + "".join(f' A{i}="b"' for i in range(100000)) + "/>").encode(),
-                     self.body("x" * 1000000), self.body("<![CDATA["), self.body("<A>" * 50000 + "</A>" * 50000),
-                     f"<!DOCTYPE CIM [{entities}]><CIM>&e19;</CIM>".encode(),
-                     b'<!DOCTYPE CIM [<!ENTITY f SYSTEM "file:///etc/passwd">]><CIM>&f;</CIM>',
-                     self.body('<IMETHODCALL NAME="EnumerateInstances"/>').decode().encode("utf-16"),
-                     bytes(range(256)) * 1000):
-            answer = self.raw(self.post(body))
-            self.assertRegex(answer[:12], rb"^HTTP/1\.1 (200|4\d\d|501)$", body[:100])
-            self.assertNotIn(b"root:", answer)
-            if answer.startswith(b"HTTP/1.1 200"):
-                self.assertIn(b"<ERROR CODE=", answer, body[:100])
-
-    def test_operations_that_nobody_knows(self):
-        for name in ("", "NoSuchOperation", "x" * 100000, "&#0;", "../..", "EnumerateInstances&#x0a;X: y"):
-            answer = self.raw(self.post(self.body(
-                f'<IMETHODCALL NAME="{name}"><LOCALNAMESPACEPATH><NAMESPACE NAME="root"/></LOCALNAMESPACEPATH></IMETHODCALL>')))
-            self.assertTrue(b"<ERROR CODE=" in answer or answer.startswith((b"HTTP/1.1 400", b"HTTP/1.1 501")), answer[:300])
-
-    def test_arguments_of_each_service_that_are_of_another_type(self):
-        values = ['<VALUE>"%n%s"</VALUE>', "<VALUE/>", "<VALUE>-99999999999999999999999</VALUE>", "<VALUE.ARRAY/>",
-                  "<VALUE.ARRAY><VALUE>1</VALUE><VALUE.NULL/><VALUE>x</VALUE></VALUE.ARRAY>", "<VALUE.REFERENCE/>",
-                  '<VALUE.REFERENCE><INSTANCENAME CLASSNAME="NVRHBA_Nothing"/></VALUE.REFERENCE>',
-                  '<VALUE.REFERENCE><CLASSNAME NAME="NVRHBA_FCPort"/></VALUE.REFERENCE>',
-                  f"<VALUE>{'A' * 1048576}</VALUE>", ""]
-        kinds = ["", ' PARAMTYPE="string"', ' PARAMTYPE="reference"', ' PARAMTYPE="uint8"', ' PARAMTYPE="none"']
-        called = 0
-        for service in ("NVRHBA_FCHBAWWNService", "NVRHBA_DumpService", "NVRHBA_FCTagService", "NVRHBA_BootBIOSService",
-                        "NVRHBA_SoftwareInstallationService", "NVRHBA_FCHBADriverParamService", "NVRHBA_RecordLog",
-                        "NVRHBA_FCHBADiagnosticTest"):
-            name = re.search("<INSTANCENAME.*?</INSTANCENAME>", request(
-                "EnumerateInstanceNames", self.PORTS.replace("NVRHBA_FCPort", service)), re.S).group(0)
-            declared = request("GetClass", self.PORTS.replace("NVRHBA_FCPort", service) +
-                               '<IPARAMVALUE NAME="LocalOnly"><VALUE>FALSE</VALUE></IPARAMVALUE>')
-            for method, inner in re.findall(r'<METHOD NAME="(\w+)".*?>(.*?)</METHOD>', declared, re.S):
-                for parameter in re.findall(r'<PARAMETER[.\w]* NAME="(\w+)"', inner):
-                    for number, value in enumerate(values):
-                        kind = kinds[number % len(kinds)]
-                        try:
-                            answer = request(method, f'<PARAMVALUE NAME="{parameter}"{kind}>{value}</PARAMVALUE>',
-                                             extrinsic=name)
-                            self.assertRegex(answer, "<RETURNVALUE|<ERROR CODE=", (service, method, parameter, value[:99]))
-                        except AssertionError as refused:
-                            self.assertRegex(str(refused), "^400 ", (service, method, parameter, value[:99]))
-                        called += 1
-        self.assertGreater(called, 300)
-
-    def test_more_connections_than_it_takes(self):
-        connections = []
-        try:
-            for number in range(600):
-                connections.append(socket.create_connection(("127.0.0.1", PORT), timeout=60))
-                try:
-                    connections[-1].sendall(self.HEAD[:number % len(self.HEAD)])
-                except (BrokenPipeError, ConnectionResetError):  # it has enough
-                    pass
-        finally:
-            for connection in connections:
-                connection.close()
 
 
 unittest.main(verbosity=2)
