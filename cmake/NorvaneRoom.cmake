@@ -19,7 +19,8 @@ endfunction()
 # process of its own, since much of what is tested lives once a process. Under a sanitizer, or with coverage, it may take
 # five times as long.
 # Its tests run once more in each of MANNERS, but for those that have a parameter (most often a manner) or start a server
-# that takes its manner as an argument, and those that read the module's file. The sanitizers see them in one manner.
+# that takes its manner as an argument, and those that read the module's file. In a build with a sanitizer these runs, and
+# the tests whose names begin with "Also/", have the label "all": only the test presets that go through all make them.
 function(norvane_test name)
   cmake_parse_arguments(TEST "" "TIMEOUT" "SOURCES;LINK;ENVIRONMENT;MANNERS" ${ARGN})
   if(NOT TEST_TIMEOUT)
@@ -33,14 +34,17 @@ function(norvane_test name)
   if(NOT TEST_SOURCES MATCHES "\\.c(;|$)") # the headers are compiled for C++ alone
     target_precompile_headers(${name} REUSE_FROM norvane_test_headers)
   endif()
-  gtest_discover_tests(${name} TEST_PREFIX "${name}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST
+  gtest_discover_tests(${name} TEST_PREFIX "${name}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST TEST_FILTER "-Also/*"
     PROPERTIES TIMEOUT ${TEST_TIMEOUT} ENVIRONMENT "${TEST_ENVIRONMENT}")
-  if(NORVANE_SANITIZE)
-    set(TEST_MANNERS "")
+  set(label "")
+  if(NORVANE_SANITIZE AND TEST_MANNERS)
+    set(label LABELS all)
+    gtest_discover_tests(${name} TEST_PREFIX "${name}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST TEST_FILTER "Also/*"
+      TEST_LIST "${name}_also" PROPERTIES TIMEOUT ${TEST_TIMEOUT} ${label} ENVIRONMENT "${TEST_ENVIRONMENT}")
   endif()
   foreach(manner IN LISTS TEST_MANNERS)
     gtest_discover_tests(${name} TEST_PREFIX "${name}.${manner}." NO_PRETTY_VALUES DISCOVERY_MODE PRE_TEST
       TEST_FILTER "-*/*:*Command.*:*Actions.*:Exports.*:Factories.*:Registrations.*" TEST_LIST "${name}_${manner}"
-      PROPERTIES TIMEOUT ${TEST_TIMEOUT} ENVIRONMENT "NORVANE_MANNER=${manner}")
+      PROPERTIES TIMEOUT ${TEST_TIMEOUT} ${label} ENVIRONMENT "NORVANE_MANNER=${manner}")
   endforeach()
 endfunction()

@@ -4,6 +4,7 @@
 
 #include "agent/Agent_Wait.h"
 #include "tests/agent/Simulated_Host.h"
+#include "tests/support/Cases.h"
 #include "tests/support/short_memory.h"
 
 using namespace cimple;
@@ -45,7 +46,8 @@ protected:
                                                        EXPECT_TRUE(status == 0 || status == 32769) << status;
                                                        for (const std::string& word : words())
                                                            all.insert(word);
-                                                   });
+                                                   },
+                                                   static_cast<long>(each_of_cases(1, 5)));
         EXPECT_GT(pieces, 50);
         EXPECT_EQ(status, 0u) << "the last one had all that it wanted";
         return all;

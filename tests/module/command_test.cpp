@@ -5,6 +5,7 @@
 
 #include "tests/module/support/Command_Line.h"
 #include "tests/module/support/Rig.h"
+#include "tests/support/Cases.h"
 #include "tests/support/private_host.h"
 
 using namespace nvrtest;
@@ -109,8 +110,10 @@ TEST(Command, ShowsASmallHostAsATree)
 
 TEST(Command, FindsNoFaultInTheAssociationsOfATypicalHostInEveryManner)
 {
+    // The thread sanitizer sees a small one: the classes and the threads of each manner are the same.
+    const char* const host = each_of_cases(1, 2) == 1 ? "typical" : "small";
     for (const host::Manner* manner : every_manner()) {
-        const Ended_Command run = nvrcim(std::string("--manner ") + manner->name + " check", "typical");
+        const Ended_Command run = nvrcim(std::string("--manner ") + manner->name + " check", host);
         EXPECT_EQ(run.status, 0) << manner->name << "\n" << run.output;
         EXPECT_THAT(run.output, testing::StartsWith("91 association classes, ")) << manner->name;
         EXPECT_THAT(run.output, testing::EndsWith("; 0 faults\n")) << manner->name;

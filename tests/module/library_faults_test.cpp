@@ -12,6 +12,7 @@
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
 #include "tests/module/support/Test_Clock.h"
+#include "tests/support/Cases.h"
 #include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
@@ -107,20 +108,11 @@ std::vector<std::string> faults_of_one_call(std::size_t sample)
     for (const Library_Failure& failure : library_failures())
         faults.push_back(failure.fault);
     faults.insert(faults.end(), std::begin(more_faults), std::end(more_faults));
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#ifdef __SANITIZE_THREAD__
-    constexpr std::size_t step = 15;
-#else
-    constexpr std::size_t step = 6;
-#endif
+    const std::size_t each = each_of_cases(6, 15);
     std::vector<std::string> some;
-    for (std::size_t i = sample % step; i < faults.size(); i += step)
+    for (std::size_t i = sample % each; i < faults.size(); i += each)
         some.push_back(faults[i]);
     return some;
-#else
-    (void)sample;
-    return faults;
-#endif
 }
 
 } // namespace

@@ -13,6 +13,7 @@
 #include "tests/module/support/Quiet_Output.h"
 #include "tests/module/support/Records.h"
 #include "tests/module/support/Rig.h"
+#include "tests/support/Cases.h"
 #include "tests/support/private_host.h"
 
 using namespace nvrtest;
@@ -327,10 +328,11 @@ TEST_P(Traversals, OfEveryAssociationClassFindWhatItsInstancesSay)
     // Nothing makes instances of these: three have no builder, and the provider's log takes no record.
     const std::set<std::string> empty = {"NVRHBA_ChassisContainsCard", "NVRHBA_HostedService",
                                          "NVRHBA_RecordLogManagesRecord", "NVRHBA_VMSystemDevice"};
+    // Their answers all come from one walk over the maps.
+    const std::size_t each = each_of_cases(1, 4);
     std::size_t classes = 0;
     for (const auto& row : expected_rows("providers.txt")) {
-        if (row.at(1) != "association") continue;
-        classes++;
+        if (row.at(1) != "association" || classes++ % each != 0) continue;
         EXPECT_EQ(check(*rig, row[0]) == 0, empty.count(row[0]) == 1) << row[0];
     }
     EXPECT_EQ(classes, 91u);

@@ -10,12 +10,12 @@ void refuse_allocation(long number);
 /// Refuses none any more. Result: whether one was refused.
 bool forget_refusal();
 
-/// Runs `act` with its first allocation refused, then with its second, and so on, until none is; `check(has_thrown)` is
-/// asked after each. Result: how many there were.
+/// Runs `act` with its first allocation refused, then with the one `step` further on, and so on, until none is;
+/// `check(has_thrown)` is asked after each. Result: how many there were, or somewhat more with a step of more than 1.
 template <class Act, class Check>
-long refuse_each_allocation(Act act, Check check)
+long refuse_each_allocation(Act act, Check check, long step = 1)
 {
-    for (long number = 1;; number++) {
+    for (long number = 1;; number += step) {
         bool has_thrown = false;
         refuse_allocation(number);
         try {

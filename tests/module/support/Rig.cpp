@@ -231,6 +231,11 @@ std::vector<const host::Manner*> every_manner()
     return {&host::Manner::strict(), &host::Manner::sfcb(), &host::Manner::pegasus()};
 }
 
+std::vector<const host::Manner*> other_manners()
+{
+    return {&host::Manner::sfcb(), &host::Manner::pegasus()};
+}
+
 std::string manner_label(const host::Manner& manner)
 {
     return manner.name;

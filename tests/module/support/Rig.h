@@ -130,17 +130,21 @@ MATCHER_P(failed_with, code, "")
 /// The manners of real servers and the strictest one, for parameterised tests.
 class Every_Manner : public testing::TestWithParam<const host::Manner*> {};
 std::vector<const host::Manner*> every_manner();
-#define NVR_IN_MANNERS(manners, suite)                                                                                 \
-    INSTANTIATE_TEST_SUITE_P(In, suite, testing::ValuesIn(manners),                                                    \
+/// All but the strict one.
+std::vector<const host::Manner*> other_manners();
+#define NVR_IN_MANNERS(prefix, manners, suite)                                                                         \
+    INSTANTIATE_TEST_SUITE_P(prefix, suite, testing::ValuesIn(manners),                                                \
                              [](const auto& info) { return nvrtest::manner_label(*info.param); })
 /// For tests whose threads meet.
-#define NVR_THREADS_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(nvrtest::every_manner(), suite)
+#define NVR_THREADS_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(In, nvrtest::every_manner(), suite)
 /// For tests that ask one thing after the other: the sanitizers, under which they take up to ten times as long, see
-/// them in the strict manner alone.
+/// them in the strict manner alone, and in the others (`Also/`) under the test presets that go through all.
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(std::vector{&host::Manner::strict()}, suite)
+#define NVR_IN_EVERY_MANNER(suite)                                                                                     \
+    NVR_IN_MANNERS(In, std::vector{&host::Manner::strict()}, suite);                                                   \
+    NVR_IN_MANNERS(Also, nvrtest::other_manners(), suite)
 #else
-#define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(nvrtest::every_manner(), suite)
+#define NVR_IN_EVERY_MANNER(suite) NVR_IN_MANNERS(In, nvrtest::every_manner(), suite)
 #endif
 std::string manner_label(const host::Manner& manner);
 
