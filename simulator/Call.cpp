@@ -38,24 +38,26 @@ Call::Call(Call_Id id, const Subject& subject)
     resolve(subject);
     ++m_simulator.counters[static_cast<size_t>(id)];
     const char* name = to_text(id);
-    bool hit = false;
-    for (Fault& fault : m_simulator.faults) {
+    m_clearings = m_simulator.faultClearings;
+    for (size_t i = 0; i < m_simulator.faults.size(); ++i) {
+        Fault& fault = m_simulator.faults[i];
         if (!matches(fault, name, subject)) continue;
         ++fault.seen;
-        if (hit || fault.seen < fault.from || fault.seen - fault.from >= fault.times) continue;
+        if (m_hit || fault.seen < fault.from || fault.seen - fault.from >= fault.times) continue;
         ++fault.hits;
         m_fault = fault;
-        hit = true;
+        m_hit = i + 1;
     }
+    note_change(m_fault.throws || m_fault.absent || m_fault.delay || is_refused());
     if (m_fault.delay) {
-        const auto is_over = [&, clearings = m_simulator.faultClearings] {
-            return m_simulator.faultClearings != clearings;
-        };
+        const auto is_over = [&] { return m_simulator.faultClearings != m_clearings; };
         m_simulator.faultsCleared.wait_for(m_lock, std::chrono::milliseconds(m_fault.delay), is_over);
         resolve(subject); // the host may be another one now
     }
     if (m_port) m_wwpn = m_port->current.wwpn;
+    if (m_adapter && m_adapter->present) note_gift(adapter_gift);
     if (m_fault.vanish && m_adapter) {
+        note_change(m_adapter->present);
         m_adapter->present = false;
         m_simulator.host.reindex();
         resolve(subject);
@@ -64,8 +66,9 @@ Call::Call(Call_Id id, const Subject& subject)
 
 Call::~Call()
 {
+    if (m_hit && m_hasChanged && m_clearings == m_simulator.faultClearings) ++m_simulator.faults[m_hit - 1].changed;
     try {
-        m_simulator.log.push_back({m_id, m_wwpn, m_result});
+        m_simulator.log.push_back({m_id, m_wwpn, m_result, m_gifts});
         if (m_simulator.log.size() > longestLog) m_simulator.log.pop_front();
     } catch (const std::exception&) {
         // A log without this line is all that is lost.
@@ -115,9 +118,39 @@ bool Call::matches(const Fault& fault, const char* name, const Subject& subject)
     return m_adapter && std::any_of(m_adapter->ports.begin(), m_adapter->ports.end(), isIt);
 }
 
+int64_t Call::status_for(int64_t own)
+{
+    if (!m_fault.status) return own;
+    note_change(*m_fault.status != own);
+    return *m_fault.status;
+}
+
+uint64_t Call::count(uint64_t own)
+{
+    note_gift(count_gift);
+    if (!m_fault.value) return own;
+    note_change(*m_fault.value != own);
+    return *m_fault.value;
+}
+
+bool Call::keeps_handle()
+{
+    note_gift(place_gift);
+    if (m_fault.damage != Damage::null) return false;
+    note_change();
+    return true;
+}
+
 void Call::bytes(void* target, const void* source, size_t size)
 {
     if (!target || !size) return;
+    note_gift(bytes_gift);
+    damage(target, source, size);
+    note_change(std::memcmp(target, source, size) != 0);
+}
+
+void Call::damage(void* target, const void* source, size_t size)
+{
     switch (m_fault.damage) {
     case Damage::none:
     case Damage::unterminated:
@@ -146,7 +179,9 @@ void Call::bytes(void* target, const void* source, size_t size)
 void Call::fill(char* target, size_t capacity, const std::string& text, bool terminated)
 {
     if (!capacity) return;
+    if (terminated || text.size() < capacity) note_gift(text_gift);
     if (m_fault.damage == Damage::unterminated) {
+        note_change(terminated || text.size() < capacity);
         for (size_t i = 0; i < capacity; ++i)
             target[i] = text.empty() ? 'X' : text[i % text.size()];
         return;

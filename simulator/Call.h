@@ -49,23 +49,44 @@ public:
     bool is_absent() const { return m_fault.absent; }
     /// True if the call shall answer its fault's status and do nothing else.
     bool is_refused() const { return m_fault.status && !m_fault.writes(); }
-    bool has_status() const { return m_fault.status.has_value(); }
     int64_t status() const { return *m_fault.status; }
+    /// The call's own status, or the fault's in its place.
+    int64_t status_for(int64_t own);
     Damage damage() const { return m_fault.damage; }
-    bool replaces_numbers() const { return m_fault.value.has_value(); }
-    uint64_t replacement() const { return *m_fault.value; }
     int64_t note(int64_t result) { return m_result = result; }
+    /// The fault has made a difference to the caller.
+    void note_change(bool is_one = true) { m_hasChanged |= is_one; }
+    /// Remembers that the call hands such a thing out.
+    void note_gift(Gift gift) { m_gifts |= gift; }
+
+    /// A count that is the call's result, or the fault's in its place.
+    uint64_t count(uint64_t own);
+    /// True if the fault keeps back the handle that the call would hand out.
+    bool keeps_handle();
 
     /// Writes bytes to the caller, damaged as the fault says. Null targets are passed over.
     void bytes(void* target, const void* source, size_t size);
-    /// Writes a number: a count, a size, a code.
+    /// Writes a count or a size of what the call writes, which only `value` changes: bytes that are damaged are looked
+    /// at by the callers that believe their size.
     template <class T>
     void number(T* target, uint64_t value)
     {
         static_assert(std::is_unsigned<T>::value, "numbers are unsigned");
-        if (!target || m_fault.damage == Damage::null) return;
-        const T word = static_cast<T>(m_fault.value ? *m_fault.value : value);
-        std::memcpy(target, &word, sizeof word);
+        if (!target) return;
+        note_gift(number_gift);
+        const T own = static_cast<T>(value), word = static_cast<T>(m_fault.value ? *m_fault.value : value);
+        if (m_fault.damage != Damage::null) std::memcpy(target, &word, sizeof word);
+        note_change(std::memcmp(target, &own, sizeof own) != 0);
+    }
+    /// Writes a number that is an answer by itself: a code, a state, an identifier. Damage is done to it as to bytes.
+    template <class T>
+    void answer(T* target, uint64_t value)
+    {
+        if (!target) return;
+        if (m_fault.value) return number(target, value);
+        note_gift(number_gift);
+        const T own = static_cast<T>(value);
+        bytes(target, &own, sizeof own);
     }
     /// Fills a text field of a record that `bytes` will write.
     template <size_t size>
@@ -86,6 +107,7 @@ public:
     uint32_t block(const Bytes& data, void* target, uint32_t* size);
 
 private:
+    void damage(void* target, const void* source, size_t size);
     void fill(char* target, size_t capacity, const std::string& text, bool terminated = true);
     void resolve(const Subject& subject);
     bool matches(const Fault& fault, const char* name, const Subject& subject) const;
@@ -112,6 +134,10 @@ private:
     Wwn m_wwpn = 0;
     int64_t m_result = 0;
     uint64_t m_start = 0; // 0: not timed
+    size_t m_hit = 0;     // number of the fault, from 1; 0: none
+    uint64_t m_clearings = 0;
+    bool m_hasChanged = false;
+    uint8_t m_gifts = 0;
     uint32_t m_noise = 0x9E3779B9;
 };
 
@@ -128,10 +154,8 @@ Result run(Call_Id id, const Subject& subject, Result missing, Work work)
         if (call.throws()) throw Library_Exception();
         if (call.is_absent()) return missing;
         if (call.is_refused()) return static_cast<Result>(call.note(call.status()));
-        auto result = static_cast<Result>(work(call));
-        if (call.has_status()) result = static_cast<Result>(call.status());
-        call.note(static_cast<int64_t>(result));
-        return result;
+        const auto own = static_cast<Result>(work(call));
+        return static_cast<Result>(call.note(call.status_for(static_cast<int64_t>(own))));
     } catch (const std::exception&) {
         return missing; // memory ran out
     }

@@ -105,6 +105,16 @@ NVRSIM_EXPORT size_t nvrsim_faults(char* buffer, size_t size)
     return guarded<size_t>(0, [&] { return give(describe_faults(), buffer, size); });
 }
 
+NVRSIM_EXPORT int nvrsim_would_change(const char* table)
+{
+    return guarded(-1, [&] {
+        const Fault fault = parse_fault(as_text(table));
+        Simulator& simulator = Simulator::instance();
+        std::lock_guard<std::mutex> lock(simulator.mutex);
+        return static_cast<int>(simulator.would_change(fault));
+    });
+}
+
 NVRSIM_EXPORT uint64_t nvrsim_calls(const char* operation)
 {
     Simulator& simulator = Simulator::instance();

@@ -41,7 +41,7 @@ uint32_t start(Call& call, Port& port, Test_Type type, const char* kind, const R
     const uint32_t id = diagnostics.nextId++;
     diagnostics.tests[id] =
         Diagnostic_Test{id, type, diagnostics.polls, result, request.cycles, diagnostics.cancelPolls, false};
-    call.number(testId, id);
+    call.answer(testId, id);
     return RM_STATUS_OK;
 }
 
@@ -63,7 +63,7 @@ uint32_t nvrsim_RM_DiagBeaconState(HBA_WWN wwn, uint32_t* state)
     return run_on_port(Call_Id::RM_DiagBeaconState, wwn, [&](Call& call, Port& port) -> uint32_t {
         if (port.beaconStatus) return port.beaconStatus;
         if (!state) return RM_STATUS_ARGUMENT;
-        call.number(state, port.beacon);
+        call.answer(state, port.beacon);
         return RM_STATUS_OK;
     });
 }

@@ -146,7 +146,7 @@ uint32_t nvrsim_RM_DeleteDumpFiles(HBA_WWN wwn)
 uint32_t nvrsim_RM_GetDumpRetentionCount(HBA_WWN wwn, uint32_t* count)
 {
     return run_on_port(Call_Id::RM_GetDumpRetentionCount, wwn, [&](Call& call, Port& port) {
-        call.number(count, port.retention);
+        call.answer(count, port.retention);
         return count ? RM_STATUS_OK : RM_STATUS_ARGUMENT;
     });
 }

@@ -37,6 +37,7 @@ struct Fault {
 
     uint64_t seen = 0; // matching calls so far
     uint64_t hits = 0;
+    uint64_t changed = 0; // hits that made a difference to the caller
 
     bool concerns(const char* name) const;
     /// True if the fault changes what is written, so that the call must run although it answers a status.

@@ -56,7 +56,7 @@ uint32_t reply(Call& call, const Scsi_Reply& answer, void* response, uint32_t* r
     const auto fits = [&call](const Bytes& data, void* target, uint32_t* size) {
         const uint32_t used = static_cast<uint32_t>(std::min<size_t>(data.size(), *size));
         call.bytes(target, data.data(), used);
-        *size = used;
+        call.number(size, used);
     };
     fits(answer.data, response, responseSize);
     fits(answer.sense, sense, senseSize);
@@ -101,9 +101,8 @@ HBA_STATUS nvrsim_HBA_FreeLibrary()
 
 HBA_UINT32 nvrsim_HBA_GetNumberOfAdapters()
 {
-    return run<uint32_t>(Call_Id::HBA_GetNumberOfAdapters, {}, 0, [](Call& call) -> uint64_t {
-        return call.replaces_numbers() ? call.replacement() : call.simulator().count_present();
-    });
+    return run<uint32_t>(Call_Id::HBA_GetNumberOfAdapters, {}, 0,
+                         [](Call& call) -> uint64_t { return call.count(call.simulator().count_present()); });
 }
 
 HBA_STATUS nvrsim_HBA_GetAdapterName(HBA_UINT32 index, char* name)
@@ -119,7 +118,7 @@ HBA_STATUS nvrsim_HBA_GetAdapterName(HBA_UINT32 index, char* name)
 HBA_HANDLE nvrsim_HBA_OpenAdapter(char* name)
 {
     return run<uint32_t>(Call_Id::HBA_OpenAdapter, Subject::of_name(name), 1, [](Call& call) -> uint32_t {
-        if (call.damage() == Damage::null || !call.adapter() || !call.adapter()->present) return HBA_HANDLE_INVALID;
+        if (!call.adapter() || !call.adapter()->present || call.keeps_handle()) return HBA_HANDLE_INVALID;
         return call.simulator().open(call.adapter()->name, false);
     });
 }
@@ -135,7 +134,7 @@ HBA_STATUS nvrsim_HBA_OpenAdapterByWWN(HBA_HANDLE* handle, HBA_WWN wwn)
             for (const Port& port : adapter.ports)
                 found = found || port.current.wwpn == wanted || port.current.wwnn == wanted;
             if (!found) continue;
-            call.number(handle, call.simulator().open(adapter.name, false));
+            call.answer(handle, call.simulator().open(adapter.name, false));
             return HBA_STATUS_OK;
         }
         return HBA_STATUS_ERROR_ILLEGAL_WWN;

@@ -126,7 +126,9 @@ void* nvrsim_RM_GetAttributeValue(void* block, uint16_t number, uint16_t* length
             value = find_attribute(block, number, found);
             if (value) result = RM_STATUS_OK;
         }
-        if (call.has_status()) result = static_cast<uint32_t>(call.status());
+        result = static_cast<uint32_t>(call.status_for(result));
+        call.note_gift(bytes_gift);
+        const void* const own = value;
         switch (call.damage()) {
         case Damage::null:
             value = nullptr;
@@ -141,8 +143,9 @@ void* nvrsim_RM_GetAttributeValue(void* block, uint16_t number, uint16_t* length
         default:
             break;
         }
+        call.note_change(value != own);
         if (length) {
-            const uint16_t told = call.replaces_numbers() ? static_cast<uint16_t>(call.replacement()) : found;
+            const auto told = static_cast<uint16_t>(call.count(found));
             std::memcpy(length, &told, sizeof told);
         }
         if (status) std::memcpy(status, &result, sizeof result);
@@ -156,7 +159,7 @@ void* nvrsim_RM_GetAttributeValue(void* block, uint16_t number, uint16_t* length
 uint32_t nvrsim_RM_GetDriverType(HBA_WWN wwn, uint32_t* type)
 {
     return run_on_port(Call_Id::RM_GetDriverType, wwn, [&](Call& call, Port& port) {
-        call.number(type, port.driverType);
+        call.answer(type, port.driverType);
         return type ? RM_STATUS_OK : RM_STATUS_ARGUMENT;
     });
 }
@@ -165,7 +168,7 @@ uint32_t nvrsim_RM_IsLocalHBA(HBA_WWN wwn, uint32_t* local)
 {
     return run<uint32_t>(Call_Id::RM_IsLocalHBA, Subject::of_port(wwn), 1, [&](Call& call) {
         if (!local) return RM_STATUS_ARGUMENT;
-        call.number(local, call.port() && call.port()->local);
+        call.answer(local, call.port() && call.port()->local);
         return RM_STATUS_OK;
     });
 }
@@ -173,11 +176,10 @@ uint32_t nvrsim_RM_IsLocalHBA(HBA_WWN wwn, uint32_t* local)
 uint32_t nvrsim_RM_GetNumberOfLocalAdapters()
 {
     return run<uint32_t>(Call_Id::RM_GetNumberOfLocalAdapters, {}, 0, [](Call& call) -> uint64_t {
-        if (call.replaces_numbers()) return call.replacement();
         uint64_t count = 0;
         for (const Adapter& adapter : call.simulator().host.adapters)
             if (adapter.present) count += adapter.ports.size();
-        return count;
+        return call.count(count);
     });
 }
 

@@ -74,7 +74,7 @@ uint32_t nvrsim_RM_ValidateWwn(const HBA_WWN* wwn)
 uint32_t nvrsim_RM_GetWWNCapability(HBA_WWN wwn, uint32_t* capability)
 {
     return run_on_port(Call_Id::RM_GetWWNCapability, wwn, [&](Call& call, Port& port) {
-        call.number(capability, port.wwnCapability);
+        call.answer(capability, port.wwnCapability);
         return capability ? RM_STATUS_OK : RM_STATUS_ARGUMENT;
     });
 }
@@ -111,7 +111,7 @@ uint32_t nvrsim_RM_ReadWWN(HBA_WWN wwn, uint32_t type, HBA_WWN* wwpn, HBA_WWN* w
         const HBA_WWN portName = to_wire(names.wwpn), nodeName = to_wire(names.wwnn);
         call.bytes(wwpn, &portName, sizeof portName);
         call.bytes(wwnn, &nodeName, sizeof nodeName);
-        call.number(status, word);
+        call.answer(status, word);
         return RM_STATUS_OK;
     });
 }
@@ -127,7 +127,7 @@ uint32_t nvrsim_RM_ChangeWWN(HBA_WWN wwn, HBA_WWN newWwpn, HBA_WWN newWwnn, uint
         if (!is_possible(newWwpn) || !is_possible(newWwnn)) return RM_STATUS_ILLEGAL_WWN;
         port.pending =
             Pending_Names{{to_number(newWwpn), to_number(newWwnn)}, isVolatile, false, activation(port, isVolatile)};
-        call.number(code, port.pending->activation);
+        call.answer(code, port.pending->activation);
         return RM_STATUS_OK;
     });
 }
@@ -139,11 +139,11 @@ uint32_t nvrsim_RM_RestoreWWN(HBA_WWN wwn, uint32_t type, uint32_t* code)
         if (port.wwnCapability & RM_WWN_READ_ONLY) return RM_STATUS_WWN_NOT_AVAILABLE;
         const Names names = type == 0 ? port.factory : lasting_names(port);
         if (same(names, port.current) && !port.pending) {
-            call.number(code, RM_ACTIVATION_ALREADY_ACTIVE);
+            call.answer(code, RM_ACTIVATION_ALREADY_ACTIVE);
             return RM_STATUS_OK;
         }
         port.pending = Pending_Names{names, false, true, activation(port, false)};
-        call.number(code, port.pending->activation);
+        call.answer(code, port.pending->activation);
         return RM_STATUS_OK;
     });
 }
@@ -167,7 +167,7 @@ uint32_t nvrsim_RM_SetPortEnabled(HBA_WWN wwn, uint32_t enable, uint8_t* code)
         if (!code) return RM_STATUS_ARGUMENT;
         if (port.bootCode) return RM_STATUS_BOOT_CODE_ENABLED;
         port.enabled = enable != 0;
-        call.number(code, port.enableNeedsReset ? RM_PORT_ACTIVATION_RESET : 0);
+        call.answer(code, port.enableNeedsReset ? RM_PORT_ACTIVATION_RESET : 0);
         return RM_STATUS_OK;
     });
 }

@@ -62,6 +62,25 @@ void Simulator::clear_faults()
     faultsCleared.notify_all();
 }
 
+bool Simulator::would_change(const Fault& fault) const
+{
+    uint64_t seen = 0;
+    for (const Log_Entry& entry : log) {
+        if (!fault.concerns(to_text(entry.id)) || ++seen < fault.from) continue;
+        if (fault.throws || fault.absent || fault.delay) return true;
+        if (fault.status && (*fault.status != entry.result || (!fault.writes() && entry.gifts))) return true;
+        int changed = (fault.value ? number_gift | count_gift : 0) | (fault.vanish ? adapter_gift : 0);
+        if (fault.damage == Damage::unterminated)
+            changed |= text_gift;
+        else if (fault.damage == Damage::null)
+            changed |= number_gift | bytes_gift | place_gift;
+        else if (fault.damage != Damage::none)
+            changed |= bytes_gift;
+        return entry.gifts & changed;
+    }
+    return false;
+}
+
 void Simulator::clear()
 {
     host = Host();

@@ -24,10 +24,21 @@ enum class Call_Id : uint32_t {
 
 const char* to_text(Call_Id id);
 
+/// What a call can hand out or be about, for faults to change; bits.
+enum Gift : uint8_t {
+    number_gift = 1, // a count, a size, a code
+    bytes_gift = 2,
+    text_gift = 4,
+    place_gift = 8,    // a handle
+    count_gift = 16,   // a count that is the result
+    adapter_gift = 32, // is about one that is there
+};
+
 struct Log_Entry {
     Call_Id id;
     Wwn port; // 0: none
     int64_t result;
+    uint8_t gifts;
 };
 
 /// Everything but `mutex` is touched with `mutex` held.
@@ -60,6 +71,9 @@ struct Simulator {
     bool reload();
     /// The calls that they hold up go on.
     void clear_faults();
+    /// Whether the fault would change something of the call that it hits first, had it been there from the start of the
+    /// log on. By what the call handed out: zeros in the place of zeros count as a change.
+    bool would_change(const Fault& fault) const;
 
     /// 0 when there are too many.
     uint32_t open(const std::string& adapterName, bool tags);

@@ -103,7 +103,7 @@ std::string describe_faults()
         if (fault.vanish) text << " vanish";
         text << " from=" << fault.from;
         if (fault.times != UINT64_MAX) text << " times=" << fault.times;
-        text << " seen=" << fault.seen << " hits=" << fault.hits << '\n';
+        text << " seen=" << fault.seen << " hits=" << fault.hits << " changed=" << fault.changed << '\n';
     }
     return text.str();
 }

@@ -15,15 +15,14 @@ uint32_t nvrsim_CPQFC_FreeLibrary()
 
 uint32_t nvrsim_CPQFC_GetNumberOfAdapters()
 {
-    return run<uint32_t>(Call_Id::CPQFC_GetNumberOfAdapters, {}, 1, [](Call& call) -> uint64_t {
-        return call.replaces_numbers() ? call.replacement() : call.simulator().count_present();
-    });
+    return run<uint32_t>(Call_Id::CPQFC_GetNumberOfAdapters, {}, 1,
+                         [](Call& call) -> uint64_t { return call.count(call.simulator().count_present()); });
 }
 
 uint32_t nvrsim_CPQFC_OpenAdapter(const char* name)
 {
     return run<uint32_t>(Call_Id::CPQFC_OpenAdapter, Subject::of_name(name), 1, [](Call& call) -> uint32_t {
-        if (call.damage() == Damage::null || !call.adapter() || !call.adapter()->present) return 0;
+        if (!call.adapter() || !call.adapter()->present || call.keeps_handle()) return 0;
         return call.simulator().open(call.adapter()->name, true);
     });
 }
@@ -71,7 +70,7 @@ uint32_t nvrsim_CPQFC_QoSSetConfig(uint32_t handle, const CPQFC_QOSCONFIG* confi
 uint32_t nvrsim_CPQFC_QoSGetGlobalFlag(uint32_t handle, uint32_t* flag)
 {
     return run_on_adapter(Call_Id::CPQFC_QoSGetGlobalFlag, Subject::of_tags(handle), [&](Call& call, Adapter& adapter) {
-        call.number(flag, adapter.tagFlag);
+        call.answer(flag, adapter.tagFlag);
         return flag ? RM_STATUS_OK : RM_STATUS_ARGUMENT;
     });
 }

@@ -29,8 +29,12 @@ size_t nvrsim_error(char* buffer, size_t size);
  * Its number (above 0), or -1. */
 int nvrsim_fault(const char* table);
 void nvrsim_clear_faults(void);
-/* One line for each fault with its calls seen and hit. */
+/* One line for each fault with its calls seen and hit, and those that it changed: something was handed to the caller, or
+ * done, otherwise than without it. */
 size_t nvrsim_faults(char* buffer, size_t size);
+/* Whether such a fault would change something of the call of its function that is number `from` in the log: 1 or 0, by
+ * what that call handed out, or -1. Other conditions are not looked at. */
+int nvrsim_would_change(const char* table);
 
 /* Calls of one operation since the load, e.g. "RM_GetVPD"; 0 for an unknown name. With a null name, of all. */
 uint64_t nvrsim_calls(const char* operation);

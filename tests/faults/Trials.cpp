@@ -111,12 +111,37 @@ std::map<std::string, std::uint64_t> counts()
     return made;
 }
 
-// "CALL N M" a line, then "handles N", then what is published.
+std::string fault_of(const std::string& call, std::uint64_t ordinal, const Failure_Kind& kind)
+{
+    return "call = \"" + call + "\", from = " + std::to_string(ordinal) + ", times = 1, " + kind.failure.fault;
+}
+
+// Of so many calls, from the one of that number in the simulator's log on.
+void note_changing(const std::string& name, std::uint64_t first, std::uint64_t count, Sound_Session::Calls& calls)
+{
+    for (std::uint64_t ordinal = first; ordinal < first + count; ordinal++) {
+        std::uint32_t kinds = 0;
+        for (std::size_t kind = 0; kind < failure_kinds().size(); kind++)
+            if (nvrsim_would_change(fault_of(name, ordinal, failure_kinds()[kind]).c_str()) == 1) kinds |= 1u << kind;
+        calls.changing.push_back(kinds);
+    }
+}
+
+bool can_change(const Sound_Session::Calls& calls, std::uint64_t ordinal, std::size_t kind)
+{
+    return ordinal > calls.changing.size() || (calls.changing[ordinal - 1] >> kind & 1);
+}
+
+// "CALL N M" a line and the kinds of each call, then "handles N", then what is published.
 std::string describe(const Sound_Session& sound)
 {
     std::ostringstream text;
-    for (const auto& [name, count] : sound.calls)
-        text << name << ' ' << count.until_unload << ' ' << count.in_unload << '\n';
+    for (const auto& [name, count] : sound.calls) {
+        text << name << ' ' << count.until_unload << ' ' << count.in_unload;
+        for (const std::uint32_t kinds : count.changing)
+            text << ' ' << kinds;
+        text << '\n';
+    }
     text << "handles " << sound.handles << " 0\n" << sound.published;
     return text.str();
 }
@@ -127,8 +152,12 @@ Sound_Session understand(const std::string& text)
     std::istringstream stream(text);
     std::string name;
     std::uint64_t first = 0, second = 0;
-    while (stream >> name >> first >> second && name != "handles")
-        sound.calls[name] = {first, second};
+    while (stream >> name >> first >> second && name != "handles") {
+        Sound_Session::Calls& calls = sound.calls[name] = {first, second, {}};
+        calls.changing.resize(first + second);
+        for (std::uint32_t& kinds : calls.changing)
+            stream >> kinds;
+    }
     sound.handles = first;
     stream.ignore(1);
     std::ostringstream rest;
@@ -142,15 +171,19 @@ Sound_Session measure(Run_Watch& watch)
     Sound_Session sound;
     Trial trial(watch);
     trial.run_to_unload();
-    for (const auto& [name, count] : counts())
+    for (const auto& [name, count] : counts()) {
         sound.calls[name].until_unload = count;
+        note_changing(name, 1, count, sound.calls[name]);
+    }
     sound.handles = nvrsim_open_handles();
     sound.published = trial.published();
     const auto before = counts();
     trial.unload();
     for (const auto& [name, count] : counts()) {
         const auto earlier = before.find(name);
-        sound.calls[name].in_unload = count - (earlier == before.end() ? 0 : earlier->second);
+        const std::uint64_t known = earlier == before.end() ? 0 : earlier->second;
+        sound.calls[name].in_unload = count - known;
+        note_changing(name, known + 1, count - known, sound.calls[name]);
     }
     for (const std::string& failure : trial.session().failures())
         trial.expect(false, failure);
@@ -172,13 +205,14 @@ void try_call(const Sound_Session& sound, const std::string& call, std::uint64_t
 {
     const std::uint64_t until_unload = sound.calls.at(call).until_unload;
     const bool is_in_unload = ordinal > until_unload;
-    const auto arm = [&](std::uint64_t from) {
-        add_fault("call = \"" + call + "\", from = " + std::to_string(from) + ", times = 1, " + kind.failure.fault);
-    };
+    const auto arm = [&](std::uint64_t from) { add_fault(fault_of(call, from, kind)); };
     Trial trial(watch);
     if (!is_in_unload) arm(ordinal);
     trial.run_to_unload();
-    if (!is_in_unload) trial.expect(fault_hits() == 1, "the session does not make this call");
+    if (!is_in_unload) {
+        trial.expect(fault_hits() == 1, "the session does not make this call");
+        if (fault_changes() == 0) watch.tell(changed_nothing);
+    }
     // A call that gives a handle out, or takes it back, and fails at it may lose it.
     trial.expect(nvrsim_open_handles() <= sound.handles ||
                      is_one_of(call, {"HBA_OpenAdapter", "HBA_CloseAdapter", "CPQFC_OpenAdapter"}),
@@ -190,7 +224,10 @@ void try_call(const Sound_Session& sound, const std::string& call, std::uint64_t
     if (!may_end_load) trial.expect_published(sound.published, published, "after a refresh");
     if (is_in_unload) arm(ordinal - until_unload);
     trial.unload();
-    if (is_in_unload) trial.expect(fault_hits() == 1, "the unload does not make this call");
+    if (is_in_unload) {
+        trial.expect(fault_hits() == 1, "the unload does not make this call");
+        if (fault_changes() == 0) watch.tell(changed_nothing);
+    }
     trial.expect_nothing_lent();
     clear_faults();
     trial.load_again(sound, is_in_unload || may_end_load);
@@ -276,6 +313,8 @@ void try_without(const Sound_Session& sound, const Lack& lack, Run_Watch& watch)
 
 } // namespace
 
+const char changed_nothing[] = "the failure changed nothing";
+
 std::uint64_t Sound_Session::all_calls() const
 {
     std::uint64_t sum = 0;
@@ -313,8 +352,9 @@ std::vector<Run> library_call_trials(const Sound_Session& sound)
     for (const bool is_slow : {false, true})
         for (const auto& [call, count] : sound.calls)
             for (std::uint64_t ordinal = 1; ordinal <= count.until_unload + count.in_unload; ordinal++)
-                for (const Failure_Kind& kind : failure_kinds()) {
-                    if (kind.is_slow != is_slow) continue;
+                for (std::size_t i = 0; i < failure_kinds().size(); i++) {
+                    const Failure_Kind& kind = failure_kinds()[i];
+                    if (kind.is_slow != is_slow || !can_change(count, ordinal, i)) continue;
                     trials.push_back({call + '#' + std::to_string(ordinal) + ':' + kind.failure.name,
                                       is_slow ? sound.patience + delay : sound.patience,
                                       [&sound, call = call, ordinal, &kind](Run_Watch& watch) {

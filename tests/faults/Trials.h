@@ -29,6 +29,8 @@ constexpr std::chrono::seconds usual_patience{10};
 struct Sound_Session {
     struct Calls {
         std::uint64_t until_unload = 0, in_unload = 0;
+        /// For each call, which kinds of failure can change something of it: bits in the order of failure_kinds().
+        std::vector<std::uint32_t> changing;
     };
     std::map<std::string, Calls> calls; ///< by the name of the operation
     std::size_t handles = 0;            ///< open at the end of the script, of the libraries
@@ -47,9 +49,11 @@ struct Failure_Kind {
 };
 const std::vector<Failure_Kind>& failure_kinds();
 
-/// A trial for each call of the session and each kind, named CALL#N:KIND: the Nth call of that name fails. Those that
-/// wait come last. The session must outlive them.
+/// A trial for each call of the session and each kind that can change something of it, named CALL#N:KIND: the Nth call
+/// of that name fails. Those that wait come last. The session must outlive them.
 std::vector<Run> library_call_trials(const Sound_Session& sound);
+/// What such a run tells if the failure has changed nothing after all: the caller had the same number, zeros for zeros.
+extern const char changed_nothing[];
 /// How many of them, at the end, mostly sleep.
 std::size_t sleeping_trials(const Sound_Session& sound);
 

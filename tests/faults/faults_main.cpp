@@ -41,10 +41,11 @@ std::vector<Run> sample_of(std::vector<Run> runs, const Wanted& wanted)
 // Result: how many failed.
 std::size_t make(const std::vector<Run>& runs, unsigned at_once, const std::string& what)
 {
-    std::size_t done = 0, failed = 0;
+    std::size_t done = 0, failed = 0, same = 0;
     const auto start = std::chrono::steady_clock::now();
     do_runs(runs, at_once, [&](std::size_t index, const Run_Result& result) {
         done++;
+        same += result.told == changed_nothing;
         if (!result.failure.empty()) {
             failed++;
             std::printf("FAILED  nvr_faults --only '%s'\n%s\n", runs[index].name.c_str(), result.failure.c_str());
@@ -52,8 +53,8 @@ std::size_t make(const std::vector<Run>& runs, unsigned at_once, const std::stri
         if (done % 100 == 0) std::printf("%zu of %zu, %zu failed\n", done, runs.size(), failed);
     });
     const auto seconds = std::chrono::duration_cast<std::chrono::seconds>(std::chrono::steady_clock::now() - start);
-    std::printf("%s: %zu runs, %zu failed, in %lld s\n", what.c_str(), done, failed,
-                static_cast<long long>(seconds.count()));
+    std::printf("%s: %zu runs, %zu of which changed what the module met; %zu failed, in %lld s\n", what.c_str(), done,
+                done - same, failed, static_cast<long long>(seconds.count()));
     return failed;
 }
 
@@ -73,8 +74,8 @@ int run(const Wanted& wanted)
     module_registrations(); // read once for all runs, as is the schema
     const Sound_Session sound = Sound_Session::hold(std::chrono::seconds(wanted.patience));
     const std::vector<Run> calls = library_call_trials(sound), missing = missing_symbol_trials(sound);
-    std::printf("%llu library calls of %zu operations in a session, %zu kinds of failure: %zu runs; "
-                "%zu runs without a symbol or a library\n",
+    std::printf("%llu library calls of %zu operations in a session, %zu kinds of failure: %zu runs, without those that "
+                "can change nothing of a call; %zu runs without a symbol or a library\n",
                 static_cast<unsigned long long>(sound.all_calls()), sound.calls.size(), failure_kinds().size(),
                 calls.size(), missing.size());
     std::vector<Run> all = wanted.is_absent ? std::vector<Run>() : calls;

@@ -81,7 +81,7 @@ TEST_F(Control, FaultIsInjectedListedAndCleared)
     EXPECT_EQ(0u, nvrsim_RM_GetDriverType(wire(port0), &type));
     EXPECT_EQ(64u, nvrsim_RM_GetDriverType(wire(port0), &type));
     EXPECT_EQ(0u, nvrsim_RM_GetDriverType(wire(port0), &type));
-    EXPECT_EQ("1 RM_GetDriverType port=10000000C9A00001 status=64 from=2 times=1 seen=3 hits=1\n",
+    EXPECT_EQ("1 RM_GetDriverType port=10000000C9A00001 status=64 from=2 times=1 seen=3 hits=1 changed=1\n",
               run("faults").output);
     EXPECT_EQ(0, run("clear-faults").status);
     EXPECT_EQ("", run("faults").output);

@@ -219,6 +219,84 @@ TEST_F(Faults, UnterminatedTextsFillTheirFieldsAndNoMore)
     EXPECT_EQ(nullptr, std::memchr(text, 0, sizeof text));
 }
 
+TEST_F(Faults, DamageReachesNumbersThatAreAnswersButNoSizes)
+{
+    uint32_t type = 0;
+    fault("call = 'RM_GetDriverType', damage = 'ones', times = 1");
+    fault("call = 'RM_GetDriverType', damage = 'garbage', from = 2, times = 1");
+    fault("call = 'RM_GetDriverType', damage = 'zeros', from = 3");
+    EXPECT_EQ(0u, nvrsim_RM_GetDriverType(wire(port0), &type));
+    EXPECT_EQ(0xFFFFFFFFu, type);
+    EXPECT_EQ(0u, nvrsim_RM_GetDriverType(wire(port0), &type));
+    EXPECT_GT(type, 100u);
+    EXPECT_LT(type, 0xFFFFFFFFu);
+    EXPECT_EQ(0u, nvrsim_RM_GetDriverType(wire(port0), &type));
+    EXPECT_EQ(0u, type);
+    fault("call = 'RM_GetHBAAttributes', damage = 'ones'");
+    Block block(RM_HBA_BLOCK_SIZE);
+    EXPECT_EQ(0u, nvrsim_RM_GetHBAAttributes(wire(port0), block.bytes.data(), &block.size));
+    EXPECT_LT(block.size, uint32_t{RM_HBA_BLOCK_SIZE});
+}
+
+TEST_F(Faults, TellWhatTheyChanged)
+{
+    const auto call_all = [] {
+        uint32_t type = 7777, state = 0;
+        char name[256] = {};
+        nvrsim_RM_DiagBeacon(wire(port0), RM_BEACON_OFF);
+        nvrsim_RM_GetDriverType(wire(port0), &type);
+        nvrsim_RM_DiagBeaconState(wire(port0), &state);
+        nvrsim_HBA_GetAdapterName(0, name);
+        nvrsim_HBA_GetNumberOfAdapters();
+        nvrsim_HBA_CloseAdapter(open());
+    };
+    for (const auto& [call, what, expected] : std::vector<std::tuple<const char*, const char*, bool>>{
+             {"RM_DiagBeacon", "status = 64", true},
+             {"RM_DiagBeacon", "delay_ms = 1", true},
+             {"RM_DiagBeacon", "absent = true", true},
+             {"RM_DiagBeacon", "damage = 'ones'", false},
+             {"RM_DiagBeacon", "damage = 'null'", false},
+             {"RM_DiagBeacon", "damage = 'unterminated'", false},
+             {"RM_DiagBeacon", "value = 300", false},
+             {"RM_DiagBeacon", "value = 300, status = 7", true},
+             {"RM_DiagBeacon", "value = 300, status = 0", false},
+             {"RM_GetDriverType", "damage = 'garbage'", true},
+             {"RM_GetDriverType", "damage = 'null'", true},
+             {"RM_GetDriverType", "damage = 'unterminated'", false},
+             {"RM_GetDriverType", "value = 300", true},
+             {"RM_DiagBeaconState", "value = 2", false}, // which it is
+             {"HBA_GetAdapterName", "damage = 'unterminated'", true},
+             {"HBA_GetAdapterName", "damage = 'null'", true},
+             {"HBA_GetAdapterName", "value = 0", false},
+             {"HBA_GetNumberOfAdapters", "value = 0", true},
+             {"HBA_GetNumberOfAdapters", "damage = 'null'", false},
+             {"HBA_GetNumberOfAdapters", "vanish = true", false},
+             {"HBA_OpenAdapter", "damage = 'null'", true},
+             {"HBA_OpenAdapter", "damage = 'ones'", false},
+         }) {
+        const std::string text = std::string("call = '") + call + "', times = 1, " + what;
+        load("[[adapter]]\n");
+        fault(text.c_str());
+        EXPECT_NO_THROW(call_all());
+        const std::string line = sim_text(nvrsim_faults);
+        EXPECT_NE(std::string::npos, line.find(expected ? " hits=1 changed=1\n" : " hits=1 changed=0\n")) << line;
+        // What the log of the same calls without a fault tells of it: all but that a number is as it was.
+        load("[[adapter]]\n");
+        call_all();
+        const bool is_the_same = std::string(call) == "RM_DiagBeaconState";
+        EXPECT_EQ(nvrsim_would_change(text.c_str()), expected || is_the_same) << text;
+    }
+    load("[[adapter]]\n");
+    EXPECT_EQ(0, nvrsim_would_change("call = 'RM_GetVPD', status = 1")) << "it was not called";
+    fault("call = 'RM_GetDriverType', vanish = true");
+    EXPECT_NE(0u, driver_type(port0));
+    EXPECT_NE(0u, driver_type(port0));
+    EXPECT_NE(std::string::npos, sim_text(nvrsim_faults).find("seen=2 hits=2 changed=1\n"));
+    EXPECT_EQ(0, nvrsim_would_change("call = 'RM_GetDriverType', from = 2, vanish = true"));
+    EXPECT_EQ(1, nvrsim_would_change("call = 'RM_GetDriverType', from = 2, status = 1"));
+    EXPECT_EQ(-1, nvrsim_would_change("call = "));
+}
+
 TEST_F(Faults, AbsentFunctionAnswersAsIfItsSymbolWereMissing)
 {
     fault("call = '*', absent = true");

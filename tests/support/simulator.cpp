@@ -26,6 +26,20 @@ std::string text_of(Read read)
     throw std::runtime_error(text_of(nvrsim_error));
 }
 
+// One line a fault, "... seen=N hits=N changed=N".
+std::uint64_t sum_of_faults(const std::string& count)
+{
+    std::istringstream lines(text_of(nvrsim_faults));
+    std::uint64_t sum = 0;
+    for (std::string line; std::getline(lines, line);) {
+        const std::string word = ' ' + count + '=';
+        const std::size_t at = line.rfind(word);
+        if (at == std::string::npos) throw std::runtime_error("no count of " + count + " in: " + line);
+        sum += std::strtoull(line.c_str() + at + word.size(), nullptr, 10);
+    }
+    return sum;
+}
+
 const char* const library_names[] = {"HBAAPI", "lrmapi", "rmapi", "tssdm"};
 
 std::string file_of(const std::string& library)
@@ -55,16 +69,12 @@ void clear_faults()
 
 std::uint64_t fault_hits()
 {
-    // One line a fault, "... seen=N hits=N".
-    std::istringstream lines(text_of(nvrsim_faults));
-    std::uint64_t hits = 0;
-    for (std::string line; std::getline(lines, line);) {
-        const std::string word = " hits=";
-        const std::size_t at = line.rfind(word);
-        if (at == std::string::npos) throw std::runtime_error("no count of hits in: " + line);
-        hits += std::strtoull(line.c_str() + at + word.size(), nullptr, 10);
-    }
-    return hits;
+    return sum_of_faults("hits");
+}
+
+std::uint64_t fault_changes()
+{
+    return sum_of_faults("changed");
 }
 
 const std::vector<Library_Failure>& library_failures()

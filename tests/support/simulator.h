@@ -24,6 +24,8 @@ void add_fault(const std::string& fault);
 void clear_faults();
 /// Calls that faults have hit since they were added.
 std::uint64_t fault_hits();
+/// Those of them in which something was handed to the caller, or done, otherwise than without the fault.
+std::uint64_t fault_changes();
 
 /// A way in which one call can fail, and which ends with its fault.
 struct Library_Failure {
