@@ -15,6 +15,23 @@ function(norvane_test_headers)
   target_precompile_headers(norvane_test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
 endfunction()
 
+# norvane_test_clock(PROGRAM... [SLEEPS_LAST]): the time of day that PROGRAM and the module in it see is the test's, and
+# the module's sleeps take no time but with SLEEPS_LAST: see tests/module/support/Test_Clock.h.
+function(norvane_test_clock)
+  cmake_parse_arguments(CLOCK "SLEEPS_LAST" "" "" ${ARGN})
+  if(NOT TARGET norvane_test_clock)
+    add_library(norvane_test_clock OBJECT ${PROJECT_SOURCE_DIR}/tests/module/support/Test_Clock.cpp)
+    target_include_directories(norvane_test_clock PRIVATE ${PROJECT_SOURCE_DIR})
+  endif()
+  foreach(program IN LISTS CLOCK_UNPARSED_ARGUMENTS)
+    target_link_libraries(${program} PRIVATE norvane_test_clock)
+    target_link_options(${program} PRIVATE LINKER:--export-dynamic-symbol=gettimeofday)
+    if(NOT CLOCK_SLEEPS_LAST)
+      target_link_options(${program} PRIVATE LINKER:--export-dynamic-symbol=select)
+    endif()
+  endforeach()
+endfunction()
+
 # norvane_test(NAME SOURCES... [LINK libs...] [TIMEOUT s] [MANNERS name...]): a GoogleTest program; each test runs in a
 # process of its own, since much of what is tested lives once a process. Under a sanitizer, or with coverage, it may take
 # five times as long.

@@ -2,6 +2,7 @@
 
 #include <atomic>
 #include <chrono>
+#include <memory>
 #include <stdexcept>
 #include <thread>
 
@@ -98,6 +99,11 @@ std::string name_of(const std::string& service)
     return service == "NVRHBA_SoftwareInstallationService" ? "NVRHBA_FCSoftwareInstallationService" : service;
 }
 
+std::string title_of_test(const std::string& name)
+{
+    return "NVR:FCHBA " + name + " Test";
+}
+
 bool is_of_the_moment(const std::string& class_name)
 {
     for (const char* name : {alert_class, "NVRHBA_LogEntry", "NVRHBA_RecordLogManagesRecord"})
@@ -162,6 +168,15 @@ std::string Session::published(const std::string& class_name)
     if (!answer.ok()) throw std::runtime_error(class_name + " does not answer: " + answer.status.message);
     m_rig.settle();
     return is_of_the_moment(class_name) ? std::string() : to_lines(class_name, answer.instances);
+}
+
+std::vector<std::string> Session::serve_clients()
+{
+    const std::size_t before = m_failures.size();
+    receive_alerts();
+    call_service(service_methods().back());
+    run_diagnostic("Echo");
+    return {m_failures.begin() + static_cast<std::ptrdiff_t>(before), m_failures.end()};
 }
 
 host::Answer Session::ask(const std::string& what, const std::function<host::Answer(host::Host&)>& request)
@@ -231,11 +246,15 @@ void Session::traverse(const host::Path& source, const std::string& through)
 
 void Session::call_services()
 {
-    for (const Service_Method& method : service_methods()) {
-        Arguments arguments = method.others;
-        arguments.push_back({"Target", reference_to("NVRHBA_FCPort", first_port)});
-        call(path_in_system(method.service, "Name", name_of(method.service)), method.name, arguments);
-    }
+    for (const Service_Method& method : service_methods())
+        call_service(method);
+}
+
+void Session::call_service(const Service_Method& method)
+{
+    Arguments arguments = method.others;
+    arguments.push_back({"Target", reference_to("NVRHBA_FCPort", first_port)});
+    call(path_in_system(method.service, "Name", name_of(method.service)), method.name, arguments);
 }
 
 void Session::modify_instances()
@@ -255,20 +274,25 @@ void Session::modify_instances()
     modify(time_out, "current", Value::uint32(10));
 }
 
+void Session::run_diagnostic(const std::string& name)
+{
+    const bool needs_plug = name == "External Loopback";
+    host::Instance settings;
+    settings.path = path_of("NVRHBA_FCHBADiagnosticSettingData");
+    settings.set("InstanceID", Value::string(title_of_test(name)));
+    settings.set("LoopControlParameter", texts_value({"3"}));
+    settings.set("TargetDevice", Value::string(target_name));
+    call(path_in_system("NVRHBA_FCHBADiagnosticTest", "Name", title_of_test(name)), "RunDiagnosticService",
+         {{"ManagedElement", reference_to("NVRHBA_PortController", ports[needs_plug ? plugged : 0])},
+          {"DiagnosticSettings", Value::instance(settings)}});
+}
+
 void Session::run_diagnostics()
 {
     for (const char* name : {"Beacon", "Status", "Reset", "Self", "External Loopback", "Host Loopback",
                              "Internal Loopback", "Ping", "Echo"}) {
-        const std::string test = std::string("NVR:FCHBA ") + name + " Test";
-        const bool needs_plug = std::string(name) == "External Loopback";
-        host::Instance settings;
-        settings.path = path_of("NVRHBA_FCHBADiagnosticSettingData");
-        settings.set("InstanceID", Value::string(test));
-        settings.set("LoopControlParameter", texts_value({"3"}));
-        settings.set("TargetDevice", Value::string(target_name));
-        call(path_in_system("NVRHBA_FCHBADiagnosticTest", "Name", test), "RunDiagnosticService",
-             {{"ManagedElement", reference_to("NVRHBA_PortController", ports[needs_plug ? plugged : 0])},
-              {"DiagnosticSettings", Value::instance(settings)}});
+        run_diagnostic(name);
+        const std::string test = title_of_test(name);
         call(path_in_system("NVRHBA_HelpService", "Name", test), "GetHelp",
              {{"RequestedDocument", Value::string(test)},
               {"Format", Value::uint16(1)},
@@ -301,9 +325,10 @@ void Session::receive_alerts()
 {
     if (m_before_request) m_before_request("subscribe");
     const std::streamoff start = m_rig.log_size();
-    std::atomic<int> delivered{0};
+    // An alert may come when all this is over: who could not unsubscribe still gets them.
+    const auto delivered = std::make_shared<std::atomic<int>>(0);
     int id = 0;
-    const auto count = [&](const host::Indication&) { delivered++; };
+    const auto count = [delivered](const host::Indication&) { ++*delivered; };
     const host::Status subscribed = m_rig.server().subscribe(name_space, alert_class, count, id);
     if (!subscribed.ok()) m_failures.push_back("subscribe: " + subscribed.message);
     m_rig.server().settle();
@@ -323,9 +348,9 @@ void Session::receive_alerts()
                 waits += line.words == "waiting for signal to occur";
             return waits - 1;
         };
-        while (delivered < 3 * each && taken() < 3 * each)
+        while (*delivered < 3 * each && taken() < 3 * each)
             std::this_thread::sleep_for(std::chrono::milliseconds(1));
-        if (delivered != 3) m_failures.push_back(std::to_string(delivered) + " alerts came");
+        if (*delivered != 3) m_failures.push_back(std::to_string(*delivered) + " alerts came");
         if (m_before_request) m_before_request("unsubscribe");
         const host::Status unsubscribed = m_rig.server().unsubscribe(id);
         if (!unsubscribed.ok()) m_failures.push_back("unsubscribe: " + unsubscribed.message);

@@ -20,6 +20,8 @@
 
 namespace nvrtest {
 
+struct Service_Method;
+
 class Session {
 public:
     struct Part {
@@ -44,6 +46,9 @@ public:
     /// One class of it, without the refresh.
     std::string published(const std::string& class_name);
 
+    /// What clients do after any load: alerts, a service, a diagnostic test. Result: what did not succeed.
+    std::vector<std::string> serve_clients();
+
     /// Requests that did not succeed so far, with their statuses; none on a sound host.
     const std::vector<std::string>& failures() const { return m_failures; }
     Rig& rig() { return m_rig; }
@@ -54,8 +59,10 @@ private:
     void traverse_all();
     void traverse(const host::Path& source, const std::string& through);
     void call_services();
+    void call_service(const Service_Method& method);
     void modify_instances();
     void run_diagnostics();
+    void run_diagnostic(const std::string& name);
     void steer_logs();
     void receive_alerts();
     void refresh();

@@ -33,11 +33,16 @@ struct Sound_Session {
         std::vector<std::uint32_t> changing;
     };
     std::map<std::string, Calls> calls; ///< by the name of the operation
-    std::size_t handles = 0;            ///< open at the end of the script, of the libraries
+    /// Handles of the libraries that are open.
+    struct Handles {
+        std::size_t until_unload = 0, after_unload = 0, after_second_unload = 0;
+    } handles;
     std::string published;
     std::chrono::seconds patience = usual_patience; ///< that each trial has with a request
 
     std::uint64_t all_calls() const;
+    /// Operations that the module binds and that no request without a failure calls, in alphabetical order.
+    std::vector<std::string> not_called() const;
     /// Held in a process of its own. Throws std::runtime_error if it is not sound.
     static Sound_Session hold(std::chrono::seconds patience = usual_patience);
 };

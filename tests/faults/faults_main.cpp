@@ -5,6 +5,7 @@
 #include <exception>
 #include <iostream>
 #include <random>
+#include <set>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -28,12 +29,21 @@ struct Wanted {
     unsigned patience = usual_patience.count(); // seconds
 };
 
-// In an order by the seed, those behind the skipped ones. The same on every machine, unlike std::shuffle.
+// Of a call that fails: the way in which it does.
+std::string kind_of(const Run& run)
+{
+    return run.name.find('#') == std::string::npos ? std::string() : run.name.substr(run.name.rfind(':'));
+}
+
+// In an order by the seed, one of each kind first, those behind the skipped ones. The same on every machine, unlike
+// std::shuffle.
 std::vector<Run> sample_of(std::vector<Run> runs, const Wanted& wanted)
 {
     std::mt19937_64 chance(wanted.seed);
     for (std::size_t i = 0; i < runs.size(); i++)
         std::swap(runs[i], runs[i + chance() % (runs.size() - i)]);
+    std::set<std::string> kinds;
+    std::stable_partition(runs.begin(), runs.end(), [&](const Run& run) { return kinds.insert(kind_of(run)).second; });
     const std::size_t from = std::min(wanted.skip, runs.size()), to = std::min(from + wanted.sample, runs.size());
     return {runs.begin() + static_cast<std::ptrdiff_t>(from), runs.begin() + static_cast<std::ptrdiff_t>(to)};
 }
@@ -78,6 +88,10 @@ int run(const Wanted& wanted)
                 "can change nothing of a call; %zu runs without a symbol or a library\n",
                 static_cast<unsigned long long>(sound.all_calls()), sound.calls.size(), failure_kinds().size(),
                 calls.size(), missing.size());
+    std::printf("not called in a session:");
+    for (const std::string& name : sound.not_called())
+        std::printf(" %s", name.c_str());
+    std::printf("\n");
     std::vector<Run> all = wanted.is_absent ? std::vector<Run>() : calls;
     all.insert(all.end(), missing.begin(), missing.end());
     if (wanted.is_first)
