@@ -358,7 +358,7 @@ bool Soak::judge()
     for (std::size_t i = m_looks.size() / 2; i < m_looks.size(); i++)
         resident.emplace_back(m_looks[i].minutes, static_cast<double>(m_looks[i].process.resident));
     const Trend trend = Trend::through(resident);
-    if (is_sanitized) say("not judged under a sanitizer: ");
+    if (is_sanitized) say("%s", "not judged under a sanitizer: ");
     hold_against(
         is_sanitized || trend.is_level(tolerance),
         "resident memory moves by %.1f kB a minute (standard error %.1f), %.0f kB over the last %zu lines; level "
