@@ -130,7 +130,10 @@ public:
             "which was refused then), %zu failed\n",
             sites.size(), static_cast<unsigned long long>(asked), asks.size(),
             static_cast<unsigned long long>(m_refused), m_reached, m_idle, m_failed);
-        return m_failed == 0 ? 0 : 1;
+        // A few places depend on how threads meet; more of them would mean that nothing is refused any more.
+        const bool has_reached_most = m_reached * 20 >= asks.size() * 19;
+        if (!has_reached_most) std::puts("FAILED  too few of the places were reached");
+        return m_failed == 0 && has_reached_most ? 0 : 1;
     }
 
 private:
