@@ -146,7 +146,14 @@ void Call::bytes(void* target, const void* source, size_t size)
     if (!target || !size) return;
     note_gift(bytes_gift);
     damage(target, source, size);
-    note_change(std::memcmp(target, source, size) != 0);
+    // What was not written is not looked at: the caller may have no room for it.
+    const size_t written = m_fault.damage == Damage::null        ? 0
+                           : m_fault.damage == Damage::truncated ? std::min<size_t>(size, m_fault.keep)
+                                                                 : size;
+    const auto* unwritten = static_cast<const unsigned char*>(source) + written;
+    const bool has_lost =
+        std::any_of(unwritten, unwritten + (size - written), [](unsigned char byte) { return byte != 0; });
+    note_change(has_lost || std::memcmp(target, source, written) != 0);
 }
 
 void Call::damage(void* target, const void* source, size_t size)
