@@ -2,10 +2,10 @@
 
 #include <cerrno>
 #include <cstdint>
+#include <cstdio>
 #include <exception>
 #include <fcntl.h>
 #include <semaphore.h>
-#include <string>
 #include <unistd.h>
 
 #include "foundation/CLogger.h"
@@ -34,17 +34,25 @@ Session& session()
     return *session;
 }
 
-std::string name_for_process(const char* prefix)
+/// Of a semaphore. It asks for no memory, since a session has to end without any.
+class Process_Name {
+public:
+    explicit Process_Name(const char* prefix)
+    {
+        std::snprintf(m_text, sizeof m_text, "%s%u", prefix, static_cast<uint32>(::getpid()));
+    }
+    const char* c_str() const { return m_text; }
+
+private:
+    char m_text[40];
+};
+
+Process_Name guard_name()
 {
-    return prefix + std::to_string(static_cast<uint32>(::getpid()));
+    return Process_Name("/NVR_RM_INIT_LIB_");
 }
 
-std::string guard_name()
-{
-    return name_for_process("/NVR_RM_INIT_LIB_");
-}
-
-sem_t* open_guard(const std::string& name)
+sem_t* open_guard(const Process_Name& name)
 {
     sem_t* guard = ::sem_open(name.c_str(), O_CREAT, 0644, 2);
     if (guard == SEM_FAILED) return nullptr;
@@ -54,7 +62,7 @@ sem_t* open_guard(const std::string& name)
     return guard;
 }
 
-void close_guard(sem_t* guard, const std::string& name)
+void close_guard(sem_t* guard, const Process_Name& name)
 {
     Auto_Mutex lock(session().mutex);
     ::sem_close(guard);
@@ -72,7 +80,7 @@ void wait_for(sem_t* semaphore)
 /// the session stands, the opening of it too.
 class Guard_Return {
 public:
-    Guard_Return(sem_t* guard, const std::string& name) : m_guard(guard), m_name(name) {}
+    Guard_Return(sem_t* guard, const Process_Name& name) : m_guard(guard), m_name(name) {}
     ~Guard_Return()
     {
         ::sem_post(m_guard);
@@ -85,15 +93,15 @@ public:
 
 private:
     sem_t* m_guard;
-    const std::string& m_name;
+    const Process_Name& m_name;
 };
 
 /// Throws what the library throws, and std::exception if it refuses.
-void initialise(sem_t* guard, const std::string& name)
+void initialise(sem_t* guard, const Process_Name& name)
 {
     Guard_Return given_back(guard, name);
     NVR_LOG("Aquired Semaphore.. Running RM_InitLib %s ", name.c_str());
-    const std::string done_name = name_for_process("/NVR_RM_INIT_LIB_DONE_");
+    const Process_Name done_name("/NVR_RM_INIT_LIB_DONE_");
     sem_t* done = ::sem_open(done_name.c_str(), O_CREAT, 0644, 0);
     {
         Auto_Mutex lock(session().mutex);
@@ -119,7 +127,7 @@ Management_Session::Management_Session()
     const Undisturbed undisturbed; // a thread that ended here would leave the others to wait for ever
     NVR_LOG("Constructor");
     NVR_LOG("Setting Up for FIFO.. ");
-    const std::string name = guard_name();
+    const Process_Name name = guard_name();
     if (sem_t* guard = open_guard(name)) {
         int value = 0;
         ::sem_getvalue(guard, &value);

@@ -15,6 +15,7 @@
 #include "tests/foundation/fakes/fake_libraries.h"
 #include "tests/support/log_capture.h"
 #include "tests/support/private_host.h"
+#include "tests/support/short_memory.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -62,6 +63,15 @@ TEST_F(Session, InitialisesTheLibraryAndSaysSo)
                                          "Signalling Completed Semaphore.. Running RM_InitLib",
                                          "Signaled Completed Semaphore.. Running RM_InitLib", "RMLIB initialized",
                                          "Destructor", "Value of Sem in destructor=3", "RMLIB uninitialzed"));
+}
+
+TEST_F(Session, EndsWithoutAskingForMemory)
+{
+    auto session = std::make_unique<Management_Session>();
+    refuse_allocation(1);
+    session.reset();
+    EXPECT_FALSE(forget_refusal()) << "what it throws would end the process";
+    EXPECT_FALSE(there(guard));
 }
 
 TEST_F(Session, RefusesToStandWhenTheLibraryDoes)
