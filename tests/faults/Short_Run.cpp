@@ -139,7 +139,6 @@ public:
     void run()
     {
         const Left before;
-        wait_for_refreshes_by([this] { return threads_of_module() <= lasting_threads(); });
         begin_refusal();
         drive_session();
         end_refusal();
@@ -182,6 +181,7 @@ private:
         std::vector<std::string> settings_before;
         {
             Session session(listener());
+            session.rig().tell_refreshes_by([this] { return threads_of_module() <= lasting_threads(); });
             settings_before = settings();
             for (const Session::Part& part : Session::parts()) {
                 const bool is_last = &part == &Session::parts().back();
@@ -232,6 +232,7 @@ private:
         m_is_reloaded = true;
         {
             Session session(listener());
+            session.rig().tell_refreshes_by([this] { return threads_of_module() <= lasting_threads(); });
             session.run(Session::parts().front());
             look(session);
             session.run(Session::parts().back());

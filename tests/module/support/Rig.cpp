@@ -26,8 +26,6 @@ constexpr std::chrono::seconds patience{100};
 #endif
 constexpr char refresh_end[] = "PERF: DataFetch_Handler Thread END";
 
-std::function<bool()> no_refresh_runs;
-
 bool ends_with(const std::string& line, const std::string& end)
 {
     return line.size() >= end.size() && line.compare(line.size() - end.size(), end.size(), end) == 0;
@@ -49,11 +47,6 @@ void name_host()
 }
 
 } // namespace
-
-void wait_for_refreshes_by(std::function<bool()> question)
-{
-    no_refresh_runs = std::move(question);
-}
 
 std::shared_ptr<const host::Schema> module_schema()
 {
@@ -160,11 +153,15 @@ std::size_t Rig::refreshes() const
 void Rig::wait_for_refreshes(std::size_t count)
 {
     const auto deadline = std::chrono::steady_clock::now() + patience;
-    while (refreshes() < count) {
-        if (no_refresh_runs && no_refresh_runs()) return;
+    while (m_none_runs ? !m_none_runs() : refreshes() < count) {
         if (std::chrono::steady_clock::now() > deadline) throw std::runtime_error("the refresh does not end");
         std::this_thread::sleep_for(std::chrono::milliseconds(1));
     }
+}
+
+void Rig::tell_refreshes_by(std::function<bool()> none_runs)
+{
+    m_none_runs = std::move(none_runs);
 }
 
 void Rig::settle()

@@ -68,6 +68,9 @@ public:
     void wait_for_refreshes(std::size_t count);
     /// Waits until every refresh that has started has ended.
     void settle();
+    /// From now on this tells whether no refresh runs, and not the words of the log, which are lost where a refresh
+    /// cannot start or a client switches the log off: each of these waits until it says so.
+    void tell_refreshes_by(std::function<bool()> none_runs);
     /// How many have ended.
     std::size_t refreshes() const;
 
@@ -97,12 +100,9 @@ private:
     };
     const Told& told() const;
     mutable Told m_told;
+    std::function<bool()> m_none_runs;
     std::unique_ptr<host::Host> m_server;
 };
-
-/// Where a refresh may fail to start, its words in the log have no end: then all rigs wait until this says that none
-/// runs.
-void wait_for_refreshes_by(std::function<bool()> no_refresh_runs);
 
 /// The schema of the module's classes, read once.
 std::shared_ptr<const host::Schema> module_schema();
