@@ -6,41 +6,22 @@
 //
 // What the module writes to standard output comes first, in its place between the answers; then the lines of the trace,
 // thread by thread in the order of their first lines.
-#include <chrono>
 #include <cstdio>
 #include <exception>
 #include <iostream>
 #include <regex>
-#include <stdexcept>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "host/Host.h"
 #include "tests/module/support/Instance_Text.h"
 #include "tests/module/support/Rig.h"
-#include "tests/support/private_host.h"
 #include "tests/support/private_host_setup.h"
-#include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
 namespace {
 
 using namespace nvrtest;
-
-constexpr char name_space[] = "root/norvane";
-constexpr char refresh_end[] = "PERF: DataFetch_Handler Thread END";
-
-void wait_for_refresh()
-{
-    const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(20);
-    for (;;) {
-        for (const std::string& words : trace_file_words(trace_path))
-            if (words == refresh_end) return;
-        if (std::chrono::steady_clock::now() > deadline) throw std::runtime_error("the refresh does not end");
-        std::this_thread::sleep_for(std::chrono::milliseconds(5));
-    }
-}
 
 void tell(const std::string& what, const host::Answer& answer)
 {
@@ -63,27 +44,28 @@ void traverse(host::Host& server, const host::Path& from)
     }
 }
 
-void hold_session(host::Host& server)
+void hold_session(Rig& rig)
 {
-    tell("ports", server.enumerate(name_space, "NVRHBA_FCPort"));
-    wait_for_refresh();
+    host::Host& server = rig.server();
+    tell("ports", rig.enumerate("NVRHBA_FCPort"));
+    rig.wait_for_refreshes(1);
     for (const host::Registration& registration : server.registrations()) {
         if (!(registration.kinds & host::instance_kind)) continue;
         const std::string& name = registration.class_name;
         // Counters and times of change are of the moment.
         if (name == "NVRHBA_FCPortStatistics" || name == "NVRHBA_LogEntry") continue;
-        const host::Answer names = server.names(name_space, name);
+        const host::Answer names = rig.names(name);
         tell(name, names);
         for (const host::Path& path : names.paths)
             tell("get " + name, server.get(path));
     }
     for (const char* name : {"NVRHBA_StorageVolume", "NVRHBA_SCSIProtocolInitiatorEndpoint", "NVRHBA_FCPort"})
-        traverse(server, server.names(name_space, name).paths.at(0));
-    host::Path nobody = server.names(name_space, "NVRHBA_StorageVolume").paths.at(0);
+        traverse(server, rig.names(name).paths.at(0));
+    host::Path nobody = rig.names("NVRHBA_StorageVolume").paths.at(0);
     nobody.keys.back().value = host::Value::string("nobody");
     tell("nobody", server.get(nobody));
     traverse(server, nobody);
-    host::Instance setting = server.enumerate(name_space, "NVRHBA_ProviderConfigSetting").instances.at(0);
+    host::Instance setting = rig.enumerate("NVRHBA_ProviderConfigSetting").instances.at(0);
     setting.set("current", host::Value::uint32(7));
     tell("change", server.modify(setting, std::vector<std::string>{"current"}));
 }
@@ -118,16 +100,12 @@ int main(int argc, char** argv)
 {
     try {
         nvrtest::enter_private_host(argv);
-        compose_libraries({"HBAAPI", "lrmapi", "rmapi", "tssdm"});
-        remove(conf_path);
-        write_file(dmp_path, std::string("2,5,1\n") + trace_path + "\n");
-        load_scenario("small");
-        host::Host server(module_schema());
-        std::string error;
-        if (server.add_module(argc > 1 ? argv[1] : NVR_MODULE, name_space, &error) == 0)
-            throw std::runtime_error(error);
-        hold_session(server);
-        server.stop();
+        Rig_Options options;
+        options.scenario = "small";
+        if (argc > 1) options.module = argv[1];
+        Rig rig(options);
+        hold_session(rig);
+        rig.stop();
         tell_trace();
     } catch (const std::exception& error) {
         std::cerr << "nvr_session: " << error.what() << '\n';

@@ -100,8 +100,10 @@ void Rig::start()
     host::Host_Options options;
     options.manner = m_options.manner;
     m_server = std::make_unique<host::Host>(module_schema(), options);
-    for (const host::Registration& registration : module_registrations())
+    for (host::Registration registration : module_registrations()) {
+        registration.module = m_options.module;
         m_server->add(registration);
+    }
 }
 
 void Rig::stop()

@@ -43,6 +43,8 @@ struct Rig_Options {
     std::vector<std::string> libraries = {"HBAAPI", "lrmapi", "rmapi", "tssdm"};
     /// A variant of the simulator instead of them.
     std::string variant = {};
+    /// The file that serves the module's classes.
+    std::string module = NVR_MODULE;
 };
 
 /// Settings under which each time-out reads the adapters anew.
