@@ -1,6 +1,8 @@
 // One enumeration of the ports: the module against a provider written by hand in C, on the same broker.
 #include <dlfcn.h>
+#include <set>
 #include <stdexcept>
+#include <string>
 
 #include <benchmark/benchmark.h>
 
@@ -35,8 +37,19 @@ void enumerate_module(benchmark::State& state)
     ask(state, host.server());
 }
 
+/// Once: what the module's ports carry.
+const std::set<std::string>& module_shape()
+{
+    static const std::set<std::string> shape = [] {
+        nvrbench::Bench_Host host(4);
+        return nvrbench::shape_of(host.server(), port_class);
+    }();
+    return shape;
+}
+
 void enumerate_floor(benchmark::State& state)
 {
+    const std::set<std::string>& shape = module_shape(); // before the floor: its module has ended then
     void* library = dlopen(NVR_FLOOR, RTLD_NOW | RTLD_LOCAL);
     if (!library) throw std::runtime_error(dlerror());
     const auto set_ports = reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_instances"));
@@ -44,6 +57,7 @@ void enumerate_floor(benchmark::State& state)
     {
         host::Host server(nvrtest::module_schema());
         server.add({port_class, "NVRHBA_FCPort_Provider", NVR_FLOOR, host::instance_kind, {name_space}, false});
+        nvrbench::require_same(shape, nvrbench::shape_of(server, port_class));
         ask(state, server);
     }
     dlclose(library);

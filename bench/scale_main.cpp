@@ -15,6 +15,7 @@
 #include <iostream>
 #include <malloc.h>
 #include <map>
+#include <set>
 #include <stdexcept>
 #include <string>
 #include <thread>
@@ -216,13 +217,14 @@ void measure_all(host::Host& server, const Point& point, Figures& figures)
     }
 }
 
-void measure_floor(const Point& point, Figures& figures)
+void measure_floor(const Point& point, const std::set<std::string>& shape, Figures& figures)
 {
     void* library = dlopen(NVR_FLOOR, RTLD_NOW | RTLD_LOCAL);
     if (!library) throw std::runtime_error(dlerror());
     reinterpret_cast<void (*)(unsigned)>(dlsym(library, "floor_instances"))(point.paths());
     host::Host server(nvrtest::module_schema());
     server.add({volume_class, "NVRHBA_StorageVolume_Provider", NVR_FLOOR, host::instance_kind, {name_space}, false});
+    nvrbench::require_same(shape, nvrbench::shape_of(server, volume_class));
     measure_enumerations(server, point, "_floor", figures);
 }
 
@@ -247,7 +249,7 @@ void measure(const Point& point)
         measure_lookups(host, point, figures);
         if (point.name == std::string(smaller_point) || point.name == std::string(larger_point))
             measure_all(host.server(), point, figures);
-        measure_floor(point, figures);
+        measure_floor(point, nvrbench::shape_of(host.server(), volume_class), figures);
     }
     for (const auto& [name, figure] : figures)
         dprintf(answer, "%.6g %s\n", figure, name.c_str());
