@@ -74,6 +74,9 @@ public:
     /// Reads them back and applies them; a fault is logged, and what was not yet applied stays as it was. Modes 0, 1
     /// and 3 have no path, which no file logger accepts: of such a file only the enabled flag takes effect.
     void loadSettings();
+    /// Both, for what a client has set: that is what is to be saved at the end, whatever became of the file meanwhile.
+    /// Reading it back opens the trace file anew.
+    void storeSettings();
 
     /// Holds the dispatch mutex for a scope. A thread that holds it already passes through, since the mutex itself is
     /// not recursive.

@@ -1,5 +1,6 @@
 // The log's settings file: "mode,level,enabled", and behind the line's end the trace file's path.
 
+#include <cerrno>
 #include <cstdlib>
 #include <cstring>
 #include <sys/stat.h>
@@ -66,13 +67,23 @@ void CLogger::loadSettings()
 {
     Undisturbed undisturbed;
     struct stat status;
-    if (::stat(log_settings_path, &status) != 0) return;
+    if (::stat(log_settings_path, &status) != 0) {
+        m_unread = errno != ENOENT;
+        return;
+    }
     Line_Reader file(log_settings_path);
     if (file.is_open())
         applySettings(file);
     else
         NVR_LOG("Unable to open config data file - %s", log_settings_path);
     m_unread = file.has_failed();
+}
+
+void CLogger::storeSettings()
+{
+    saveSettings();
+    loadSettings();
+    m_unread = false;
 }
 
 void CLogger::applySettings(Line_Reader& file)

@@ -48,13 +48,6 @@ bool usesTraceFile(uint16 mode)
     return mode == 2 || mode == 4;
 }
 
-/// A file that was rewritten is read back, which opens the trace file anew.
-void storeSettings()
-{
-    CLogger::instance()->saveSettings();
-    CLogger::instance()->loadSettings();
-}
-
 uint32 setLogParams(ProviderAgent& agent, const Target& target, uint16 level, uint16 mode, const String& path)
 {
     if (!target.is_log) return target.refuse();
@@ -82,7 +75,7 @@ uint32 setLogParams(ProviderAgent& agent, const Target& target, uint16 level, ui
         set(target.instance->LogLevel, level);
         set(target.instance->LogMode, mode);
     }
-    storeSettings();
+    CLogger::instance()->storeSettings();
     return ANSWER_DONE;
 }
 
@@ -116,7 +109,7 @@ void enableLog(ProviderAgent& agent, const Target& target)
         if (!is_read) throw std::bad_alloc(); // the client is told, and the log shows what has come
     } else {
         NVR_LOG("FC Record Logs enabled");
-        storeSettings();
+        CLogger::instance()->storeSettings();
     }
 }
 
@@ -128,7 +121,7 @@ void disableLog(ProviderAgent& agent, const Target& target)
     if (target.is_driver)
         agent.m_driverLogStore.clear();
     else
-        storeSettings();
+        CLogger::instance()->storeSettings();
 }
 
 uint32 requestStateChange(ProviderAgent& agent, const Target& target, uint16 state)

@@ -304,6 +304,33 @@ TEST_F(LogSettings, StayAsTheyAreAtTheEndIfTheyCouldNotBeRead)
     EXPECT_EQ(read_file(settings), "2,5,1\n" + trace);
 }
 
+TEST_F(LogSettings, ThatAClientSetAreSavedAtTheEndIfTheFileCouldNotBeWrittenBefore)
+{
+    write_file(settings, "0,1,1\n");
+    logger().loadSettings();
+    logger().setLevel(5);
+    {
+        const No_Descriptors none;
+        logger().storeSettings();
+    }
+    EXPECT_EQ(read_file(settings), "0,1,1\n");
+    logger().saveSettingsAtEnd();
+    EXPECT_EQ(read_file(settings), "0,5,1\n");
+}
+
+TEST_F(LogSettings, AreSavedAtTheEndIfTheFileThatCouldNotBeReadIsGone)
+{
+    write_file(settings, "2,5,1\n" + trace);
+    {
+        const No_Descriptors none;
+        logger().loadSettings();
+    }
+    remove(settings);
+    logger().loadSettings(); // of the next life
+    logger().saveSettingsAtEnd();
+    EXPECT_EQ(read_file(settings), "0,0,0\n");
+}
+
 TEST_F(LogSettings, StayAsTheyAreAtExitIfAnotherThreadKeepsTheLogger)
 {
     write_file(settings, "as it was");
