@@ -51,7 +51,11 @@ private:
     int not_there(const std::string& text) { return failed({CMPI_RC_ERR_NOT_FOUND, text, Fault::request}); }
     std::string port_name() const { return key_text(m_port, "DeviceID"); }
 
-    int find_port();
+    int find_port()
+    {
+        return host::find_port(m_server, m_options, fc_port_class, "name a port with --port", m_port, m_out,
+                               m_complaints);
+    }
     int find_target();
     int read_inputs();
     int read_input(const Input& input);
@@ -73,28 +77,6 @@ private:
     const Method_Record* m_method = nullptr;
     std::vector<Named_Value> m_arguments;
 };
-
-/// The port that the user named, or the only one. 0, or the exit status.
-int Runner::find_port()
-{
-    const Answer names = m_server.names(m_options.name_space, fc_port_class);
-    if (!names.ok()) return failed(names.status);
-    std::string known;
-    const Path* found = nullptr;
-    for (const Path& path : names.paths) {
-        const std::string name = key_text(path, "DeviceID");
-        known += (known.empty() ? "" : ", ") + name;
-        if (m_options.port.empty() ? names.paths.size() == 1 : plain_name(m_options.port) == plain_name(name))
-            found = &path;
-    }
-    if (found) {
-        m_port = *found;
-        return 0;
-    }
-    if (known.empty()) return not_there("this host has no Fibre Channel port");
-    if (m_options.port.empty()) return wrong("name a port with --port; there are " + known);
-    return not_there("there is no port " + m_options.port + "; there are " + known);
-}
 
 /// The service's instance, or the port itself. 0, or the exit status.
 int Runner::find_target()

@@ -77,7 +77,6 @@ private:
 
     /// The instance of this class that belongs to the test which the user named, by this key. 0, or the exit status.
     int find_of_test(const char* class_name, const char* key, Path& found);
-    int find_port(Path& found);
     int read_settings(const std::string& test, Value& settings);
     int refuse_settings(const std::string& test);
     int tell_run(const Answer& answer, const std::string& test, const std::string& port);
@@ -148,23 +147,6 @@ int Diagnostics::find_of_test(const char* class_name, const char* key, Path& fou
     return not_there("there is no test " + m_options.object + "; there are " + known);
 }
 
-int Diagnostics::find_port(Path& found)
-{
-    const Answer names = m_server.names(m_options.name_space, port_class);
-    if (!names.ok()) return failed(names.status);
-    std::string known;
-    for (const Path& path : names.paths) {
-        const std::string name = key_text(path, "DeviceID");
-        known += (known.empty() ? "" : ", ") + name;
-        if (m_options.port.empty() ? names.paths.size() > 1 : plain_name(m_options.port) != plain_name(name)) continue;
-        found = path;
-        return 0;
-    }
-    if (known.empty()) return not_there("this host has no Fibre Channel port");
-    if (m_options.port.empty()) return wrong("name a port; there are " + known);
-    return not_there("there is no port " + m_options.port + "; there are " + known);
-}
-
 /// The settings that the user gave, as an instance within the request; null if there are none.
 int Diagnostics::read_settings(const std::string& test, Value& settings)
 {
@@ -221,7 +203,8 @@ int Diagnostics::run()
 {
     Path test, port;
     if (int status = find_of_test(test_class, "Name", test)) return status;
-    if (int status = find_port(port)) return status;
+    if (int status = find_port(m_server, m_options, port_class, "name a port", port, m_out, m_complaints))
+        return status;
     const std::string name = key_text(test, "Name");
     std::vector<Named_Value> arguments = {{"ManagedElement", Value::reference(port)}};
     Value settings;

@@ -6,6 +6,7 @@
 #include "host/command/Check.h"
 #include "host/command/Diagnostics.h"
 #include "host/command/Graph.h"
+#include "host/command/Keys.h"
 #include "host/command/Listing.h"
 #include "host/command/Logs.h"
 #include "host/command/Paths.h"
@@ -352,6 +353,26 @@ int tell_failure(const Status& status, const Options& options, std::ostream& out
     if (options.json)
         out << json_text({{"status", status.code}, {"name", status_name(status.code)}, {"message", status.message}});
     return status.code < 0 || status.code > 255 ? 255 : status.code;
+}
+
+int find_port(Host& server, const Options& options, const char* class_name, const char* unnamed, Path& found,
+              std::ostream& out, std::ostream& complaints)
+{
+    const Answer names = server.names(options.name_space, class_name);
+    if (!names.ok()) return tell_failure(names.status, options, out, complaints);
+    std::string known;
+    for (const Path& path : names.paths) {
+        const std::string name = key_text(path, "DeviceID");
+        known += (known.empty() ? "" : ", ") + name;
+        if (options.port.empty() ? names.paths.size() > 1 : plain_name(options.port) != plain_name(name)) continue;
+        found = path;
+        return 0;
+    }
+    if (options.port.empty() && !known.empty())
+        return tell_wrong(std::string(unnamed) + "; there are " + known, complaints);
+    const std::string missing = known.empty() ? "this host has no Fibre Channel port"
+                                              : "there is no port " + options.port + "; there are " + known;
+    return tell_failure({CMPI_RC_ERR_NOT_FOUND, missing, Fault::request}, options, out, complaints);
 }
 
 int run_verb(Host& server, const Options& options, std::ostream& out, std::ostream& complaints)

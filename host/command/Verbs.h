@@ -25,4 +25,9 @@ int tell_wrong(const std::string& text, std::ostream& complaints);
 /// A request failed; with --json it is told in JSON too.
 int tell_failure(const Status& status, const Options& options, std::ostream& out, std::ostream& complaints);
 
+/// Finds the port that the user named, or the only one, among those of `class_name`, whose key DeviceID is its name.
+/// `unnamed` is what the complaint asks for where there are several and none was named. 0, or the exit status.
+int find_port(Host& server, const Options& options, const char* class_name, const char* unnamed, Path& found,
+              std::ostream& out, std::ostream& complaints);
+
 } // namespace host
