@@ -224,12 +224,14 @@ void try_call(const Sound_Session& sound, const std::string& call, std::uint64_t
         if (fault_changes() == 0) watch.tell(changed_nothing);
     }
     // A call that gives a handle out, or takes it back, and fails at it may lose that one.
-    const bool may_lose = is_one_of(call, {"HBA_OpenAdapter", "HBA_CloseAdapter", "CPQFC_OpenAdapter"});
+    const bool may_lose =
+        !kind.is_slow && is_one_of(call, {"HBA_OpenAdapter", "HBA_CloseAdapter", "CPQFC_OpenAdapter"});
     trial.expect_handles(sound.handles.until_unload, !is_in_unload && may_lose);
     const std::string published = trial.published();
     // A load whose library did not start, or that an exception ended, publishes no adapters up to its unload.
-    const bool may_end_load = call == "RM_InitLib" || (kind.failure.name == std::string("throws") &&
-                                                       is_one_of(call, {"HBA_LoadLibrary", "CPQFC_LoadLibrary"}));
+    const bool may_end_load =
+        (call == "RM_InitLib" && !kind.is_slow) ||
+        (kind.failure.name == std::string("throws") && is_one_of(call, {"HBA_LoadLibrary", "CPQFC_LoadLibrary"}));
     if (!may_end_load) trial.expect_published(sound.published, published, "after a refresh");
     if (is_in_unload) arm(ordinal - until_unload);
     trial.unload();

@@ -576,6 +576,7 @@ TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
     rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
         CMPIStatus status = {CMPI_RC_OK, nullptr};
         const Foreign foreign(broker);
+        const std::pair<const CMPIContext*, const CMPIResult*> without_one[] = {{nullptr, &unread}, {context, nullptr}};
         for (const std::string& name : asked) {
             SCOPED_TRACE(name);
             CMPIObjectPath* own = broker->eft->newObjectPath(broker, "root/norvane", name.c_str(), &status);
@@ -597,7 +598,17 @@ TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
                     ft.createInstance(mi, context, &unread, own, other);
                     ft.modifyInstance(mi, context, &unread, own, other, nullptr);
                 }
+                EXPECT_NE(ft.createInstance(mi, context, &unread, own, nullptr).rc, CMPI_RC_OK);
+                EXPECT_NE(ft.modifyInstance(mi, context, &unread, own, nullptr, nullptr).rc, CMPI_RC_OK);
                 ft.enumerateInstances(mi, context, &unread, foreign.paths.front(), nullptr);
+                for (const auto& [ctx, result] : without_one) {
+                    ft.enumerateInstanceNames(mi, ctx, result, own);
+                    ft.enumerateInstances(mi, ctx, result, own, nullptr);
+                    ft.getInstance(mi, ctx, result, own, nullptr);
+                    ft.createInstance(mi, ctx, result, own, instance);
+                    ft.modifyInstance(mi, ctx, result, own, instance, nullptr);
+                    ft.deleteInstance(mi, ctx, result, own);
+                }
                 EXPECT_EQ(ft.cleanup(mi, context, 0).rc, CMPI_RC_OK);
                 instance->ft->release(instance);
             }
@@ -616,8 +627,12 @@ TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
                             mi->ft->invokeMethod(mi, context, &unread, own, method.name.c_str(), in, out);
                             in->ft->release(in);
                         }
+                    for (const auto& [ctx, result] : without_one)
+                        mi->ft->invokeMethod(mi, ctx, result, own, method.name.c_str(), nullptr, out);
+                    mi->ft->invokeMethod(mi, context, &unread, own, method.name.c_str(), nullptr, nullptr);
                     out->ft->release(out);
                 }
+                EXPECT_NE(mi->ft->invokeMethod(mi, context, &unread, own, nullptr, nullptr, nullptr).rc, CMPI_RC_OK);
                 EXPECT_EQ(mi->ft->cleanup(mi, context, 0).rc, CMPI_RC_OK);
             }
             if (CMPIAssociationMI* mi = entries.associations(name, broker, context)) {
@@ -629,6 +644,12 @@ TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
                         ft.references(mi, context, &unread, path, name.c_str(), any, nullptr);
                         ft.referenceNames(mi, context, &unread, path, any, "");
                     }
+                for (const auto& [ctx, result] : without_one) {
+                    ft.associators(mi, ctx, result, own, nullptr, nullptr, nullptr, nullptr, nullptr);
+                    ft.associatorNames(mi, ctx, result, own, nullptr, nullptr, nullptr, nullptr);
+                    ft.references(mi, ctx, result, own, nullptr, nullptr, nullptr);
+                    ft.referenceNames(mi, ctx, result, own, nullptr, nullptr);
+                }
                 EXPECT_EQ(ft.cleanup(mi, context, 0).rc, CMPI_RC_OK);
             }
             own->ft->release(own);

@@ -39,6 +39,7 @@
 #include "tests/soak/Trouble.h"
 #include "tests/support/private_host.h"
 #include "tests/support/private_host_setup.h"
+#include "tests/support/process_state.h"
 #include "tests/support/simulator.h"
 
 namespace {
@@ -158,6 +159,7 @@ public:
         m_rig.restart();
         fill_server_log(m_rig.server());
         m_before = Process::now();
+        m_before.threads = nvrtest::number_of_threads_from_the_start();
     }
 
     /// True if all was well.
@@ -364,6 +366,7 @@ bool Soak::judge()
         "resident memory moves by %.1f kB a minute (standard error %.1f), %.0f kB over the last %zu lines; level "
         "below two standard errors, or %.0f kB\n",
         trend.slope, trend.error, trend.change, resident.size(), tolerance);
+    nvrtest::wait_for_threads(m_before.threads, std::chrono::seconds(20));
     const Process after = Process::now();
     hold_against(after.threads <= m_before.threads, "%zu threads before, %zu after\n", m_before.threads, after.threads);
     hold_against(after.descriptors <= m_before.descriptors, "%zu descriptors before, %zu after\n", m_before.descriptors,
