@@ -12,13 +12,8 @@ namespace cimple {
 
 class Text_Pool {
 public:
-    const String& operator()(std::string_view text)
-    {
-        const auto known = m_texts.find(text);
-        if (known != m_texts.end()) return known->second;
-        const String made(text.data(), text.size());
-        return m_texts.emplace(std::string_view(made.c_str(), made.size()), made).first->second;
-    }
+    /// The text, held by the pool; for copies that are made before the next call.
+    const String& operator()(std::string_view text);
 
 private:
     std::unordered_map<std::string_view, String> m_texts; // a key looks at the bytes of its own String
