@@ -195,20 +195,22 @@ Answer Host::associators(const Path& path, const std::string& association_class,
 }
 
 Answer Host::associator_names(const Path& path, const std::string& association_class, const std::string& result_class,
-                              const std::string& role, const std::string& result_role)
+                              const std::string& role, const std::string& result_role, const Result_Sink* sink)
 {
-    return m_parts->run(Operation::associator_names, path, along(association_class, result_class, role, result_role));
+    return m_parts->run(Operation::associator_names, path,
+                        along(association_class, result_class, role, result_role, {}, sink));
 }
 
 Answer Host::references(const Path& path, const std::string& result_class, const std::string& role,
-                        Property_List properties)
+                        Property_List properties, const Result_Sink* sink)
 {
-    return m_parts->run(Operation::references, path, along("", result_class, role, "", std::move(properties)));
+    return m_parts->run(Operation::references, path, along("", result_class, role, "", std::move(properties), sink));
 }
 
-Answer Host::reference_names(const Path& path, const std::string& result_class, const std::string& role)
+Answer Host::reference_names(const Path& path, const std::string& result_class, const std::string& role,
+                             const Result_Sink* sink)
 {
-    return m_parts->run(Operation::reference_names, path, along("", result_class, role, ""));
+    return m_parts->run(Operation::reference_names, path, along("", result_class, role, "", {}, sink));
 }
 
 Status Host::subscribe(const std::string& name_space, const std::string& class_name, Indication_Sink sink, int& id,

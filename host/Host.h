@@ -172,10 +172,11 @@ public:
                        const Result_Sink* sink = nullptr);
     Answer associator_names(const Path& path, const std::string& association_class = "",
                             const std::string& result_class = "", const std::string& role = "",
-                            const std::string& result_role = "");
+                            const std::string& result_role = "", const Result_Sink* sink = nullptr);
     Answer references(const Path& path, const std::string& result_class = "", const std::string& role = "",
-                      Property_List properties = {});
-    Answer reference_names(const Path& path, const std::string& result_class = "", const std::string& role = "");
+                      Property_List properties = {}, const Result_Sink* sink = nullptr);
+    Answer reference_names(const Path& path, const std::string& result_class = "", const std::string& role = "",
+                           const Result_Sink* sink = nullptr);
 
     // --- Indications -----------------------------------------------------------------------------------------------
 

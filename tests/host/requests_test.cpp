@@ -182,6 +182,21 @@ TEST_P(Requests, AssociationsAreAskedOfWhoeverCanHoldTheSource)
     EXPECT_EQ(4, server->associators(things::thing(1), "No_Such").status.code);
 }
 
+TEST_P(Requests, ASinkGetsWhatTraversalsFind)
+{
+    std::size_t instances = 0, paths = 0;
+    const Result_Sink sink{[&](Instance&&) { instances++; }, [&](Path&&) { paths++; }};
+    const auto thing = things::thing(1);
+    EXPECT_EQ(1u, server->associators(thing, "", "", "", "", {}, &sink).handed_on);
+    EXPECT_EQ(1u, instances);
+    EXPECT_EQ(1u, server->associator_names(thing, "", "", "", "", &sink).handed_on);
+    EXPECT_EQ(1u, paths);
+    EXPECT_EQ(1u, server->references(thing, "", "", {}, &sink).handed_on);
+    EXPECT_EQ(2u, instances);
+    EXPECT_EQ(1u, server->reference_names(thing, "", "", &sink).handed_on);
+    EXPECT_EQ(2u, paths);
+}
+
 TEST_P(Requests, WhatTheServerDoesNotKnowItSaysItself)
 {
     Answer answer = server->enumerate("root/nowhere", "TEST_Thing");
