@@ -21,6 +21,7 @@
 #include <thread>
 #include <time.h>
 #include <unistd.h>
+#include <utility>
 #include <vector>
 
 #include "bench/Bench_Host.h"
@@ -49,11 +50,11 @@ constexpr char mapping_call[] = "HBA_GetFcpTargetMapping";
 constexpr char volume_class[] = "NVRHBA_StorageVolume";
 
 /// The figures of a point by name. Times in microseconds, memory in bytes. Those of all enumerations and traversals
-/// that grow with the SAN are named by their question, which has a space in it.
+/// are named by their question, which has a space in it.
 using Figures = std::map<std::string, double>;
 
-/// Between these two points each question's growth is told.
-constexpr char smaller_point[] = "M", larger_point[] = "XXL";
+/// Before a question: how many instances or names were answered.
+constexpr char answers_to[] = "answers to ";
 
 // --- One point
 // -------------------------------------------------------------------------------------------------------
@@ -73,12 +74,12 @@ double microseconds_of(Work work)
     return processor_microseconds() - start;
 }
 
-/// The least of some runs, for as long as they stay short.
+/// The least of so many runs, or of fewer that take so many microseconds together.
 template <class Work>
-double least_of(Work work)
+double least_of(Work work, int runs = 10, double most = 1.5e6)
 {
     double least = microseconds_of(work), spent = least;
-    for (int i = 0; i < 9 && spent < 1.5e6; i++) {
+    for (int i = 1; i < runs && spent < most; i++) {
         const double run = microseconds_of(work);
         least = std::min(least, run);
         spent += run;
@@ -194,27 +195,65 @@ void measure_lookups(nvrbench::Bench_Host& host, const Point& point, Figures& fi
                               static_cast<double>(ends);
 }
 
-/// Each question whose answer grows with the SAN: all classes, and each association class from the host, from a port
-/// and from the port's endpoint. An answered instance.
-void measure_all(host::Host& server, const Point& point, Figures& figures)
+/// What an answered instance or name costs, if that is less than what was measured before, and how many there were, if
+/// any.
+template <class Ask>
+void measure_question(Figures& figures, const std::string& question, Ask ask)
 {
-    const auto measure_question = [&](const std::string& question, auto ask) {
-        std::size_t answered = 0;
-        const double least = least_of([&] { answered = ask().handed_on; });
-        if (answered >= point.targets * point.luns) figures[question] = least / static_cast<double>(answered);
+    std::size_t answered = 0;
+    const auto run = [&] {
+        const host::Answer answer = ask();
+        require(answer.ok() || answer.handed_on == 0, "an answer broke off");
+        answered = answer.handed_on;
     };
-    for (const host::Registration& one : server.registrations())
-        if (one.kinds & host::instance_kind)
-            measure_question("enumerate " + one.class_name,
-                             [&] { return server.enumerate(name_space, one.class_name, {}, &nowhere()); });
-    for (const char* from : {"CIM_ComputerSystem", "NVRHBA_FCPort", "NVRHBA_SCSIProtocolInitiatorEndpoint"}) {
-        const host::Path source = server.names(name_space, from).paths.at(0);
-        for (const host::Registration& one : server.registrations())
-            if (one.kinds & host::association_kind)
-                measure_question(std::string(from) + " over " + one.class_name, [&] {
-                    return server.associators(source, one.class_name, "", "", "", {}, &nowhere());
-                });
+    double least = microseconds_of(run);
+    if (answered == 0) return;
+    constexpr double most = 3e5;
+    if (least < most) least = std::min(least, least_of(run, 4, most));
+    const double each = least / static_cast<double>(answered);
+    double& figure = figures.emplace(question, each).first->second;
+    figure = std::min(figure, each);
+    figures[answers_to + question] = static_cast<double>(answered);
+}
+
+/// All enumerations, and all traversals of one association class from the host, from a port and from its endpoint.
+void ask_all_questions(host::Host& server, Figures& figures)
+{
+    const auto first_of = [&server](const char* class_name) {
+        return server.names(name_space, class_name).paths.at(0);
+    };
+    const host::Instance in_host = server.enumerate(name_space, "NVRHBA_FCPortSystemDevice").instances.at(0);
+    const host::Path* const host = in_host.get("GroupComponent").as_path();
+    require(host, "a port is in no host");
+    const host::Path sources[] = {*host, first_of("NVRHBA_FCPort"), first_of("NVRHBA_SCSIProtocolInitiatorEndpoint")};
+    const host::Result_Sink* const sink = &nowhere();
+    for (const host::Registration& one : server.registrations()) {
+        const std::string& name = one.class_name;
+        if (one.kinds & host::instance_kind) {
+            measure_question(figures, "instances of " + name,
+                             [&] { return server.enumerate(name_space, name, {}, sink); });
+            measure_question(figures, "names of " + name, [&] { return server.names(name_space, name, sink); });
+        }
+        if (!(one.kinds & host::association_kind)) continue;
+        for (const host::Path& source : sources) {
+            const std::string over = " of " + source.class_name + " over " + name;
+            measure_question(figures, "associators" + over,
+                             [&] { return server.associators(source, name, "", "", "", {}, sink); });
+            measure_question(figures, "associator names" + over,
+                             [&] { return server.associator_names(source, name, "", "", "", sink); });
+            measure_question(figures, "references" + over,
+                             [&] { return server.references(source, name, "", {}, sink); });
+            measure_question(figures, "reference names" + over,
+                             [&] { return server.reference_names(source, name, "", sink); });
+        }
     }
+}
+
+/// Twice all of them: what disturbs the machine for a while then meets no question each time.
+void measure_questions(host::Host& server, Figures& figures)
+{
+    for (int round = 0; round < 2; round++)
+        ask_all_questions(server, figures);
 }
 
 void measure_floor(const Point& point, const std::set<std::string>& shape, Figures& figures)
@@ -247,8 +286,7 @@ void measure(const Point& point)
         measure_refresh(host, point, figures);
         measure_enumerations(host.server(), point, "", figures);
         measure_lookups(host, point, figures);
-        if (point.name == std::string(smaller_point) || point.name == std::string(larger_point))
-            measure_all(host.server(), point, figures);
+        if (std::getenv("NVR_SCALE_QUESTIONS")) measure_questions(host.server(), figures);
         measure_floor(point, nvrbench::shape_of(host.server(), volume_class), figures);
     }
     for (const auto& [name, figure] : figures)
@@ -258,9 +296,10 @@ void measure(const Point& point)
 // --- The tables
 // ------------------------------------------------------------------------------------------------------
 
-Figures measured_apart(const char* name)
+Figures measured_apart(const char* name, bool with_questions)
 {
-    const std::string command = std::string("NVR_SCALE_POINT=") + name + " /proc/" + std::to_string(getpid()) + "/exe";
+    const std::string command = std::string(with_questions ? "NVR_SCALE_QUESTIONS=1 " : "") +
+                                "NVR_SCALE_POINT=" + name + " /proc/" + std::to_string(getpid()) + "/exe";
     FILE* child = popen(command.c_str(), "r");
     require(child, "no process could be started");
     Figures figures;
@@ -306,31 +345,81 @@ void print_growth(const std::map<std::string, Figures>& measured)
     }
 }
 
-void print_questions(const Figures& smaller, const Figures& larger)
+/// The points between which each question's growth is told: M and XXL, or else the smallest and the largest. One or
+/// none is no growth.
+std::pair<std::string, std::string> compared_points(const std::vector<std::string>& names)
 {
-    std::printf("\n| question | us at %s | us at %s | ratio |\n|---|---|---|---|\n", smaller_point, larger_point);
-    for (const auto& [question, us] : larger) {
-        const auto found = smaller.find(question);
-        if (question.find(' ') == std::string::npos || found == smaller.end()) continue;
-        std::printf("| %s | %.1f | %.1f | %.2f |\n", question.c_str(), found->second, us, us / found->second);
+    const auto named = [&names](const char* name) {
+        return std::find(names.begin(), names.end(), name) != names.end();
+    };
+    if (named("M") && named("XXL")) return {"M", "XXL"};
+    const auto [smallest, largest] =
+        std::minmax_element(names.begin(), names.end(), [](const std::string& one, const std::string& other) {
+            return point_of(one).paths() < point_of(other).paths();
+        });
+    if (smallest == largest) return {};
+    return {*smallest, *largest};
+}
+
+/// A question and how many times more an answer to it costs at the larger point.
+struct Growth {
+    std::string question;
+    double ratio = 0;
+
+    void keep_worse(const std::string& other, double its_ratio)
+    {
+        if (its_ratio > ratio) *this = {other, its_ratio};
     }
+};
+
+/// A row for each question whose answer grows by more than the ports do, the worst of each kind, and the worst of all
+/// others.
+void print_questions(const Point& smaller, const Figures& before, const Point& larger, const Figures& after)
+{
+    std::printf(
+        "\n| question | answers at %s | us each | answers at %s | us each | ratio |\n|---|---|---|---|---|---|\n",
+        smaller.name, larger.name);
+    std::map<std::string, Growth> worst;
+    Growth worst_other;
+    for (const auto& [question, us] : after) {
+        const auto answers_after = after.find(answers_to + question);
+        const auto answers_before = before.find(answers_to + question);
+        if (answers_after == after.end() || answers_before == before.end()) continue;
+        const double us_before = before.at(question), ratio = us / us_before;
+        if (answers_after->second * smaller.ports <= answers_before->second * larger.ports) {
+            worst_other.keep_worse(question, ratio);
+            continue;
+        }
+        worst[question.substr(0, question.find(" of "))].keep_worse(question, ratio);
+        std::printf("| %s | %.0f | %.1f | %.0f | %.1f | %.2f |\n", question.c_str(), answers_before->second, us_before,
+                    answers_after->second, us, ratio);
+    }
+    require(worst.size() == 6 && worst_other.ratio > 0, "some kind of question has no answers");
+    std::puts("");
+    for (const auto& [kind, growth] : worst)
+        std::printf("worst: %s: %.2f\n", growth.question.c_str(), growth.ratio);
+    std::printf("worst whose answer does not grow with the SAN: %s: %.2f\n", worst_other.question.c_str(),
+                worst_other.ratio);
 }
 
 void print_table(const std::vector<std::string>& names)
 {
+    const auto compared = compared_points(names);
     std::map<std::string, Figures> measured;
     std::puts(
         "| point | paths | first answer s | elapsed s | refresh us/path | with libraries | resident B/path | peak | "
-        "instances us | of floor | names us | of floor | get us | associators ms | all classes ms | from a port us |");
+        "instances us | of floor | names us | of floor | get us | associators ms | all classes ms | from a port us/end "
+        "|");
     std::puts("|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|---|");
     for (const std::string& name : names) {
         const Point& point = point_of(name);
-        measured[name] = measured_apart(point.name);
+        measured[name] = measured_apart(point.name, name == compared.first || name == compared.second);
         print_row(point, measured[name]);
     }
     if (measured.count("1000")) print_growth(measured);
-    if (measured.count(smaller_point) && measured.count(larger_point))
-        print_questions(measured[smaller_point], measured[larger_point]);
+    if (!compared.first.empty())
+        print_questions(point_of(compared.first), measured[compared.first], point_of(compared.second),
+                        measured[compared.second]);
 }
 
 } // namespace
