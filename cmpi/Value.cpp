@@ -108,22 +108,17 @@ Value& Value::operator=(const Value& other)
     return *this;
 }
 
-void Value::clear()
+void Value::destroy_content()
 {
-    if (m_at == m_place) {
-        if (is_scalar(m_type)) {
-            destruct(m_type, m_place);
-        } else if (m_type == INSTANCE_VALUE) {
-            unref(get_instance());
-        } else {
-            Array_Base& array = array_at(m_place);
-            if (m_type == INSTANCE_ARRAY_VALUE) unref_elements(array);
-            array.~Array_Base();
-        }
+    if (is_scalar(m_type)) {
+        destruct(m_type, m_place);
+    } else if (m_type == INSTANCE_VALUE) {
+        unref(get_instance());
+    } else {
+        Array_Base& array = array_at(m_place);
+        if (m_type == INSTANCE_ARRAY_VALUE) unref_elements(array);
+        array.~Array_Base();
     }
-    m_type = NONE_VALUE;
-    m_null = true;
-    m_at = nullptr;
 }
 
 void Value::assign(int tag, const void* source)
@@ -195,19 +190,13 @@ void Value::append(Instance* instance)
     ref(instance);
 }
 
-int Value::view(const Instance* instance, const Meta_Feature* feature)
+int Value::view_other(const Instance* instance, const Meta_Feature* feature)
 {
-    clear();
-    int tag = instance ? value_type_of(feature) : static_cast<int>(NONE_VALUE);
-    if (tag == NONE_VALUE) return -1;
-    m_type = tag;
-    if (is_property(feature)) {
-        m_at = feature_at(instance, as_property(feature)->offset);
-        m_null = null_of(instance, as_property(feature)) != 0;
-    } else {
-        m_at = feature_at(instance, as_reference(feature)->offset);
-        m_null = tag == INSTANCE_VALUE ? get_instance() == nullptr : null_of(instance, as_reference(feature)) != 0;
-    }
+    if (!instance || !is_reference(feature)) return -1;
+    const Meta_Reference* reference = as_reference(feature);
+    m_type = value_type_of(feature);
+    m_at = feature_at(instance, reference->offset);
+    m_null = m_type == INSTANCE_VALUE ? get_instance() == nullptr : null_of(instance, reference) != 0;
     return 0;
 }
 

@@ -34,7 +34,13 @@ public:
     int type() const { return m_type; }
     /// No value, whatever the tag. A cleared Value is none and null.
     bool null() const { return m_null; }
-    void clear();
+    void clear()
+    {
+        if (m_at == m_place) destroy_content();
+        m_type = NONE_VALUE;
+        m_null = true;
+        m_at = nullptr;
+    }
 
     /// An empty value of that tag (zero, an empty string or array, a null instance) that counts as null.
     void set_null(int tag);
@@ -81,7 +87,16 @@ public:
 
     /// Out of an instance's feature: a copy, or a view. 0, or -1 for a method or a null instance.
     int get(const Instance* instance, const Meta_Feature* feature);
-    int view(const Instance* instance, const Meta_Feature* feature);
+    int view(const Instance* instance, const Meta_Feature* feature)
+    {
+        clear();
+        if (!instance || !is_property(feature)) return view_other(instance, feature);
+        const Meta_Property* property = as_property(feature);
+        m_type = property->subscript ? property->type + array_tag : property->type;
+        m_at = feature_at(instance, property->offset);
+        m_null = null_of(instance, property) != 0;
+        return 0;
+    }
 
     /// Into an instance's feature, null flag and all. Result 0; -1, with a warning, where the tags differ, an instance
     /// is of a class that the feature cannot hold, or the feature is a method; the feature is then unchanged.
@@ -89,6 +104,8 @@ public:
 
 private:
     void assign(int tag, const void* source);
+    void destroy_content();
+    int view_other(const Instance* instance, const Meta_Feature* feature);
 
     int m_type = NONE_VALUE;
     bool m_null = true;

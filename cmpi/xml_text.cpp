@@ -1,5 +1,7 @@
 #include "cmpi/xml_text.h"
 
+#include <cstring>
+
 namespace cimple {
 
 namespace {
@@ -30,6 +32,15 @@ std::size_t character_size(const unsigned char* text, std::size_t size)
     return length;
 }
 
+// Whether the eight bytes at `text` are printable ASCII, as nearly all that hardware says of itself.
+bool is_plain(const unsigned char* text)
+{
+    constexpr uint64 in_each = 0x0101010101010101, high_bits = 0x80 * in_each;
+    uint64 eight;
+    std::memcpy(&eight, text, sizeof eight);
+    return (((eight - 0x20 * in_each) | eight) & high_bits) == 0; // none is below 0x20, none beyond 0x7F
+}
+
 } // namespace
 
 std::size_t carried_by_xml(const char* text, std::size_t size)
@@ -37,7 +48,8 @@ std::size_t carried_by_xml(const char* text, std::size_t size)
     const auto* bytes = reinterpret_cast<const unsigned char*>(text);
     std::size_t at = 0;
     while (at < size) {
-        std::size_t length = character_size(bytes + at, size - at);
+        const bool eight = size - at >= 8 && is_plain(bytes + at);
+        const std::size_t length = eight ? 8 : character_size(bytes + at, size - at);
         if (length == 0) break;
         at += length;
     }
