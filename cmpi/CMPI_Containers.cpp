@@ -184,10 +184,10 @@ int CMPIInstance_Container::read(std::size_t index, CMPIString*& name, CMPIData&
     return -1;
 }
 
-int CMPIInstance_Container::set_value(const char* name, const Value& value, uint32 flags)
+int CMPIInstance_Container::set_value(const char* name, const Value& value, uint32 flags, Kept_Text* kept)
 {
     Made_Data made;
-    if (to_cmpi_data(m_broker, m_name_space, value, flags, made) != 0) {
+    if (to_cmpi_data(m_broker, m_name_space, value, flags, kept, made) != 0) {
         CONVERSION_WARN("_to_cmpi_data() failed: feature=%s", name);
         return -1;
     }
@@ -230,10 +230,10 @@ int CMPIObjectPath_Container::take(CMPIData& data, int expected_type, Value& val
     return 0;
 }
 
-int CMPIObjectPath_Container::set_value(const char* name, const Value& value, uint32 flags)
+int CMPIObjectPath_Container::set_value(const char* name, const Value& value, uint32 flags, Kept_Text* kept)
 {
     Made_Data made;
-    if (to_cmpi_data(m_broker, m_name_space, value, flags, made) != 0) {
+    if (to_cmpi_data(m_broker, m_name_space, value, flags, kept, made) != 0) {
         CONVERSION_WARN("_to_cmpi_data() failed: feature=%s", name);
         return -1;
     }
@@ -286,14 +286,14 @@ int CMPIArgs_Container::take(CMPIData& data, int expected_type, Value& value)
     return CMPI_Container::take(data, expected_type, value);
 }
 
-int CMPIArgs_Container::set_value(const char* name, const Value& value, uint32 flags)
+int CMPIArgs_Container::set_value(const char* name, const Value& value, uint32 flags, Kept_Text* kept)
 {
     if (equali(name, "return_value")) {
         m_return_value = value;
         return 0;
     }
     Made_Data made;
-    if (to_cmpi_data(m_broker, m_name_space, value, flags, made) != 0) {
+    if (to_cmpi_data(m_broker, m_name_space, value, flags, kept, made) != 0) {
         CONVERSION_WARN("_to_cmpi_data() failed: feature=%s", name);
         return -1;
     }

@@ -49,7 +49,7 @@ class CMPIInstance_Container : public CMPI_Container {
 public:
     CMPIInstance_Container(const CMPIBroker* broker, const Meta_Repository* repository, const char* name_space,
                            CMPIInstance* instance, unsigned depth = 0);
-    int set_value(const char* name, const Value& value, uint32 flags) override;
+    int set_value(const char* name, const Value& value, uint32 flags, Kept_Text* kept) override;
 
 private:
     std::size_t count() override;
@@ -61,7 +61,7 @@ class CMPIObjectPath_Container : public CMPI_Container {
 public:
     CMPIObjectPath_Container(const CMPIBroker* broker, const Meta_Repository* repository, const char* name_space,
                              CMPIObjectPath* path, unsigned depth = 0);
-    int set_value(const char* name, const Value& value, uint32 flags) override;
+    int set_value(const char* name, const Value& value, uint32 flags, Kept_Text* kept) override;
 
 private:
     std::size_t count() override;
@@ -74,7 +74,7 @@ class CMPIArgs_Container : public CMPI_Container {
 public:
     CMPIArgs_Container(const CMPIBroker* broker, const Meta_Repository* repository, const char* name_space,
                        CMPIArgs* args, unsigned depth = 0);
-    int set_value(const char* name, const Value& value, uint32 flags) override;
+    int set_value(const char* name, const Value& value, uint32 flags, Kept_Text* kept) override;
 
     /// What was set by the name "return_value", which is no argument; none otherwise.
     const Value& return_value() const { return m_return_value; }

@@ -4,26 +4,54 @@
 
 namespace cimple {
 
+namespace {
+
+bool is_converted(const Meta_Feature* feature, uint32 flag_mask)
+{
+    return (!flag_mask || feature->flags & flag_mask) && !is_method(feature);
+}
+
+} // namespace
+
+std::vector<Feature_List::Entry>& Feature_List::of(const Meta_Record* record)
+{
+    if (record == m_record) return m_entries;
+    m_record = nullptr; // until all are there
+    m_entries.clear();
+    for (const Meta_Feature* feature : features_of(record))
+        if (is_converted(feature, m_flag_mask)) m_entries.push_back({feature, {}});
+    m_record = record;
+    return m_entries;
+}
+
+void Container::convert_feature(const Instance* instance, const Meta_Feature* feature, Value& value, Kept_Text* kept)
+{
+    if (value.view(instance, feature) != 0) {
+        CONVERSION_WARN("unexpected failure: %s.%s", record_of(instance)->name, feature->name);
+        return;
+    }
+    if (value.null()) return;
+    if (set_value(feature->name, value, feature->flags, kept) != 0)
+        CONVERSION_WARN("conversion error: %s.%s", record_of(instance)->name, feature->name);
+}
+
 int Container::convert(const Instance* instance, uint32 flag_mask)
 {
     if (!instance) {
         CONVERSION_WARN("ignored null instance arg");
         return -1;
     }
-    const Meta_Record* record = record_of(instance);
     Value value;
-    for (std::size_t i = 0; i < record->num_meta_features; ++i) {
-        const Meta_Feature* feature = record->meta_features[i];
-        if (flag_mask && !(feature->flags & flag_mask)) continue;
-        if (is_method(feature)) continue;
-        if (value.view(instance, feature) != 0) {
-            CONVERSION_WARN("unexpected failure: %s.%s", record->name, feature->name);
-            continue;
-        }
-        if (value.null()) continue;
-        if (set_value(feature->name, value, feature->flags) != 0)
-            CONVERSION_WARN("conversion error: %s.%s", record->name, feature->name);
-    }
+    for (const Meta_Feature* feature : features_of(record_of(instance)))
+        if (is_converted(feature, flag_mask)) convert_feature(instance, feature, value, nullptr);
+    return 0;
+}
+
+int Container::convert(const Instance* instance, Feature_List& features)
+{
+    Value value;
+    for (Feature_List::Entry& entry : features.of(record_of(instance)))
+        convert_feature(instance, entry.feature, value, &entry.kept);
     return 0;
 }
 

@@ -44,21 +44,23 @@ const char* name_space_of(const CMPIObjectPath* op)
 }
 
 int make_cmpi_object_path(const CMPIBroker* broker, const Instance* instance, const char* name_space,
-                          Made<CMPIObjectPath>& out)
+                          Made<CMPIObjectPath>& out, Answer_Features* features)
 {
     if (!instance) return 1;
     CMPIStatus status;
     Made<CMPIObjectPath> path(
         ask(status, broker, &CMPIBrokerEncFT::newObjectPath, name_space, record_of(instance)->name));
     if (!path || status.rc != CMPI_RC_OK) return 1;
-    if (CMPIObjectPath_Container(broker, nullptr, name_space, path.get()).convert(instance, META_FLAG_KEY) != 0)
+    CMPIObjectPath_Container container(broker, nullptr, name_space, path.get());
+    if ((features ? container.convert(instance, features->keys) : container.convert(instance, META_FLAG_KEY)) != 0)
         return 1;
     out = std::move(path);
     return 0;
 }
 
 int make_CMPI_instance(const CMPIBroker* broker, const Instance* instance, const char* name_space,
-                       const CMPIObjectPath* path, const char** properties, Made<CMPIInstance>& out)
+                       const CMPIObjectPath* path, const char** properties, Made<CMPIInstance>& out,
+                       Answer_Features* features)
 {
     if (!instance) return 1;
     Made<CMPIObjectPath> built;
@@ -74,7 +76,8 @@ int make_CMPI_instance(const CMPIBroker* broker, const Instance* instance, const
         std::vector<const char*> keys = key_names(record_of(instance));
         tell(made.get(), &CMPIInstanceFT::setPropertyFilter, properties, keys.data());
     }
-    if (CMPIInstance_Container(broker, nullptr, name_space, made.get()).convert(instance, 0) != 0) return 1;
+    CMPIInstance_Container container(broker, nullptr, name_space, made.get());
+    if ((features ? container.convert(instance, features->all) : container.convert(instance, 0)) != 0) return 1;
     out = std::move(made);
     return 0;
 }

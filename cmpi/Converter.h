@@ -7,19 +7,25 @@
 
 #include <cmpift.h>
 
-#include "cmpi/Value.h"
+#include "cmpi/Container.h"
 #include "cmpi/cmpi_call.h"
 
 namespace cimple {
 
-/// The path of an instance: its class and keys.
+/// What the objects of one answer have in common.
+struct Answer_Features {
+    Feature_List keys{META_FLAG_KEY}, all{0};
+};
+
+/// The path of an instance: its class and keys. `features`: of the answer that it is one of, null for an only one.
 int make_cmpi_object_path(const CMPIBroker* broker, const Instance* instance, const char* name_space,
-                          Made<CMPIObjectPath>& out);
+                          Made<CMPIObjectPath>& out, Answer_Features* features = nullptr);
 
 /// An instance on `path` with all that is not null, of the properties named in `properties` (null: all; the class's
 /// keys are told to the server too). A null path is logged and built here.
 int make_CMPI_instance(const CMPIBroker* broker, const Instance* instance, const char* name_space,
-                       const CMPIObjectPath* path, const char** properties, Made<CMPIInstance>& out);
+                       const CMPIObjectPath* path, const char** properties, Made<CMPIInstance>& out,
+                       Answer_Features* features = nullptr);
 
 /// An instance with the keys of `op` alone.
 int make_cimple_reference(const CMPIBroker* broker, const Meta_Class* meta_class, const CMPIObjectPath* op,

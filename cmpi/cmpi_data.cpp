@@ -29,14 +29,34 @@ int tag_of(CMPIType type)
 // --- Runtime to CMPI
 // ---------------------------------------------------------------------------------------------------
 
-int string_to_cmpi(const CMPIBroker* broker, const String& text, CMPIValue& value)
+CMPIString* new_string(const CMPIBroker* broker, const String& text)
 {
     CMPIStatus status;
     if (carried_by_xml(text.c_str(), text.size()) == text.size())
-        value.string = ask(status, broker, &CMPIBrokerEncFT::newString, text.c_str());
-    else
-        value.string = ask(status, broker, &CMPIBrokerEncFT::newString, as_xml_text(text).c_str());
+        return ask(status, broker, &CMPIBrokerEncFT::newString, text.c_str());
+    return ask(status, broker, &CMPIBrokerEncFT::newString, as_xml_text(text).c_str());
+}
+
+int string_to_cmpi(const CMPIBroker* broker, const String& text, CMPIValue& value)
+{
+    value.string = new_string(broker, text);
     return value.string ? 0 : -1;
+}
+
+int kept_string_to_cmpi(const CMPIBroker* broker, const String& text, Kept_Text& kept, Made_Data& made)
+{
+    const char* const place = text.c_str(); // equal texts of a SAN are at one
+    if (!kept.made || kept.text.c_str() != place) {
+        if (kept.last != place) {
+            kept.last = place;
+            return string_to_cmpi(broker, text, made.data.value);
+        }
+        kept.made.reset(new_string(broker, text));
+        kept.text = text;
+    }
+    made.is_kept = true;
+    made.data.value.string = kept.made.get();
+    return kept.made ? 0 : -1;
 }
 
 int datetime_to_cmpi(const CMPIBroker* broker, const Datetime& datetime, CMPIValue& value)
@@ -52,7 +72,20 @@ int scalar_to_cmpi(const CMPIBroker* broker, Type type, const void* source, CMPI
 {
     if (type == STRING) return string_to_cmpi(broker, *static_cast<const String*>(source), value);
     if (type == DATETIME) return datetime_to_cmpi(broker, *static_cast<const Datetime*>(source), value);
-    std::memcpy(&value, source, type_sizes[type]); // every member of the union starts where the union does
+    // Every member of the union starts where the union does.
+    switch (type_sizes[type]) {
+    case 1:
+        std::memcpy(&value, source, 1);
+        break;
+    case 2:
+        std::memcpy(&value, source, 2);
+        break;
+    case 4:
+        std::memcpy(&value, source, 4);
+        break;
+    default:
+        std::memcpy(&value, source, 8);
+    }
     return 0;
 }
 
@@ -277,7 +310,7 @@ int take_array(const CMPIBroker* broker, const Meta_Repository* repository, cons
 
 Made_Data::~Made_Data()
 {
-    if (data.state & CMPI_nullValue) return;
+    if (is_kept || data.state & CMPI_nullValue) return;
     if (data.type & CMPI_ARRAY)
         release(data.value.array);
     else if (data.type == CMPI_string)
@@ -303,7 +336,8 @@ int read_chars(const CMPIString* string, const char*& text)
     return 0;
 }
 
-int to_cmpi_data(const CMPIBroker* broker, const char* name_space, const Value& value, uint32 flags, Made_Data& made)
+int to_cmpi_data(const CMPIBroker* broker, const char* name_space, const Value& value, uint32 flags, Kept_Text* kept,
+                 Made_Data& made)
 {
     const int tag = value.type();
     if (tag == NONE_VALUE) {
@@ -333,6 +367,8 @@ int to_cmpi_data(const CMPIBroker* broker, const char* name_space, const Value& 
     }
     made.data.type = type;
     if (tag == INSTANCE_VALUE) return instance_to_cmpi(broker, name_space, value.get_instance(), type, made.data.value);
+    if (tag == STRING && kept)
+        return kept_string_to_cmpi(broker, *static_cast<const String*>(value.data()), *kept, made);
     return scalar_to_cmpi(broker, static_cast<Type>(tag), value.data(), made.data.value);
 }
 

@@ -4,6 +4,7 @@
 #include <cmpift.h>
 
 #include "cmpi/Value.h"
+#include "cmpi/cmpi_call.h"
 
 namespace cimple {
 
@@ -15,6 +16,7 @@ constexpr unsigned deepest_instance = 32;
 /// until the request ends, since servers keep pointers to them.
 struct Made_Data {
     CMPIData data{};
+    bool is_kept = false; ///< the string is a Kept_Text's
 
     Made_Data() = default;
     Made_Data(const Made_Data&) = delete;
@@ -25,9 +27,19 @@ struct Made_Data {
     const CMPIValue* value() const { return data.state & CMPI_nullValue ? nullptr : &data.value; }
 };
 
+/// The string of the broker's for a text that a feature has in one instance after the other, most of which the
+/// instances of a large SAN share. Servers copy what they are given, so one string serves all.
+struct Kept_Text {
+    const char* last = nullptr; ///< where the last text was; only compared, since it may be gone
+    String text;                ///< what `made` is of; holding it keeps its place from any other
+    Made<CMPIString> made;      ///< from the second time in a row on
+};
+
 /// Runtime to CMPI. `flags` of the feature tell a reference from an embedded instance; `name_space` is for instances
-/// without one. Bytes of strings that no XML can carry become '?'. 0, or -1 with a warning.
-int to_cmpi_data(const CMPIBroker* broker, const char* name_space, const Value& value, uint32 flags, Made_Data& made);
+/// without one; `kept` belongs to the feature, null for one that is converted once. Bytes of strings that no XML can
+/// carry become '?'. 0, or -1 with a warning.
+int to_cmpi_data(const CMPIBroker* broker, const char* name_space, const Value& value, uint32 flags, Kept_Text* kept,
+                 Made_Data& made);
 
 /// The characters of a string that a client sent: 0, with null and a word in the log where it has none; or -1 with a
 /// warning.

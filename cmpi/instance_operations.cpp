@@ -21,7 +21,8 @@ struct Delivery {
     const CMPIResult* result;
     const char* name_space;
     const char** properties;
-    int error; // once set, nothing more is delivered
+    int error = 0; // once set, nothing more is delivered
+    Answer_Features features = {};
 };
 
 bool deliver_name(Instance* instance, int, void* data)
@@ -30,7 +31,7 @@ bool deliver_name(Instance* instance, int, void* data)
     auto& delivery = *static_cast<Delivery*>(data);
     if (!instance || delivery.error) return true;
     Made<CMPIObjectPath> path;
-    delivery.error = make_cmpi_object_path(delivery.broker, instance, delivery.name_space, path);
+    delivery.error = make_cmpi_object_path(delivery.broker, instance, delivery.name_space, path, &delivery.features);
     if (!delivery.error) tell(delivery.result, &CMPIResultFT::returnObjectPath, path.get());
     return true;
 }
@@ -42,10 +43,10 @@ bool deliver_instance(Instance* instance, int, void* data)
     if (!instance || delivery.error) return true;
     Made<CMPIObjectPath> path;
     Made<CMPIInstance> made;
-    delivery.error = make_cmpi_object_path(delivery.broker, instance, delivery.name_space, path);
+    delivery.error = make_cmpi_object_path(delivery.broker, instance, delivery.name_space, path, &delivery.features);
     if (!delivery.error)
-        delivery.error =
-            make_CMPI_instance(delivery.broker, instance, delivery.name_space, path.get(), delivery.properties, made);
+        delivery.error = make_CMPI_instance(delivery.broker, instance, delivery.name_space, path.get(),
+                                            delivery.properties, made, &delivery.features);
     if (!delivery.error) tell(delivery.result, &CMPIResultFT::returnInstance, made.get());
     return true;
 }
@@ -113,7 +114,7 @@ CMPIStatus enumerateInstanceNames(CMPIInstanceMI* mi, const CMPIContext* ctx, co
         Ref<Instance> model(read);
         nullify_properties(read, false, true, 1);
 
-        Delivery delivery{adapter.broker, rslt, name_space_of(op), nullptr, 0};
+        Delivery delivery{adapter.broker, rslt, name_space_of(op), nullptr};
         const Selection names(&delivery, Selection::Values::keys, Selection::Handler::only_reads);
         int status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, read, &deliver_name, &delivery);
         if (status == ENUM_INSTANCES_OK) return return_done(rslt);
@@ -132,7 +133,7 @@ CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* ctx, const 
         Ref<Instance> model(read);
         filter_properties(read, properties, true);
 
-        Delivery delivery{adapter.broker, rslt, name_space_of(op), properties, 0};
+        Delivery delivery{adapter.broker, rslt, name_space_of(op), properties};
         const Selection instances(&delivery, Selection::Values::keys_of_ends, // references become paths
                                   Selection::Handler::only_reads);
         int status = adapter.call(OP_ENUM_INSTANCES, adapter.provider, read, &deliver_instance, &delivery);
@@ -256,7 +257,7 @@ CMPIStatus invokeMethod(CMPIMethodMI* mi, const CMPIContext* ctx, const CMPIResu
         Value return_value;
         Made_Data made;
         if (int error = make_method_out(adapter.broker, name_space, record, out, return_value)) return CMPIrc(error);
-        if (to_cmpi_data(adapter.broker, name_space, return_value, 0, made) != 0) return CMPI_RC_ERR_FAILED;
+        if (to_cmpi_data(adapter.broker, name_space, return_value, 0, nullptr, made) != 0) return CMPI_RC_ERR_FAILED;
         tell(rslt, &CMPIResultFT::returnData, made.value(), made.data.type);
         return return_done(rslt);
     });

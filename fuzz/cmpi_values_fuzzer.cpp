@@ -102,11 +102,14 @@ private:
 void expect_way_back(fake::Broker& broker, const Instance* read)
 {
     if (!read) return;
-    Made<CMPIObjectPath> path;
-    make_cmpi_object_path(&broker.cmpi, read, "root/test", path);
-    Made<CMPIInstance> made;
-    make_CMPI_instance(&broker.cmpi, read, "root/test", path.get(), nullptr, made);
     const Ref<Instance> copy(clone(read));
+    Answer_Features features;
+    for (const Instance* one : {read, static_cast<const Instance*>(copy.get()), read}) {
+        Made<CMPIObjectPath> path;
+        make_cmpi_object_path(&broker.cmpi, one, "root/test", path, &features);
+        Made<CMPIInstance> made;
+        make_CMPI_instance(&broker.cmpi, one, "root/test", path.get(), nullptr, made, &features);
+    }
     String text;
     instance_to_model_path(copy.get(), text);
     key_eq(copy.get(), read);

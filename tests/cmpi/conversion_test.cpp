@@ -1,4 +1,6 @@
 // Values between CMPI and the runtime, both ways.
+#include <cstring>
+
 #include "cmpi/CMPI_Containers.h"
 #include "cmpi/Converter.h"
 #include "cmpi/cmpi_data.h"
@@ -226,6 +228,106 @@ TEST_F(Conversion, NothingComesOutOfNothing)
     EXPECT_EQ(make_CMPI_instance(&broker.cmpi, nullptr, "root/test", nullptr, nullptr, made), 1);
     EXPECT_EQ(make_cmpi_object_path(&broker.cmpi, nullptr, "root/test", path), 1);
     EXPECT_EQ(CMPIInstance_Container(&broker.cmpi, nullptr, "root/test", nullptr).convert(nullptr, 0), -1);
+}
+
+/// The instances of one answer, whose texts a server is asked to make a string of.
+class Answers : public Conversion {
+protected:
+    Answers()
+    {
+        made_strings = 0;
+        real_new_string = broker.eft.newString;
+        broker.eft.newString = [](const CMPIBroker* of, const char* text, CMPIStatus* status) -> CMPIString* {
+            made_strings++;
+            if (refused && std::strcmp(text, refused) == 0) return nullptr;
+            return real_new_string(of, text, status);
+        };
+    }
+    ~Answers() override { refused = nullptr; }
+
+    /// What `thing` becomes as the next of the answer, keys first.
+    fake::Instance next(const Instance* thing, Answer_Features& features)
+    {
+        Made<CMPIObjectPath> path;
+        Made<CMPIInstance> made;
+        EXPECT_EQ(make_cmpi_object_path(&broker.cmpi, thing, "root/test", path, &features), 0);
+        EXPECT_EQ(make_CMPI_instance(&broker.cmpi, thing, "root/test", path.get(), nullptr, made, &features), 0);
+        if (!made) return {};
+        CMPIResult* result = broker.result();
+        result->ft->returnInstance(result, made.get());
+        return broker.returned(result).instances.at(0);
+    }
+    Ref<TEST_Thing> thing_of(const String& text)
+    {
+        Ref<TEST_Thing> thing(new_thing("same", 1));
+        thing->Name.set(name);
+        thing->Text.set(text);
+        return thing;
+    }
+
+    const String name{"same"};
+    static inline int made_strings;
+    static inline const char* refused = nullptr;
+    static inline CMPIString* (*real_new_string)(const CMPIBroker*, const char*, CMPIStatus*);
+};
+
+TEST_F(Answers, MakeOneStringOfATextThatInstancesShare)
+{
+    const String text("shared");
+    Answer_Features features;
+    for (int i = 0; i < 10; i++) {
+        const fake::Instance made = next(thing_of(text).get(), features);
+        EXPECT_EQ(fake::find(made.path.keys, "Name").text, "same");
+        EXPECT_EQ(fake::find(made.properties, "Name").text, "same");
+        EXPECT_EQ(fake::find(made.properties, "Text").text, "shared");
+    }
+    EXPECT_EQ(made_strings, 2 * 3) << "of a key, of its property and of another one, the first time and the second";
+}
+
+TEST_F(Answers, TellTextsApartThatComeToThePlaceOfAnother)
+{
+    Answer_Features features;
+    for (int i = 0; i < 40; i++) { // a pair each, freed before the next
+        const std::string text = "text " + std::to_string(i / 2);
+        const Ref<TEST_Thing> thing = thing_of(String(text.c_str()));
+        EXPECT_EQ(fake::find(next(thing.get(), features).properties, "Text").text, text);
+    }
+    const String first("first"), second("second");
+    for (const String* text : {&first, &first, &second, &first, &second, &second, &first, &first, &first})
+        EXPECT_EQ(fake::find(next(thing_of(*text).get(), features).properties, "Text").text, text->c_str());
+}
+
+TEST_F(Answers, MendATextThatXmlCannotCarryEachTime)
+{
+    const String text("\x01 and \xFF");
+    Answer_Features features;
+    for (int i = 0; i < 4; i++)
+        EXPECT_EQ(fake::find(next(thing_of(text).get(), features).properties, "Text").text, "? and ?");
+}
+
+TEST_F(Answers, LeaveOutATextThatTheServerMakesNoStringOf)
+{
+    const String text("refused"), other("other");
+    refused = "refused";
+    Answer_Features features;
+    Runtime_Log log;
+    for (std::size_t i = 0; i < 4; i++) {
+        EXPECT_TRUE(fake::find(next(thing_of(text).get(), features).properties, "Text").null());
+        EXPECT_THAT(log.lines(), SizeIs(2 * (i + 1)));
+    }
+    EXPECT_TRUE(log.has("WARN conversion error: TEST_Thing.Text"));
+    for (int i = 0; i < 3; i++)
+        EXPECT_EQ(fake::find(next(thing_of(other).get(), features).properties, "Text").text, "other");
+}
+
+TEST_F(Answers, MayHoldInstancesOfSeveralClasses)
+{
+    Answer_Features features;
+    for (int i = 0; i < 3; i++) {
+        EXPECT_EQ(fake::find(next(thing_of("t").get(), features).properties, "Text").text, "t");
+        const Ref<TEST_Part> part(new_part("p"));
+        EXPECT_EQ(fake::find(next(part.get(), features).path.keys, "Id").text, "p");
+    }
 }
 
 TEST_F(Conversion, EachCallThatFailsHasItsWords)
