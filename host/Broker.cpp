@@ -159,10 +159,11 @@ void Broker::retire(Object& object)
     object.scope->retire(object);
 }
 
-void Broker::keep(Retired_Objects&& retired)
+void Broker::keep(Retired_Objects& retired)
 {
+    Retired_Objects oldest; // freed without the mutex
     std::lock_guard lock(m_mutex);
-    m_retired.add(std::move(retired));
+    oldest = m_retired.add_last(retired);
 }
 
 void Broker::violation(const std::string& text)

@@ -92,8 +92,8 @@ public:
 
     /// Frees an object that the module released.
     void retire(Object& object);
-    /// Keeps what a scope's end would free, for as long as it counts as released a moment ago.
-    void keep(Retired_Objects&& retired);
+    /// Keeps the last of what a scope's end would free, for as long as they count as released a moment ago.
+    void keep(Retired_Objects& retired);
     /// Notes a broken rule, in the ledger and the log.
     void violation(const std::string& text);
     /// Notes a call of a broker function on a thread that has neither a request nor an attachment.

@@ -1,11 +1,14 @@
 #include "host/Scope.h"
 
+#include <algorithm>
+
 #include "host/Broker.h"
 
 namespace host {
 namespace {
 thread_local Scope* innermost = nullptr;
 constexpr std::size_t most_retired = 256;
+constexpr std::size_t most_kept = 32; // of a scope that ends
 } // namespace
 
 std::unique_ptr<Object> Retired_Objects::add(std::unique_ptr<Object> object)
@@ -17,10 +20,14 @@ std::unique_ptr<Object> Retired_Objects::add(std::unique_ptr<Object> object)
     return oldest;
 }
 
-void Retired_Objects::add(Retired_Objects&& others)
+Retired_Objects Retired_Objects::add_last(Retired_Objects& others)
 {
-    for (std::unique_ptr<Object>& object : others.m_objects)
-        (void)add(std::move(object));
+    Retired_Objects oldest;
+    const std::size_t count = std::min(others.m_objects.size(), most_kept);
+    for (auto object = others.m_objects.end() - static_cast<std::ptrdiff_t>(count); object != others.m_objects.end();
+         ++object)
+        if (std::unique_ptr<Object> one = add(std::move(*object))) oldest.m_objects.push_back(std::move(one));
+    return oldest;
 }
 
 Scope::Scope(Broker& broker, Sort sort, std::string what) : m_broker(broker), m_sort(sort), m_what(std::move(what)) {}
@@ -35,7 +42,7 @@ Scope::~Scope()
         m_broker.ledger().settled(object->kind, object->origin);
         delete object;
     }
-    m_broker.keep(std::move(m_retired));
+    m_broker.keep(m_retired);
 }
 
 void Scope::enter()

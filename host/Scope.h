@@ -18,8 +18,8 @@ class Retired_Objects {
 public:
     /// Takes one more, and gives the oldest back if there are too many then.
     [[nodiscard]] std::unique_ptr<Object> add(std::unique_ptr<Object> object);
-    /// Takes all of another.
-    void add(Retired_Objects&& others);
+    /// Takes the last ones of another, and gives the oldest back that are too many then.
+    [[nodiscard]] Retired_Objects add_last(Retired_Objects& others);
 
 private:
     std::deque<std::unique_ptr<Object>> m_objects;
