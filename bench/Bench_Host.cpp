@@ -1,6 +1,7 @@
 #include "bench/Bench_Host.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <iterator>
 #include <stdexcept>
 #include <vector>
@@ -46,8 +47,9 @@ void prepare_host(unsigned ports, unsigned targets, unsigned luns)
 Bench_Host::Bench_Host(unsigned ports, unsigned targets, unsigned luns)
     : m_server((prepare_host(ports, targets, luns), nvrtest::module_schema()))
 {
+    const char* other = std::getenv("NVR_BENCH_MODULE");
     std::string error;
-    if (m_server.add_module(NVR_MODULE, name_space, &error) == 0) throw std::runtime_error(error);
+    if (m_server.add_module(other ? other : NVR_MODULE, name_space, &error) == 0) throw std::runtime_error(error);
 }
 
 host::Answer Bench_Host::enumerate(const std::string& class_name)
