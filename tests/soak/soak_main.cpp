@@ -353,7 +353,7 @@ bool Soak::judge()
     bool all_well = true;
     const auto hold_against = [&](bool is_well, const char* format, auto... values) {
         all_well &= is_well;
-        say(is_well ? "well: " : "NOT WELL: ");
+        say("%s", is_well ? "well: " : "NOT WELL: ");
         say(format, values...);
     };
     std::vector<std::pair<double, double>> resident;
