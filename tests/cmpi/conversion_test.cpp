@@ -197,6 +197,22 @@ TEST_F(Conversion, BytesThatXmlCannotCarryBecomeQuestionMarks)
     EXPECT_STREQ(thing->Name.value.c_str(), "n\x01me"); // on the way out only
 }
 
+// Plain text is looked at eight bytes at a time.
+TEST(XmlText, EachByteCountsWhereverItStands)
+{
+    for (std::size_t at = 0; at < 20; at++)
+        for (int byte = 0; byte < 256; byte++) {
+            std::string text(20, 'x');
+            text[at] = static_cast<char>(byte);
+            const bool is_carried = byte < 0x80 && (byte >= 0x20 || byte == '\t' || byte == '\n' || byte == '\r');
+            EXPECT_EQ(carried_by_xml(text.data(), text.size()), is_carried ? text.size() : at) << byte << " at " << at;
+        }
+    for (std::size_t at = 0; at < 12; at++) { // and beside what is more than a byte
+        const std::string text = std::string(at, 'x') + "\xC3\xA9" + std::string(9, 'y') + '\x01';
+        EXPECT_EQ(carried_by_xml(text.data(), text.size()), at + 2 + 9) << at;
+    }
+}
+
 TEST(XmlText, WellFormedTextIsSharedAndNotCopied)
 {
     String text("caf\xC3\xA9 \xF0\x9F\x98\x80\r\n");
