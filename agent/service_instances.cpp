@@ -1,6 +1,4 @@
 // The management services, the provider's record log and the remote access point, with what ties them to the host.
-#include <dlfcn.h>
-
 #include "agent/Adapter_Update.h"
 #include "classes/NVRHBA_BootBIOSService.h"
 #include "classes/NVRHBA_EnabledRecordLogCapabilities.h"
@@ -14,6 +12,7 @@
 #include "classes/NVRHBA_SoftwareInstallationServiceCapabilities.h"
 #include "foundation/CLogger.h"
 #include "foundation/curl_places.h"
+#include "foundation/library_closing.h"
 
 namespace cimple {
 
@@ -23,7 +22,7 @@ namespace {
 bool hasCurl()
 {
     if (void* library = openCurl()) {
-        if (dlclose(library) != 0) NVR_LOG("ERROR: UNABLE TO CLOSE DYNAMIC LIB");
+        if (closeLibrary(library) != 0) NVR_LOG("ERROR: UNABLE TO CLOSE DYNAMIC LIB");
         return true;
     }
     NVR_LOG("libcurl is not present. only file type URIScheme will be supported");

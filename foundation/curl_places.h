@@ -4,7 +4,7 @@
 namespace cimple {
 
 /// Opens libcurl from the first of its places that has it, with all its symbols bound and global, logging each place
-/// before it is tried. The caller closes it with dlclose. Null if none has it.
+/// before it is tried. The caller closes it with closeLibrary. Null if none has it.
 void* openCurl();
 
 } // namespace cimple

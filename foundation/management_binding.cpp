@@ -5,6 +5,8 @@
 #include <string>
 #include <type_traits>
 
+#include "foundation/library_closing.h"
+
 namespace cimple {
 
 namespace {
@@ -64,7 +66,7 @@ int loadLibrary(LibrarySlot slot, const char* name)
     return 1;
 }
 
-int loadLibraries()
+static int open_libraries()
 {
     if (!loadLibrary(SLOT_HBAAPI, "HBAAPI")) hbaApiMissing = true;
     int result = 0;
@@ -76,6 +78,13 @@ int loadLibraries()
     lrmApiMissing = true;
     if (loadLibrary(SLOT_RMAPI, "rmapi")) return 1; // all works, yet the log is to tell
     rmApiMissing = true;
+    return result;
+}
+
+int loadLibraries()
+{
+    const int result = open_libraries();
+    watchExit();
     return result;
 }
 
@@ -121,10 +130,14 @@ NVR_CPQFC_OPERATIONS(NVR_DEFINE_CPQFC)
 
 int unloadLibraries()
 {
-    const bool kept = keptMapped;
-    if (slots[SLOT_HBAAPI] && !kept) call_if_there("HBA_FreeLibrary");
-    for (std::atomic<void*>& slot : slots)
-        if (void* library = slot.exchange(nullptr); library && !kept) ::dlclose(library);
+    {
+        const bool kept = keptMapped;
+        const Library_Closing closing; // which the common library does with its vendors', too
+        if (slots[SLOT_HBAAPI] && !kept && closing.allowed()) call_if_there("HBA_FreeLibrary");
+        for (std::atomic<void*>& slot : slots)
+            if (void* library = slot.exchange(nullptr); library && !kept) closeLibrary(library);
+        forgetExit();
+    }
 #define NVR_FORGET(result, name, missing, parameters, arguments) name.m_symbol = nullptr;
     NVR_MANAGEMENT_OPERATIONS(NVR_FORGET)
     NVR_PLAIN_MANAGEMENT_OPERATIONS(NVR_FORGET)

@@ -25,7 +25,7 @@ int loadLibrary(LibrarySlot slot, const char* name);
 int loadLibraries();
 
 /// Closes all slots, in order, and forgets every symbol and every missing library, so that a new load binds afresh. No
-/// operation may be running. Result 0.
+/// operation may be running. While the process exits, the libraries are forgotten alone. Result 0.
 int unloadLibraries();
 
 /// While `keep` is in force, unloadLibraries forgets the libraries but leaves them in the process, for one of them that

@@ -5,6 +5,7 @@
 
 #include "foundation/CLogger.h"
 #include "foundation/curl_places.h"
+#include "foundation/library_closing.h"
 #include "runtime/guarded.h"
 
 namespace cimple {
@@ -25,7 +26,7 @@ Curl_Library::~Curl_Library() noexcept(false)
     if (!m_library) return;
     if (handle && easy_cleanup) guarded([&] { easy_cleanup.call(handle); });
     if (initialised && global_cleanup) guarded([&] { global_cleanup.call(); });
-    ::dlclose(m_library);
+    closeLibrary(m_library);
 }
 
 template <class Signature>
@@ -60,7 +61,7 @@ void Curl_Library::logVersion() const
 
 bool Curl_Library::close()
 {
-    return ::dlclose(std::exchange(m_library, nullptr)) == 0;
+    return closeLibrary(std::exchange(m_library, nullptr)) == 0;
 }
 
 } // namespace cimple

@@ -189,11 +189,18 @@ TEST(Exit, WhileTheAgentLetsGoOfItsLibrariesFindsBothFilesWritten)
     EXPECT_FALSE(exists(ended.guard));
 }
 
-// Each finds the other's work not begun or done, so that no file is ever cut short.
+// Each finds the other's work not begun or done, so that no file is ever cut short; in each other round of the
+// libraries that were opened anew.
 TEST(Exit, AtAnyMomentOfTheAgentsEndLeavesWholeFiles)
 {
     for (int round = 0; round < 20; round++) {
         const Ended ended = exit_after([round] {
+            if (round % 2) {
+                Rig& earlier = lasting_rig({host::Manner::strict(), "small"});
+                earlier.settle();
+                earlier.stop();
+                remove(trace_path);
+            }
             Rig& rig = lasting_rig({host::Manner::strict(), "small"});
             set_minutes(rig, 17);
             rig.settle();
