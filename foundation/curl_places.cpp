@@ -8,12 +8,12 @@ namespace cimple {
 
 namespace {
 
-struct Place {
+struct Curl_Place {
     const char* words;
     const char* library;
 };
 
-constexpr Place places[] = {
+constexpr Curl_Place places[] = {
     {"Searching for /lib Curl on the machine", "/lib/libcurl.so.4"},
     {"Searching for /usr/lib/ Curl on the machine", "/usr/lib/libcurl.so.4"},
     {"Checking with libcurl.so system location for libcurl", "libcurl.so"},
@@ -24,7 +24,7 @@ constexpr Place places[] = {
 
 void* openCurl()
 {
-    for (const Place& place : places) {
+    for (const Curl_Place& place : places) {
         NVR_LOG("%s", place.words);
         if (void* library = ::dlopen(place.library, RTLD_NOW | RTLD_GLOBAL)) return library;
     }
