@@ -66,7 +66,7 @@ CMPI_Thread_Context::~CMPI_Thread_Context()
 Thread_Context* CMPI_Thread_Context::thread_create_hook(void*)
 {
     auto prepare = slot_of(broker, &CMPIBrokerFT::prepareAttachThread);
-    if (!prepare) return nullptr;
+    if (!prepare || !context) return nullptr; // servers read what they are given
     auto child = std::make_unique<CMPI_Thread_Context>(broker, nullptr, adapter);
     CMPIContext* prepared = prepare(broker, context);
     if (!prepared) return nullptr;

@@ -289,6 +289,15 @@ TEST_F(UpCalls, AServerThatPreparesNothingLeavesTheThreadWithoutAContext)
     EXPECT_FALSE(second.has_context);
 }
 
+TEST_F(UpCalls, ARequestWithoutAContextPreparesNone)
+{
+    context = nullptr;
+    Child child;
+    inside([&] { EXPECT_EQ(child.run_here(), 0); });
+    EXPECT_EQ(broker.prepared, 0);
+    EXPECT_FALSE(child.has_context);
+}
+
 TEST_F(UpCalls, AThreadThatCouldNotAttachReleasesItsContextItself)
 {
     broker.refuse_attach = true;
