@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <atomic>
 #include <cstdint>
+#include <dlfcn.h>
 #include <filesystem>
 #include <functional>
 #include <initializer_list>
@@ -185,8 +186,9 @@ struct Unread_Result : CMPIResult {
     Unread_Result() : CMPIResult{nullptr, &table} {}
 
     template <class... Given>
-    static CMPIStatus take(const CMPIResult*, Given...)
+    static CMPIStatus take(const CMPIResult* result, Given...)
     {
+        if (sizeof...(Given) == 1) static_cast<const Unread_Result*>(result)->objects++;
         return {CMPI_RC_OK, nullptr};
     }
     static CMPIResult* clone(const CMPIResult*, CMPIStatus*) { return nullptr; }
@@ -201,7 +203,17 @@ struct Unread_Result : CMPIResult {
                                         &take<const CMPIObjectPath*>,
                                         &take<>,
                                         &take<const CMPIError*>};
+    mutable std::size_t objects = 0; // that it was given, beside data
 };
+
+/// The record of an exported factory that gets no broker, no context and no place for a status; null if there is none.
+template <class Record>
+Record* made_of_nothing(const Entries& entries, const std::string& factory)
+{
+    const auto make = reinterpret_cast<Record* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*)>(
+        ::dlsym(entries.handle(), factory.c_str()));
+    return make ? make(nullptr, nullptr, nullptr) : nullptr;
+}
 
 class Hostile : public testing::Test {
 protected:
@@ -340,6 +352,21 @@ protected:
             });
         for (std::thread& thread : threads)
             thread.join();
+    }
+
+    /// The functions of the indication table, with that record and with none. All filters are allowed, whoever asks;
+    /// alerts need a thread, which needs a context.
+    static void call_with_nothing(const CMPIIndicationMIFT& ft, CMPIIndicationMI* mi, const CMPIContext* context)
+    {
+        for (CMPIIndicationMI* whose : {mi, static_cast<CMPIIndicationMI*>(nullptr)}) {
+            const CMPIrc rc = whose ? CMPI_RC_OK : CMPI_RC_ERR_FAILED;
+            EXPECT_EQ(ft.authorizeFilter(whose, context, nullptr, nullptr, nullptr, nullptr).rc, CMPI_RC_OK);
+            EXPECT_EQ(ft.mustPoll(whose, context, nullptr, nullptr, nullptr).rc, CMPI_RC_OK);
+            EXPECT_EQ(ft.activateFilter(whose, context, nullptr, nullptr, nullptr, 0).rc, rc);
+            EXPECT_EQ(ft.enableIndications(whose, context).rc, context ? rc : CMPI_RC_ERR_FAILED);
+            EXPECT_EQ(ft.disableIndications(whose, context).rc, rc);
+            EXPECT_EQ(ft.deActivateFilter(whose, context, nullptr, nullptr, nullptr, 0).rc, rc);
+        }
     }
 
     Path some_path(const std::string& class_name)
@@ -523,6 +550,8 @@ TEST_F(Hostile, EveryFunctionOfEveryTableIsCalledWithNothing)
             CMPIInstanceMI* instances = entries.instances(name, broker, context);
             CMPIMethodMI* methods = entries.methods(name, broker, context);
             CMPIAssociationMI* ends = entries.associations(name, broker, context);
+            CMPIIndicationMI* alerts = entries.indications(name, broker, context);
+            EXPECT_EQ(alerts != nullptr, name == alert_class);
             for (const CMPIContext* ctx : contexts) {
                 if (instances) {
                     for (CMPIInstanceMI* mi : {instances, static_cast<CMPIInstanceMI*>(nullptr)}) {
@@ -553,6 +582,7 @@ TEST_F(Hostile, EveryFunctionOfEveryTableIsCalledWithNothing)
                         EXPECT_EQ(ft.references(mi, ctx, nullptr, nullptr, nullptr, nullptr, none).rc, rc);
                         EXPECT_EQ(ft.referenceNames(mi, ctx, nullptr, nullptr, nullptr, nullptr).rc, rc);
                     }
+                if (alerts) call_with_nothing(*alerts->ft, alerts, ctx);
                 m_calls++;
             }
             const auto clean_up = [](auto* mi) {
@@ -563,6 +593,7 @@ TEST_F(Hostile, EveryFunctionOfEveryTableIsCalledWithNothing)
             clean_up(instances);
             clean_up(methods);
             clean_up(ends);
+            clean_up(alerts);
         }
     });
 }
@@ -588,6 +619,7 @@ TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
                 ASSERT_TRUE(instance);
                 for (CMPIObjectPath* path : paths) {
                     ft.enumerateInstanceNames(mi, context, &unread, path);
+                    ft.enumerateInstances(mi, context, &unread, path, nullptr);
                     ft.getInstance(mi, context, &unread, path, nullptr);
                     ft.createInstance(mi, context, &unread, path, instance);
                     ft.modifyInstance(mi, context, &unread, path, instance, nullptr);
@@ -600,7 +632,6 @@ TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
                 }
                 EXPECT_NE(ft.createInstance(mi, context, &unread, own, nullptr).rc, CMPI_RC_OK);
                 EXPECT_NE(ft.modifyInstance(mi, context, &unread, own, nullptr, nullptr).rc, CMPI_RC_OK);
-                ft.enumerateInstances(mi, context, &unread, foreign.paths.front(), nullptr);
                 for (const auto& [ctx, result] : without_one) {
                     ft.enumerateInstanceNames(mi, ctx, result, own);
                     ft.enumerateInstances(mi, ctx, result, own, nullptr);
@@ -660,6 +691,74 @@ TEST_F(Hostile, PathsOfOtherClassesAndArgumentsOfNobodyComeStraightToTheTables)
     EXPECT_GT(m_calls, 20u);
 }
 
+TEST_F(Hostile, EveryFactoryIsCalledWithNothing)
+{
+    rig.restart(); // or each provider has the server's broker already
+    Entries entries;
+    const Unread_Result unread;
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        CMPIStatus status = {CMPI_RC_OK, nullptr};
+        std::vector<std::function<CMPIStatus()>> clean_ups; // at the end, so that the host is read only once
+        const auto keep = [&](auto* mi) { clean_ups.push_back([=] { return mi->ft->cleanup(mi, nullptr, 0); }); };
+        for (const std::string& name : rig.classes()) {
+            SCOPED_TRACE(name);
+            CMPIObjectPath* own = broker->eft->newObjectPath(broker, "root/norvane", name.c_str(), &status);
+            CMPIInstance* instance = broker->eft->newInstance(broker, own, &status);
+            const std::string factory = name + "_Create_";
+            auto* instances = made_of_nothing<CMPIInstanceMI>(entries, factory + "InstanceMI");
+            auto* methods = made_of_nothing<CMPIMethodMI>(entries, factory + "MethodMI");
+            auto* ends = made_of_nothing<CMPIAssociationMI>(entries, factory + "AssociationMI");
+            auto* alerts = made_of_nothing<CMPIIndicationMI>(entries, factory + "IndicationMI");
+            EXPECT_TRUE(instances || alerts);
+            for (const CMPIContext* ctx : {context, static_cast<const CMPIContext*>(nullptr)}) {
+                if (instances) {
+                    const CMPIInstanceMIFT& ft = *instances->ft;
+                    ft.enumerateInstanceNames(instances, ctx, &unread, own);
+                    ft.enumerateInstances(instances, ctx, &unread, own, nullptr);
+                    EXPECT_NE(ft.getInstance(instances, ctx, &unread, own, nullptr).rc, CMPI_RC_OK);
+                    EXPECT_NE(ft.createInstance(instances, ctx, &unread, own, instance).rc, CMPI_RC_OK);
+                    EXPECT_NE(ft.modifyInstance(instances, ctx, &unread, own, instance, nullptr).rc, CMPI_RC_OK);
+                    EXPECT_NE(ft.deleteInstance(instances, ctx, &unread, own).rc, CMPI_RC_OK);
+                }
+                if (methods)
+                    for (const host::Method_Record& method : module_schema()->find(name)->methods) {
+                        CMPIArgs* in = broker->eft->newArgs(broker, &status);
+                        CMPIArgs* out = broker->eft->newArgs(broker, &status);
+                        methods->ft->invokeMethod(methods, ctx, &unread, own, method.name.c_str(), in, out);
+                        in->ft->release(in);
+                        out->ft->release(out);
+                    }
+                if (ends) {
+                    const CMPIAssociationMIFT& ft = *ends->ft;
+                    ft.associators(ends, ctx, &unread, own, nullptr, nullptr, nullptr, nullptr, nullptr);
+                    ft.associatorNames(ends, ctx, &unread, own, nullptr, nullptr, nullptr, nullptr);
+                    ft.references(ends, ctx, &unread, own, nullptr, nullptr, nullptr);
+                    ft.referenceNames(ends, ctx, &unread, own, nullptr, nullptr);
+                }
+                if (alerts) {
+                    const CMPIIndicationMIFT& ft = *alerts->ft;
+                    EXPECT_EQ(ft.activateFilter(alerts, ctx, nullptr, nullptr, own, 1).rc, CMPI_RC_OK);
+                    EXPECT_NE(ft.enableIndications(alerts, ctx).rc, CMPI_RC_OK) << "no thread could deliver any";
+                    nvrsim_event("0", 513, 0);
+                    nvrsim_drain_events();
+                    EXPECT_EQ(ft.deActivateFilter(alerts, ctx, nullptr, nullptr, own, 1).rc, CMPI_RC_OK);
+                    EXPECT_EQ(ft.disableIndications(alerts, ctx).rc, CMPI_RC_OK);
+                }
+                m_calls++;
+            }
+            if (instances) keep(instances);
+            if (methods) keep(methods);
+            if (ends) keep(ends);
+            if (alerts) keep(alerts);
+            instance->ft->release(instance);
+            own->ft->release(own);
+        }
+        for (const auto& clean_up : clean_ups)
+            EXPECT_EQ(clean_up().rc, CMPI_RC_OK);
+    });
+    EXPECT_EQ(unread.objects, 0u) << "nobody could have made them";
+}
+
 TEST_F(Hostile, FiltersOfAnyClassAndQueryComeAndGoInAnyOrder)
 {
     Entries entries;
@@ -675,12 +774,7 @@ TEST_F(Hostile, FiltersOfAnyClassAndQueryComeAndGoInAnyOrder)
             EXPECT_EQ(ft.disableIndications(mi, context).rc, CMPI_RC_OK) << "they are not enabled";
             CMPIObjectPath* nowhere = at("root/nowhere");
             EXPECT_EQ(ft.deActivateFilter(mi, context, nullptr, nullptr, nowhere, 1).rc, CMPI_RC_OK) << "it is not";
-            for (CMPIIndicationMI* whose : {mi, static_cast<CMPIIndicationMI*>(nullptr)}) {
-                ft.authorizeFilter(whose, nullptr, nullptr, nullptr, nullptr, nullptr);
-                ft.mustPoll(whose, nullptr, nullptr, nullptr, nullptr);
-                ft.activateFilter(whose, nullptr, nullptr, nullptr, nullptr, 0);
-                ft.deActivateFilter(whose, nullptr, nullptr, nullptr, nullptr, 0);
-            }
+            call_with_nothing(ft, mi, nullptr);
             for (const char* query : {"", "SELECT", "%n%s", "SELECT * FROM CIM_NoSuchClass WHERE \"\0"}) {
                 CMPISelectExp* filter = broker->eft->newSelectExp(broker, query, "no:such", nullptr, &status);
                 EXPECT_EQ(ft.authorizeFilter(mi, context, filter, "NoSuch", nowhere, "nobody").rc, CMPI_RC_OK);
