@@ -1,5 +1,7 @@
 // Which ports of the host are registered for events, and how they come to be.
 #include <algorithm>
+#include <string>
+#include <utility>
 #include <vector>
 
 #include "agent/Agent_Wait.h"
@@ -39,7 +41,9 @@ bool isRegistered(const std::string& wwpn)
 
 bool removeCallback(const Registered_Port& port)
 {
-    if (HBA_RemoveCallback(port.handle) == HBA_STATUS_OK) return true;
+    HBA_STATUS status = HBA_STATUS_ERROR; // a library that throws has not taken it back
+    guarded([&] { status = HBA_RemoveCallback(port.handle); });
+    if (status == HBA_STATUS_OK) return true;
     NVR_LOG("Failed to un-register the Indication notification");
     return false;
 }
@@ -60,7 +64,10 @@ uint32 unregisterPorts()
 /// An adapter of the library for a scope; null where it cannot be opened.
 class Open_Adapter {
 public:
-    explicit Open_Adapter(std::string& name) : m_handle(HBA_OpenAdapter(name.data())) {}
+    explicit Open_Adapter(std::string& name)
+    {
+        guarded([&] { m_handle = HBA_OpenAdapter(name.data()); });
+    }
     ~Open_Adapter() noexcept(false)
     {
         if (m_handle != 0) guarded([&] { HBA_CloseAdapter(m_handle); });
@@ -70,29 +77,29 @@ public:
     operator HBA_HANDLE() const { return m_handle; }
 
 private:
-    HBA_HANDLE m_handle;
+    HBA_HANDLE m_handle = 0;
 };
 
 uint32 registerPort(const Adapter& adapter, int index, const Port& port, void* provider)
 {
-    // Memory first: a registration must not be forgotten, nor a place without one be left.
+    // Memory first: a registration must not be forgotten.
     std::string name = adapter.name();
+    Registered_Port registration{nullptr, port.portName()};
     auto& ports = registered_ports();
-    ports.push_back({nullptr, port.portName()});
+    ports.reserve(ports.size() + 1);
     HBA_STATUS status = HBA_STATUS_ERROR;
     {
         const Open_Adapter handle(name);
         HBA_WWN wwpn;
         if (handle == 0) NVR_LOG("Failed to Open Adapter, Skipping registration for Indication notification");
-        if (handle == 0 || !string2HBAName(&wwpn, port.portName().c_str())) {
-            ports.pop_back();
-            return NVR_FAILURE;
-        }
-        status = HBA_RegisterForAdapterPortEvents(&NVRHBA_AlertIndication_Provider::hbaThreadProc, provider, handle,
-                                                  wwpn, &ports.back().handle);
+        if (handle == 0 || !string2HBAName(&wwpn, registration.wwpn.c_str())) return NVR_FAILURE;
+        guarded([&] {
+            status = HBA_RegisterForAdapterPortEvents(&NVRHBA_AlertIndication_Provider::hbaThreadProc, provider, handle,
+                                                      wwpn, &registration.handle);
+        });
+        if (status == HBA_STATUS_OK) ports.push_back(std::move(registration));
     }
     if (status != HBA_STATUS_OK) {
-        ports.pop_back();
         NVR_LOG("Failed to register the Indication notification");
         return NVR_FAILURE;
     }

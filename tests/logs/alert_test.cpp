@@ -13,6 +13,7 @@
 #include "tests/agent/expect_rows.h"
 #include "tests/logs/Alerts_Test.h"
 #include "tests/support/short_memory.h"
+#include "tests/support/simulator.h"
 
 using namespace cimple;
 using namespace nvrtest;
@@ -452,6 +453,38 @@ TEST_F(Alerts, ARegistrationThatFailsAtTheSecondPortLeavesTheFirst)
     EXPECT_EQ(nvrsim_callbacks(), 0u);
 }
 
+TEST_F(Alerts, ARegistrationThatThrowsIsForgottenAndMadeAnew)
+{
+    const struct {
+        const char* call;
+        const char* words;
+    } rows[] = {
+        {"HBA_OpenAdapter", "Failed to Open Adapter, Skipping registration for Indication notification"},
+        {"HBA_RegisterForAdapterPortEvents", "Failed to register the Indication notification"},
+    };
+    std::size_t told = 0;
+    for (const auto& row : rows) {
+        settle();
+        const std::uint64_t removals = calls("HBA_RemoveCallback");
+        fault(std::string("call = '") + row.call + "', times = 1, throws = true");
+        words();
+        EXPECT_EQ(enable(), 140) << row.call;
+        EXPECT_THAT(words(), Contains(row.words));
+        EXPECT_EQ(nvrsim_callbacks(), 0u);
+        EXPECT_EQ(nvrsim_open_handles(), 0u);
+        EXPECT_EQ(disable(), 0) << row.call;
+        EXPECT_EQ(calls("HBA_RemoveCallback"), removals) << "for a port that was never registered";
+
+        EXPECT_EQ(enable(), 0) << row.call;
+        ASSERT_EQ(nvrsim_callbacks(), 2u) << row.call;
+        event("0", link_down);
+        event("1", link_down);
+        client.wait_for(told += 2);
+        EXPECT_EQ(disable(), 0) << row.call;
+        EXPECT_EQ(nvrsim_callbacks(), 0u);
+    }
+}
+
 TEST_F(Alerts, AnAdapterThatCannotBeOpenedEndsTheRegistration)
 {
     fault("call = 'HBA_OpenAdapter', damage = 'null'");
@@ -524,6 +557,40 @@ TEST_F(Alerts, APortThatCannotBeUnregisteredIsKeptAndTriedAgain)
     EXPECT_EQ(disable(), 0);
     EXPECT_EQ(nvrsim_callbacks(), 0u);
     EXPECT_EQ(client.count(), 3u);
+}
+
+TEST_F(Alerts, ARemovalThatThrowsIsOneThatIsRefused)
+{
+    ASSERT_EQ(enable(), 0);
+    fault("call = 'HBA_RemoveCallback', throws = true");
+    words();
+    EXPECT_EQ(disable(), 150);
+    EXPECT_THAT(words(),
+                contains_in_order({"m_callbackHandles.size() is now 2 ",
+                                   "Failed to un-register the Indication notification", me + "cleanUp() finished"}));
+    EXPECT_EQ(client.stops, 1) << "alerts are off";
+    EXPECT_EQ(enable(), 0);
+    EXPECT_EQ(nvrsim_callbacks(), 2u);
+    link("0", false);
+    client.wait_for(1);
+
+    unload_provider();
+    EXPECT_EQ(m_unloaded, 40);
+    EXPECT_EQ(client.stops, 2);
+    EXPECT_EQ(nvrsim_callbacks(), 2u);
+    listenAgain();
+
+    // Each of the two is still known by its own handle.
+    nvrsim_clear_faults();
+    provider.reset(new NVRHBA_AlertIndication_Provider);
+    ASSERT_EQ(provider->load(), 0);
+    refresh();
+    ASSERT_EQ(enable(), 0);
+    EXPECT_EQ(nvrsim_callbacks(), 2u);
+    link("0", true);
+    expect_rows(client.wait_for(2)[1].get(), {{"Message", "PORT LINK UP"}, {"SequenceNumber", "0"}});
+    EXPECT_EQ(disable(), 0);
+    EXPECT_EQ(nvrsim_callbacks(), 0u);
 }
 
 TEST_F(Alerts, WhatRemainsIsTriedOnceMoreAtTheUnload)

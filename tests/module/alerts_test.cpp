@@ -17,6 +17,7 @@
 #include "tests/module/support/Entries.h"
 #include "tests/module/support/Rig.h"
 #include "tests/support/private_host.h"
+#include "tests/support/process_state.h"
 #include "tests/support/simulator.h"
 #include "tests/support/trace.h"
 
@@ -285,6 +286,44 @@ TEST(AlertsOfOneServer, APortThatCannotBeRegisteredIsTold)
     ASSERT_EQ(nvrsim_link(first_port, 0), 0);
     sink.wait_for(1);
     unsubscribe(rig, id);
+}
+
+// It is ended like one that refuses, and the next life has alerts.
+TEST(AlertsOfOneServer, ALibraryThatThrowsWhereAlertsEndIsOutlived)
+{
+    const std::size_t threads = number_of_threads_from_the_start();
+    std::vector<std::vector<std::string>> ends; // words and calls; the worker has some of the words
+    for (const char* failure : {"status = 1", "throws = true"}) {
+        SCOPED_TRACE(failure);
+        Rig rig({host::Manner::strict(), "typical"});
+        {
+            Sink sink;
+            subscribe(rig, sink);
+            ASSERT_EQ(nvrsim_event(first_port, link_down, 0), 1);
+            sink.wait_for(1);
+            rig.settle();
+            rig.forget_words();
+            add_fault("call = \"HBA_RemoveCallback\", " + std::string(failure));
+            rig.restart();
+        }
+        EXPECT_TRUE(wait_for_threads(threads + nvrsim_threads(), std::chrono::seconds(20)));
+        EXPECT_EQ(nvrsim_open_handles(), 0u);
+        EXPECT_EQ(nvrsim_callbacks(), 4u);
+        ends.push_back(rig.words());
+        EXPECT_THAT(ends.back(), Contains("Norvane Provider Unloaded"));
+        for (const std::string& name : called_operations())
+            ends.back().push_back(name + ' ' + std::to_string(calls(name)));
+
+        clear_faults();
+        Sink sink;
+        const int id = subscribe(rig, sink);
+        EXPECT_EQ(nvrsim_callbacks(), 4u);
+        ASSERT_EQ(nvrsim_event(first_port, link_up, 0), 1);
+        EXPECT_EQ(sink.wait_for(1)[0].instance.get("SequenceNumber").as_uint(), 0u);
+        unsubscribe(rig, id);
+        EXPECT_EQ(nvrsim_callbacks(), 0u);
+    }
+    EXPECT_THAT(ends[1], testing::UnorderedElementsAreArray(ends[0]));
 }
 
 TEST(AlertsOfOneServer, WithoutTheLibraryTheyCannotBeEnabled)
