@@ -1,9 +1,8 @@
 #include "logs/Alert_Queue.h"
 
-#include <new>
-
 #include "foundation/CLogger.h"
 #include "runtime/Immortal.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
@@ -38,9 +37,8 @@ bool Alert_Queue::push(const indication_data& record)
     {
         Auto_Mutex queue(m_IndicationQueueMutex);
         if (!m_takes) return false;
-        try {
-            m_IndicationQueue.push_back(record);
-        } catch (const std::bad_alloc&) {
+        const bool is_full = m_IndicationQueue.size() >= most_records;
+        if (is_full || !guarded([&] { m_IndicationQueue.push_back(record); })) {
             NVR_LOG("Failed to allocate memory to queue the event");
             return false;
         }
@@ -51,25 +49,23 @@ bool Alert_Queue::push(const indication_data& record)
     return true;
 }
 
-bool Alert_Queue::isEmpty()
+bool Alert_Queue::take(indication_data& record)
 {
     Auto_Mutex queue(m_IndicationQueueMutex);
-    return m_IndicationQueue.empty();
+    if (m_IndicationQueue.empty()) return false;
+    record = m_IndicationQueue.front();
+    m_IndicationQueue.pop_front();
+    return true;
 }
 
 bool Alert_Queue::pop(indication_data& record)
 {
     NVR_LOG("waiting for signal to occur");
-    {
-        Auto_Mutex signal(m_IndicationSignalMutex);
-        while (isEmpty()) {
-            if (m_bIndicationCleanUp) return false;
-            m_IndicationSignalCond.wait(m_IndicationSignalMutex);
-        }
+    Auto_Mutex signal(m_IndicationSignalMutex);
+    while (!take(record)) {
+        if (m_bIndicationCleanUp) return false;
+        m_IndicationSignalCond.wait(m_IndicationSignalMutex);
     }
-    Auto_Mutex queue(m_IndicationQueueMutex);
-    record = m_IndicationQueue.front();
-    m_IndicationQueue.pop_front();
     return true;
 }
 

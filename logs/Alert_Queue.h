@@ -6,6 +6,7 @@
 #pragma once
 
 #include <atomic>
+#include <cstddef>
 #include <deque>
 
 #include "foundation/management_api.h"
@@ -24,12 +25,15 @@ class Alert_Queue {
 public:
     static Alert_Queue& instance();
 
+    /// So many records wait at most, 16 MiB of them, however long a subscriber takes.
+    static constexpr std::size_t most_records = 1048576;
+
     /// From now on records are taken. The queue is empty and no worker runs.
     void open();
     /// From now on records are dropped, and the worker ends once it has popped what is there.
     void close();
 
-    /// False if the record was dropped, since the queue is closed or (then logged) memory is out.
+    /// False if the record was dropped, since the queue is closed or (then logged) full, or memory is out.
     bool push(const indication_data& record);
     /// Waits for a record and takes it; false: the queue is closed and empty.
     bool pop(indication_data& record);
@@ -41,7 +45,8 @@ private:
     template <class>
     friend class Immortal;
     Alert_Queue() = default;
-    bool isEmpty();
+    /// Takes the oldest record; false: there is none.
+    bool take(indication_data& record);
 
     Mutex m_IndicationQueueMutex{false, "m_IndicationQueueMutex", Lock_Place::innermost};
     std::deque<indication_data> m_IndicationQueue;

@@ -117,6 +117,26 @@ TEST_F(AlertQueue, ARecordWithoutMemoryIsDroppedAndTold)
     EXPECT_EQ(pop_all().back(), 7u);
 }
 
+TEST_F(AlertQueue, ARecordBeyondTheMostIsDroppedAndTold)
+{
+    queue.open();
+    CLogger::instance()->disable(); // a million lines are nobody's business
+    uint32 taken = 0;
+    while (taken < Alert_Queue::most_records && queue.push(numbered(taken)))
+        taken++;
+    EXPECT_EQ(taken, 1048576u);
+    CLogger::instance()->enable();
+    Log_Capture log;
+    EXPECT_FALSE(queue.push(numbered(taken)));
+    EXPECT_THAT(log.words(), ElementsAre("Failed to allocate memory to queue the event"));
+    indication_data record;
+    ASSERT_TRUE(queue.pop(record));
+    EXPECT_EQ(record.fabricPortID, 0u) << "the oldest stay";
+    EXPECT_TRUE(queue.push(numbered(taken)));
+    EXPECT_FALSE(queue.push(numbered(taken)));
+    queue.open(); // which empties it
+}
+
 TEST_F(AlertQueue, APopWaitsForARecordAndForTheEnd)
 {
     queue.open();
