@@ -1,9 +1,11 @@
 #include "tests/soak/Load.h"
 
+#include <algorithm>
 #include <filesystem>
 
 #include "simulator/nvrsim.h"
 #include "tests/module/support/Firmware.h"
+#include "tests/module/support/Service_Methods.h"
 #include "tests/support/private_host.h"
 
 namespace soak {
@@ -18,6 +20,18 @@ constexpr char alert_class[] = "NVRHBA_AlertIndication";
 constexpr char settings_class[] = "NVRHBA_ProviderConfigSetting";
 constexpr char image_file[] = "an.image", table_file[] = "a.table";
 constexpr std::size_t most_subscriptions = 8;
+
+struct Setting {
+    const char* name;
+    std::uint32_t value; ///< the default
+    std::uint32_t most;
+    bool is_of_adapters; ///< whether a refresh reads them
+};
+constexpr Setting settings[] = {
+    {"cachetimeout", 10, 30, false},
+    {"adapterrefresh", 0, 1, true},
+    {"sanrefresh", 1, 1, false},
+};
 
 constexpr char table[] = "<ApexConfig><theSystem><ApexVersion/><CreationDate/><HostName/><Adapter/></theSystem>"
                          "<Configuration><numberOfEntries>1</numberOfEntries><Row><src_wwpn>10000000C9A00001</src_wwpn>"
@@ -50,11 +64,20 @@ host::Instance setting(const std::string& name, std::uint32_t value)
     return instance;
 }
 
+bool is_change(const std::string& method)
+{
+    if (method == "RunDiagnosticService") return true;
+    static const std::vector<nvrtest::Service_Method> all = nvrtest::service_methods();
+    return std::any_of(all.begin(), all.end(),
+                       [&](const nvrtest::Service_Method& one) { return one.refreshes && one.name == method; });
+}
+
 const host::Property_List current_alone = std::vector<std::string>{"current"};
 
 } // namespace
 
-Load::Load(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts) : m_rig(rig), m_watch(watch), m_counts(counts)
+Load::Load(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, const Season& season)
+    : m_rig(rig), m_watch(watch), m_counts(counts), m_season(season)
 {
     std::filesystem::create_directories(folder);
     std::filesystem::current_path(folder);
@@ -66,7 +89,7 @@ Load::Load(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts) : m_rig(rig
         if (!(one.kinds & host::method_kind)) continue;
         for (const host::Method_Record& method : nvrtest::module_schema()->find(one.name)->methods) {
             const int status = rig.server().call(path_in(one.name), method.name).status.code;
-            if (status == CMPI_RC_OK) m_methods.push_back({one.name, &method});
+            if (status == CMPI_RC_OK) m_methods.push_back({one.name, &method, is_change(method.name)});
         }
     }
     restore_settings();
@@ -150,16 +173,31 @@ void Load::traverse(Random& random)
 
 void Load::modify(Random& random)
 {
+    const Setting& one = random.pick(settings);
     // Some are out of range.
-    const char* const names[] = {"cachetimeout", "adapterrefresh", "sanrefresh"};
-    const std::string name = random.pick(names);
-    const host::Instance changed = setting(name, static_cast<std::uint32_t>(random.below(name[0] == 'c' ? 33 : 3)));
-    ask("modify " + name, [&](host::Host& server) { return server.modify(changed, current_alone); });
+    const auto value = static_cast<std::uint32_t>(random.below(one.most + 2));
+    if (m_season.has_unloads) {
+        set(one.name, value);
+        return;
+    }
+    if (one.is_of_adapters) return; // the season's
+    set(one.name, value);
+    read(random);
+    set(one.name, one.value);
+}
+
+bool Load::set(const char* name, std::uint32_t value)
+{
+    const host::Instance changed = setting(name, value);
+    const auto answer =
+        ask(std::string("modify ") + name, [&](host::Host& server) { return server.modify(changed, current_alone); });
+    return answer.ok();
 }
 
 void Load::call(Random& random)
 {
     const Method& method = random.pick(m_methods);
+    if (method.is_change && !m_season.has_changes) return read(random);
     const Path target = path_of(method.class_name, random);
     Arguments arguments;
     for (const host::Element_Record& parameter : method.record->parameters)
@@ -291,11 +329,19 @@ void Load::reach_too_far(Random& random)
 bool Load::restore_settings()
 {
     bool all = true;
-    for (const auto& [name, value] : {std::pair("cachetimeout", 10u), {"adapterrefresh", 1u}, {"sanrefresh", 1u}})
-        all &= ask("restore a setting", [&, changed = setting(name, value)](host::Host& server) {
-                   return server.modify(changed, current_alone);
-               }).ok();
+    for (const Setting& one : settings)
+        all &= set(one.name, one.is_of_adapters ? m_season.reads_adapters : one.value);
     return all;
+}
+
+bool Load::have_adapters_read()
+{
+    const auto services = m_rig.names("NVRHBA_FCHBAWWNService"), ports = m_rig.names("NVRHBA_FCPort");
+    if (services.paths.empty() || ports.paths.empty()) return false;
+    const Arguments arguments = {{"Target", Value::reference(ports.paths[0])}, {"Type", Value::uint16(0)}};
+    const auto restored = ask(
+        "call RestoreWWN", [&](host::Host& server) { return server.call(services.paths[0], "RestoreWWN", arguments); });
+    return restored.ok() && !restored.value.is_null() && restored.value.as_uint() == 0;
 }
 
 void Load::restore_files()

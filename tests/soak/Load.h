@@ -12,6 +12,7 @@
 #include "tests/module/support/Rig.h"
 #include "tests/soak/Counts.h"
 #include "tests/soak/Random.h"
+#include "tests/soak/Season.h"
 #include "tests/support/Watch.h"
 
 namespace soak {
@@ -21,8 +22,9 @@ public:
     /// Where clients put the files that they name; the program stands in it.
     static constexpr char folder[] = "/var/log/soak";
 
-    /// Asks each method once, without arguments, whether it is served.
-    Load(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts);
+    /// Asks each method once, without arguments, whether it is served. Who changes the season sees to it that no
+    /// thread acts meanwhile.
+    Load(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, const Season& season);
 
     /// One act of a client: one request, or as many as it takes to come by the path of another.
     void act(Random& random);
@@ -30,9 +32,11 @@ public:
     void unsubscribe_all();
     /// Subscribes, has an event come, and unsubscribes.
     void meet_alert();
-    /// Brings all settings back to their defaults, but that each refresh reads the adapters. False where one is not
-    /// published.
+    /// Brings all settings back to their defaults, but that each refresh reads the adapters if the season's does.
+    /// False where one is not published.
     bool restore_settings();
+    /// Calls a service that has the adapters read anew, whatever the settings say; true if it did.
+    bool have_adapters_read();
     /// Writes the files that clients name, and removes all others.
     void restore_files();
     /// The paths of all instances, in order.
@@ -46,6 +50,7 @@ private:
     struct Method {
         std::string class_name;
         const host::Method_Record* record;
+        bool is_change; ///< has the adapters read anew, or leaves what stays until then
     };
     using Arguments = std::vector<host::Named_Value>;
 
@@ -58,6 +63,7 @@ private:
     void traverse(Random& random);
     void modify(Random& random);
     void call(Random& random);
+    bool set(const char* name, std::uint32_t value);
     void subscribe(Random& random);
     void unsubscribe();
     void reach_too_far(Random& random);
@@ -70,6 +76,7 @@ private:
     nvrtest::Rig& m_rig;
     nvrtest::Watch& m_watch;
     Counts& m_counts;
+    const Season& m_season;
     std::vector<Class> m_classes, m_associations;
     std::vector<Method> m_methods;
     std::mutex m_mutex;

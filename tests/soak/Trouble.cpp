@@ -32,8 +32,9 @@ std::vector<const char*> all_faults()
 
 } // namespace
 
-Trouble::Trouble(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, std::vector<std::string> calls)
-    : m_rig(rig), m_watch(watch), m_counts(counts), m_calls(std::move(calls))
+Trouble::Trouble(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, const Season& season,
+                 std::vector<std::string> calls)
+    : m_rig(rig), m_watch(watch), m_counts(counts), m_season(season), m_calls(std::move(calls))
 {
 }
 
@@ -51,16 +52,16 @@ void Trouble::act(Random& random)
         break;
     case 3:
     case 4:
-        add_fault(random);
+        if (m_season.has_faults) add_fault(random);
         break;
     case 5:
         clear_faults();
         break;
     case 6:
-        nvrsim_set(port.c_str(), "present", random.chance(80));
+        if (m_season.has_faults) nvrsim_set(port.c_str(), "present", random.chance(80));
         break;
     case 7:
-        unload(random.chance(20));
+        if (m_season.has_unloads) unload(random.chance(20));
         break;
     default:
         nvrtest::advance_clock(std::chrono::minutes(31));

@@ -10,14 +10,16 @@
 #include "tests/module/support/Rig.h"
 #include "tests/soak/Counts.h"
 #include "tests/soak/Random.h"
+#include "tests/soak/Season.h"
 #include "tests/support/Watch.h"
 
 namespace soak {
 
 class Trouble {
 public:
-    /// `calls`: the operations of the libraries that may fail.
-    Trouble(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, std::vector<std::string> calls);
+    /// `calls`: the operations of the libraries that may fail. Nobody acts while the season changes.
+    Trouble(nvrtest::Rig& rig, nvrtest::Watch& watch, Counts& counts, const Season& season,
+            std::vector<std::string> calls);
 
     /// One thing that happens.
     void act(Random& random);
@@ -33,6 +35,7 @@ private:
     nvrtest::Rig& m_rig;
     nvrtest::Watch& m_watch;
     Counts& m_counts;
+    const Season& m_season;
     const std::vector<std::string> m_calls;
     bool m_is_spoiled = false;
 };

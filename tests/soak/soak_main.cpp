@@ -4,6 +4,7 @@
 //     nvr_soak --seconds 20
 //     nvr_soak --minutes 5 --manner pegasus
 //     nvr_soak --hours 72
+//     nvr_soak --minutes 10 --one-life
 //
 // The exit code is 0 if resident memory stayed level, threads and descriptors came back, every request was answered in
 // time and the instances are in the end those of the start; else 1. Runs as root, or as a user who may make user
@@ -16,13 +17,10 @@
 #include <cstdlib>
 #include <cstring>
 #include <exception>
-#include <fcntl.h>
 #include <filesystem>
 #include <iostream>
 #include <memory>
 #include <mutex>
-#include <new>
-#include <stdexcept>
 #include <string>
 #include <thread>
 #include <unistd.h>
@@ -34,7 +32,10 @@
 #include "tests/module/support/Test_Clock.h"
 #include "tests/soak/Crossing.h"
 #include "tests/soak/Load.h"
+#include "tests/soak/Options.h"
 #include "tests/soak/Process.h"
+#include "tests/soak/Report.h"
+#include "tests/soak/Season.h"
 #include "tests/soak/Trend.h"
 #include "tests/soak/Trouble.h"
 #include "tests/support/private_host.h"
@@ -47,90 +48,12 @@ namespace {
 using namespace soak;
 using Clock = std::chrono::steady_clock;
 
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr bool is_sanitized = true;
-#else
-constexpr bool is_sanitized = false;
-#endif
 /// Between two looks the resident memory may move by as much without a leak, kB over the second half of the run.
 constexpr double tolerance = 512;
+/// Once in each reading of the adapters, and nowhere else; and in each of the SAN's, some for a port.
+constexpr char reading_call[] = "HBA_GetNumberOfAdapters";
+constexpr char san_call[] = "HBA_GetFcpTargetMapping";
 constexpr std::uintmax_t largest_trace = 16 * 1024 * 1024;
-
-struct Options {
-    std::chrono::seconds length{300};
-    std::uint64_t requests = 0; ///< ends the run in the place of the length, if not 0
-    std::size_t clients = 6;
-    std::uint64_t seed = 1;
-    const host::Manner* manner = &host::Manner::strict();
-    /// No request may take longer; ten times as long where a sanitizer slows all down.
-    std::chrono::seconds patience{is_sanitized ? 100 : 10};
-    std::size_t leak = 0; ///< bytes that each request is made to lose
-};
-
-constexpr char usage[] =
-    "nvr_soak [--seconds N | --minutes N | --hours N | --requests N] [--clients N] [--manner NAME] [--seed N]\n"
-    "         [--patience N]    seconds that a request may take; more where others keep the processors busy\n"
-    "         [--leak BYTES]    each request loses so many bytes: the run has to end with 1\n";
-
-std::uint64_t number(const std::string& text)
-{
-    std::size_t read = 0;
-    const std::uint64_t value = std::stoull(text, &read);
-    if (read != text.size() || value == 0 || text[0] == '-') throw std::invalid_argument("no number: " + text);
-    return value;
-}
-
-Options parsed(int argc, char** argv)
-{
-    Options options;
-    for (int i = 1; i < argc; i += 2) {
-        const std::string name = argv[i];
-        if (i + 1 == argc) throw std::invalid_argument(usage);
-        const std::string value = argv[i + 1];
-        if (name == "--seconds")
-            options.length = std::chrono::seconds(number(value));
-        else if (name == "--minutes")
-            options.length = std::chrono::minutes(number(value));
-        else if (name == "--hours")
-            options.length = std::chrono::hours(number(value));
-        else if (name == "--requests")
-            options.requests = number(value);
-        else if (name == "--clients")
-            options.clients = number(value);
-        else if (name == "--seed")
-            options.seed = number(value);
-        else if (name == "--patience")
-            options.patience = std::chrono::seconds(number(value));
-        else if (name == "--leak")
-            options.leak = number(value);
-        else if (name == "--manner")
-            options.manner = host::Manner::find(value);
-        else
-            throw std::invalid_argument(usage);
-        if (!options.manner) throw std::invalid_argument("no such manner: " + value);
-    }
-    return options;
-}
-
-/// Where the report goes; what the module writes to standard output goes nowhere.
-std::FILE* report_stream()
-{
-    static std::FILE* const stream = [] {
-        std::FILE* const kept = fdopen(dup(STDOUT_FILENO), "w");
-        const int nowhere = open("/dev/null", O_WRONLY | O_CLOEXEC);
-        if (!kept || nowhere < 0 || dup2(nowhere, STDOUT_FILENO) < 0) throw std::runtime_error("no output");
-        close(nowhere);
-        setvbuf(kept, nullptr, _IOLBF, 0);
-        return kept;
-    }();
-    return stream;
-}
-
-template <class... Values>
-void say(const char* format, Values... values)
-{
-    std::fprintf(report_stream(), format, values...);
-}
 
 void bound_trace()
 {
@@ -149,12 +72,21 @@ void fill_server_log(host::Host& server)
     });
 }
 
+/// Ten, or one a minute; for each half of one life.
+std::size_t number_of_looks(const Options& options)
+{
+    const std::size_t least = options.has_one_life ? 20 : 10;
+    if (options.requests != 0) return least;
+    return std::max<std::size_t>(least, std::chrono::duration_cast<std::chrono::minutes>(options.length).count());
+}
+
 /// One run.
 class Soak {
 public:
     explicit Soak(const Options& options)
-        : m_options(options), m_watch(options.patience, &Soak::tell_hang), m_rig({*options.manner}),
-          m_load(m_rig, m_watch, m_counts), m_trouble(m_rig, m_watch, m_counts, warm_up())
+        : m_options(options), m_ticks(number_of_looks(options)), m_watch(options.patience, &Soak::tell_hang),
+          m_rig({*options.manner}), m_load(m_rig, m_watch, m_counts, m_season),
+          m_trouble(m_rig, m_watch, m_counts, m_season, warm_up())
     {
         m_rig.restart();
         fill_server_log(m_rig.server());
@@ -170,6 +102,13 @@ private:
         double minutes;
         Process process;
     };
+    /// Of the adapters, in one life.
+    struct Readings {
+        std::uint64_t before = 0; ///< the calls before the season
+        std::uint64_t among_changes = 0, undisturbed = 0;
+        std::uint64_t san_calls_before = 0, san_calls = 0; ///< undisturbed
+        std::size_t missed = 0;                            ///< that a service was to start after changes
+    };
 
     [[noreturn]] static void tell_hang(const std::string& what)
     {
@@ -180,16 +119,26 @@ private:
     void serve_client(std::uint64_t seed);
     void make_trouble(std::uint64_t seed);
     /// Waits until a tenth, or a minute, has passed.
-    void wait_for_tick(std::size_t tick, std::size_t ticks);
+    void wait_for_tick(std::size_t tick);
+    const Season& season_after(std::size_t looks) const;
+    /// While no other thread acts.
+    void begin(const Season& season);
     void look();
+    /// The settings are the defaults, and a service has the adapters read anew.
+    void end_changes();
     void wait_for_refresh();
     std::string rested_names();
     void begin_new_life();
+    void lose(); ///< what --leak says
     bool judge();
+    /// By the looks from `first` to before `last`, the later ones of their kind.
+    bool judge_memory(const char* which, std::size_t first, std::size_t last);
 
     double minutes() const { return std::chrono::duration<double, std::ratio<60>>(Clock::now() - m_start).count(); }
 
     const Options m_options;
+    const std::size_t m_ticks; ///< looks at the process
+    Season m_season = all_at_once;
     Counts m_counts;
     nvrtest::Watch m_watch;
     nvrtest::Rig m_rig;
@@ -204,6 +153,9 @@ private:
     std::atomic<std::uint64_t> m_next_tick{0}; ///< in requests
     std::atomic<bool> m_ends{false};
     std::vector<Look> m_looks;
+    Readings m_readings;
+    std::mutex m_lost_mutex;
+    std::vector<std::unique_ptr<char[]>> m_lost; ///< in one life, until adapters are read anew
     std::size_t m_different = 0;
     std::uint64_t m_violations = 0, m_left = 0;
     std::string m_told_left;       ///< the first report with one of them
@@ -224,12 +176,21 @@ void Soak::serve_client(std::uint64_t seed)
         const Crossing::Pass pass(m_crossing);
         const std::uint64_t before = m_counts.requests;
         m_load.act(random);
-        if (m_options.leak != 0) std::memset(::operator new(m_options.leak), 1, m_options.leak);
+        if (m_options.leak != 0) lose();
         if (before < m_next_tick && m_counts.requests >= m_next_tick) {
             const std::lock_guard<std::mutex> lock(m_mutex);
             m_changed.notify_all();
         }
     }
+}
+
+void Soak::lose()
+{
+    auto bytes = std::make_unique<char[]>(m_options.leak);
+    std::memset(bytes.get(), 1, m_options.leak);
+    if (!m_options.has_one_life) return static_cast<void>(bytes.release());
+    const std::lock_guard<std::mutex> lock(m_lost_mutex);
+    m_lost.push_back(std::move(bytes));
 }
 
 void Soak::make_trouble(std::uint64_t seed)
@@ -246,14 +207,14 @@ void Soak::make_trouble(std::uint64_t seed)
     }
 }
 
-void Soak::wait_for_tick(std::size_t tick, std::size_t ticks)
+void Soak::wait_for_tick(std::size_t tick)
 {
     std::unique_lock<std::mutex> lock(m_mutex);
     if (m_options.requests != 0) {
-        m_next_tick = m_options.requests * tick / ticks;
+        m_next_tick = m_options.requests * tick / m_ticks;
         m_changed.wait(lock, [this] { return m_counts.requests >= m_next_tick; });
     } else {
-        m_changed.wait_until(lock, m_start + m_options.length * tick / ticks, [] { return false; });
+        m_changed.wait_until(lock, m_start + m_options.length * tick / m_ticks, [] { return false; });
     }
 }
 
@@ -277,7 +238,36 @@ std::string Soak::rested_names()
     nvrtest::advance_clock(std::chrono::minutes(31));
     m_load.all_names(); // starts the refresh
     wait_for_refresh();
+    if (m_season.has_changes && !m_season.has_unloads) end_changes();
     return m_load.all_names();
+}
+
+void Soak::end_changes()
+{
+    m_season.reads_adapters = false;
+    const std::uint64_t before = nvrtest::calls(reading_call);
+    const bool is_read = m_load.restore_settings() && m_load.have_adapters_read();
+    wait_for_refresh();
+    m_readings.missed += !is_read || nvrtest::calls(reading_call) == before;
+    m_lost.clear();
+    m_lost.shrink_to_fit();
+}
+
+const Season& Soak::season_after(std::size_t looks) const
+{
+    if (!m_options.has_one_life) return all_at_once;
+    if (looks >= m_ticks / 2) return undisturbed;
+    return looks % 2 == 0 ? failing_changes : changes;
+}
+
+void Soak::begin(const Season& season)
+{
+    m_season = season;
+    if (season.has_unloads) return;
+    m_load.restore_settings();
+    wait_for_refresh();
+    m_readings.before = nvrtest::calls(reading_call);
+    m_readings.san_calls_before = nvrtest::calls(san_call);
 }
 
 void Soak::begin_new_life()
@@ -299,9 +289,12 @@ void Soak::look()
 {
     const Crossing::Hold hold(m_crossing);
     const std::uint64_t requests = m_counts.requests, errors = m_counts.errors; // of clients
+    const std::uint64_t readings = nvrtest::calls(reading_call) - m_readings.before;
+    (m_season.has_changes ? m_readings.among_changes : m_readings.undisturbed) += readings;
+    if (!m_season.has_changes) m_readings.san_calls += nvrtest::calls(san_call) - m_readings.san_calls_before;
     const bool is_spoiled = m_trouble.end();
     // A refresh that failed may have left no settings, and where adapters are not to be read, none brings them back.
-    if (!m_load.restore_settings() || is_spoiled) begin_new_life();
+    if (m_season.has_unloads && (!m_load.restore_settings() || is_spoiled)) begin_new_life();
     if (const std::string names = rested_names(); names != m_names) {
         m_different++;
         if (m_told_difference.empty()) m_told_difference = nvrtest::difference(m_names, names);
@@ -312,27 +305,27 @@ void Soak::look()
     m_counts.errors = errors;
     say("%7.1f min  requests %9llu  errors %8llu  faults %8llu  alerts %7llu  lives %5llu  resident %7zu kB  heap %7zu "
         "kB  "
-        "threads %3zu  descriptors %3zu\n",
+        "threads %3zu  descriptors %3zu%s%s\n",
         minutes(), static_cast<unsigned long long>(m_counts.requests), static_cast<unsigned long long>(m_counts.errors),
         static_cast<unsigned long long>(m_counts.faults), static_cast<unsigned long long>(m_counts.alerts),
         static_cast<unsigned long long>(m_counts.unloads + 1), process.resident, process.heap, process.threads,
-        process.descriptors);
-    if (m_looks.size() % 3 == 0) begin_new_life();
+        process.descriptors, *m_season.name ? "  " : "", m_season.name);
+    if (!m_options.has_one_life && m_looks.size() % 3 == 0) begin_new_life();
+    begin(season_after(m_looks.size()));
 }
 
 bool Soak::run()
 {
-    const std::size_t ticks =
-        m_options.requests != 0
-            ? 10
-            : std::max<std::size_t>(10, std::chrono::duration_cast<std::chrono::minutes>(m_options.length).count());
+    // Loaded without faults: what is missing then is missing for the whole life.
+    if (m_options.has_one_life) m_load.all_names();
+    begin(season_after(0));
     m_start = Clock::now();
     std::vector<std::thread> threads;
     for (std::size_t i = 0; i < m_options.clients; i++)
         threads.emplace_back([this, i] { serve_client(m_options.seed * 1000 + i + 1); });
     threads.emplace_back([this] { make_trouble(m_options.seed * 1000); });
-    for (std::size_t tick = 1; tick <= ticks; tick++) {
-        wait_for_tick(tick, ticks);
+    for (std::size_t tick = 1; tick <= m_ticks; tick++) {
+        wait_for_tick(tick);
         look();
     }
     {
@@ -348,35 +341,50 @@ bool Soak::run()
     return judge();
 }
 
-bool Soak::judge()
+bool Soak::judge_memory(const char* which, std::size_t first, std::size_t last)
 {
-    bool all_well = true;
-    const auto hold_against = [&](bool is_well, const char* format, auto... values) {
-        all_well &= is_well;
-        say("%s", is_well ? "well: " : "NOT WELL: ");
-        say(format, values...);
-    };
     std::vector<std::pair<double, double>> resident;
-    for (std::size_t i = m_looks.size() / 2; i < m_looks.size(); i++)
+    for (std::size_t i = first; i < last; i++)
         resident.emplace_back(m_looks[i].minutes, static_cast<double>(m_looks[i].process.resident));
     const Trend trend = Trend::through(resident);
     if (is_sanitized) say("%s", "not judged under a sanitizer: ");
-    hold_against(
+    return hold_against(
         is_sanitized || trend.is_level(tolerance),
-        "resident memory moves by %.1f kB a minute (standard error %.1f), %.0f kB over the last %zu lines; level "
+        "%sresident memory moves by %.1f kB a minute (standard error %.1f), %.0f kB over the last %zu lines; level "
         "below two standard errors, or %.0f kB\n",
-        trend.slope, trend.error, trend.change, resident.size(), tolerance);
+        which, trend.slope, trend.error, trend.change, resident.size(), tolerance);
+}
+
+bool Soak::judge()
+{
+    bool all_well = true;
+    if (m_options.has_one_life) {
+        all_well &= judge_memory("among changes, ", m_ticks / 4, m_ticks / 2);
+        all_well &= judge_memory("undisturbed, ", m_ticks / 2 + m_ticks / 4, m_ticks);
+        all_well &= hold_against(
+            m_readings.among_changes != 0 && m_readings.missed == 0 && m_readings.undisturbed == 0,
+            "adapters read %llu times among changes, not where a service asked at %zu looks, and %llu times "
+            "undisturbed, with %llu calls for targets\n",
+            static_cast<unsigned long long>(m_readings.among_changes), m_readings.missed,
+            static_cast<unsigned long long>(m_readings.undisturbed),
+            static_cast<unsigned long long>(m_readings.san_calls));
+        all_well &=
+            hold_against(m_counts.unloads == 1, "%llu unloads\n", static_cast<unsigned long long>(m_counts.unloads));
+    } else {
+        all_well &= judge_memory("", m_ticks / 2, m_ticks);
+    }
     nvrtest::wait_for_threads(m_before.threads, std::chrono::seconds(20));
     const Process after = Process::now();
-    hold_against(after.threads <= m_before.threads, "%zu threads before, %zu after\n", m_before.threads, after.threads);
-    hold_against(after.descriptors <= m_before.descriptors, "%zu descriptors before, %zu after\n", m_before.descriptors,
-                 after.descriptors);
-    hold_against(m_different == 0, "other instances than at the start in %zu of %zu looks\n%s", m_different,
-                 m_looks.size(), m_told_difference.c_str());
-    hold_against(nvrsim_open_handles() == 0, "%zu handles of adapters open\n", nvrsim_open_handles());
-    hold_against(m_violations == 0 && m_left == 0, "%llu rules of the server broken, %llu of its objects kept\n%s",
-                 static_cast<unsigned long long>(m_violations), static_cast<unsigned long long>(m_left),
-                 m_told_left.c_str());
+    all_well &= hold_against(after.threads <= m_before.threads, "%zu threads before, %zu after\n", m_before.threads,
+                             after.threads);
+    all_well &= hold_against(after.descriptors <= m_before.descriptors, "%zu descriptors before, %zu after\n",
+                             m_before.descriptors, after.descriptors);
+    all_well &= hold_against(m_different == 0, "other instances than at the start in %zu of %zu looks\n%s", m_different,
+                             m_looks.size(), m_told_difference.c_str());
+    all_well &= hold_against(nvrsim_open_handles() == 0, "%zu handles of adapters open\n", nvrsim_open_handles());
+    all_well &= hold_against(
+        m_violations == 0 && m_left == 0, "%llu rules of the server broken, %llu of its objects kept\n%s",
+        static_cast<unsigned long long>(m_violations), static_cast<unsigned long long>(m_left), m_told_left.c_str());
     say("well: each of %llu requests was answered in time\n", static_cast<unsigned long long>(m_counts.requests));
     return all_well;
 }
@@ -386,7 +394,8 @@ bool Soak::judge()
 int main(int argc, char** argv)
 {
     try {
-        const Options options = parsed(argc, argv);
+        const Options options = Options::parsed(argc, argv);
+        if (options.asks_for_help) return std::fputs(Options::usage(), stdout) < 0;
         // By its default settings the allocator keeps free blocks aside for each thread, more and more for a while.
         setenv("GLIBC_TUNABLES", "glibc.malloc.tcache_count=0:glibc.malloc.arena_max=1", 0);
         nvrtest::enter_private_host(argv);
