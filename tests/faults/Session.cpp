@@ -24,6 +24,8 @@ using host::Value;
 
 constexpr char name_space[] = "root/norvane";
 constexpr char alert_class[] = "NVRHBA_AlertIndication";
+constexpr char provider_log[] = "NVRHBA:ProviderLog:";
+constexpr std::uint16_t enabled = 2, disabled = 3;
 constexpr char system_log[] = "/var/log/messages";
 
 // Small, and with all that the module reads: a tagged port with dumps and a virtual port, one with a loopback plug.
@@ -52,7 +54,6 @@ Rig_Options rig_options()
     Rig_Options options;
     options.manner = host::Manner::strict();
     options.scenario = scenario;
-    options.settings = refreshing_settings;
     return options;
 }
 
@@ -91,6 +92,11 @@ host::Instance change(host::Path path, const std::string& property, const Value&
     instance.path = std::move(path);
     instance.set(property, value);
     return instance;
+}
+
+host::Path path_of_log(const char* name)
+{
+    return path_with_id("NVRHBA_RecordLog", std::string(name) + rig_host_name);
 }
 
 // Of the one instance that such a service has.
@@ -189,12 +195,13 @@ host::Answer Session::ask(const std::string& what, const std::function<host::Ans
     return answer;
 }
 
-void Session::call(const host::Path& path, const std::string& method, const std::vector<host::Named_Value>& arguments)
+bool Session::call(const host::Path& path, const std::string& method, const std::vector<host::Named_Value>& arguments)
 {
     const std::string what = path.class_name + '.' + method;
     const host::Answer answer = ask(what, [&](host::Host& server) { return server.call(path, method, arguments); });
-    if (answer.ok() && answer.value != Value::uint32(0))
-        m_failures.push_back(what + " returned " + answer.value.to_text());
+    const bool is_done = answer.value == Value::uint32(0);
+    if (answer.ok() && !is_done) m_failures.push_back(what + " returned " + answer.value.to_text());
+    return answer.ok() && is_done;
 }
 
 // The first request comes while nothing has been read, the next one while its refresh reads the SAN.
@@ -259,19 +266,27 @@ void Session::call_service(const Service_Method& method)
 
 void Session::modify_instances()
 {
-    const auto modify = [&](const host::Path& path, const std::string& property, const Value& value) {
-        ask("modify " + path.class_name, [&](host::Host& server) {
-            return server.modify(change(path, property, value), std::vector<std::string>{property});
-        });
-    };
     const host::Path port = path_in_system("NVRHBA_FCPort", "DeviceID", first_port);
     modify(port, "LocationIndicator", Value::uint16(2));
     modify(port, "LocationIndicator", Value::uint16(3));
     modify(path_with_id("NVRHBA_DumpData", std::string("NVRHBA_DumpData::") + first_port), "RetentionCount",
            Value::uint32(7));
-    const host::Path time_out = path_with_id("NVRHBA_ProviderConfigSetting", "Norvane HBA Provider:cachetimeout");
-    modify(time_out, "current", Value::uint32(7));
-    modify(time_out, "current", Value::uint32(10));
+    set_time_out(7);
+    set_time_out(time_out);
+}
+
+bool Session::modify(const host::Path& path, const std::string& property, const Value& value)
+{
+    const auto request = [&](host::Host& server) {
+        return server.modify(change(path, property, value), std::vector<std::string>{property});
+    };
+    return ask("modify " + path.class_name, request).ok();
+}
+
+void Session::set_time_out(unsigned minutes)
+{
+    const host::Path setting = path_with_id("NVRHBA_ProviderConfigSetting", "Norvane HBA Provider:cachetimeout");
+    m_settings.note_time_out(minutes, modify(setting, "current", Value::uint32(minutes)));
 }
 
 void Session::run_diagnostic(const std::string& name)
@@ -305,20 +320,22 @@ void Session::run_diagnostics()
 
 void Session::steer_logs()
 {
-    const std::string host_name = rig_host_name;
-    const host::Path driver_log = path_with_id("NVRHBA_RecordLog", "NVR: FC Driver Record Log:" + host_name);
-    const host::Path provider_log = path_with_id("NVRHBA_RecordLog", "NVRHBA:ProviderLog:" + host_name);
-    const auto state = [](std::uint16_t value) {
-        return std::vector<host::Named_Value>{{"RequestedState", Value::uint16(value)}};
-    };
-    call(driver_log, "RequestStateChange", state(2));
+    const host::Path driver_log = path_of_log("NVR: FC Driver Record Log:");
+    call(driver_log, "RequestStateChange", {{"RequestedState", Value::uint16(enabled)}});
     ask("the driver's lines",
         [](host::Host& server) { return server.enumerate(name_space, "NVRHBA_FCDriverLogEntry"); });
     call(driver_log, "ClearLog", {});
-    call(provider_log, "SetLogParams",
+    call(path_of_log(provider_log), "SetLogParams",
          {{"LogLevel", Value::uint16(5)}, {"LogMode", Value::uint16(2)}, {"TracePath", Value::string(trace_path)}});
-    call(provider_log, "RequestStateChange", state(3));
-    call(provider_log, "RequestStateChange", state(2));
+    set_log_state(false);
+    set_log_state(true);
+}
+
+void Session::set_log_state(bool is_enabled)
+{
+    const auto state = Value::uint16(is_enabled ? enabled : disabled);
+    const bool is_told = call(path_of_log(provider_log), "RequestStateChange", {{"RequestedState", state}});
+    m_settings.note_log_state(is_enabled, is_told);
 }
 
 void Session::receive_alerts()

@@ -16,6 +16,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/faults/Settings_Files.h"
 #include "tests/module/support/Rig.h"
 
 namespace nvrtest {
@@ -30,6 +31,8 @@ public:
     };
     /// In order; the first loads the module, the last one unloads it.
     static const std::vector<Part>& parts();
+    /// Minutes, as the settings file has it at first and the script leaves it; not what the module has without a file.
+    static constexpr unsigned time_out = 20;
     /// The words for a part, to find one by.
     static const Part& part(const std::string& name);
 
@@ -51,6 +54,8 @@ public:
 
     /// Requests that did not succeed so far, with their statuses; none on a sound host.
     const std::vector<std::string>& failures() const { return m_failures; }
+    /// What the settings files are to hold after an unload, by what was answered so far.
+    const Settings_Files& settings() const { return m_settings; }
     Rig& rig() { return m_rig; }
 
 private:
@@ -61,6 +66,8 @@ private:
     void call_services();
     void call_service(const Service_Method& method);
     void modify_instances();
+    void set_time_out(unsigned minutes);
+    void set_log_state(bool is_enabled);
     void run_diagnostics();
     void run_diagnostic(const std::string& name);
     void steer_logs();
@@ -69,11 +76,13 @@ private:
     void unload();
 
     host::Answer ask(const std::string& what, const std::function<host::Answer(host::Host&)>& request);
-    /// The same for a method that returns 0 when it is done.
-    void call(const host::Path& path, const std::string& method, const std::vector<host::Named_Value>& arguments);
+    bool modify(const host::Path& path, const std::string& property, const host::Value& value);
+    /// The same for a method that returns 0 when it is done: whether it has.
+    bool call(const host::Path& path, const std::string& method, const std::vector<host::Named_Value>& arguments);
 
     const std::function<void(const std::string&)> m_before_request;
     Rig m_rig;
+    Settings_Files m_settings{time_out};
     std::vector<std::string> m_failures;
 };
 

@@ -43,6 +43,7 @@ TEST(Session, SucceedsOnASoundHost)
     EXPECT_THAT(session.rig().server().report().violations, IsEmpty());
     EXPECT_EQ(left_beside_strings(session.rig().server().report()), 0u) << session.rig().server().report().to_text();
     EXPECT_EQ(nvrsim_callbacks(), 0u);
+    EXPECT_EQ(session.settings().wrong(), "");
 }
 
 TEST(Session, MakesTheSameLibraryCallsEachTime)

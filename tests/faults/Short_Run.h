@@ -34,8 +34,7 @@ using Blocks = std::map<std::uintptr_t, std::int64_t>;
 struct Survey {
     std::vector<Surveyed_Site> sites; ///< in the order of their first ask
     std::string published;
-    std::vector<std::string> settings; ///< both files, as the unload leaves them
-    Blocks first, second;              ///< after the unload of each load
+    Blocks first, second; ///< after the unload of each load
 };
 
 /// By the part of the session that comes between the load and the unload; under "" that with all parts.

@@ -65,8 +65,15 @@ public:
         constexpr std::uint32_t link_up = 514;
         nvrsim_event("0", link_up, 0);
         nvrsim_drain_events();
+        expect_settings();
     }
 
+    /// After the unload: what clients were told is set is there still.
+    void expect_settings()
+    {
+        const std::string wrong = m_session->settings().wrong();
+        expect(wrong.empty(), wrong);
+    }
     /// After the unload: what the server lent is given back.
     void expect_nothing_lent()
     {

@@ -116,7 +116,7 @@ public:
     void restore_settings()
     {
         for (std::size_t which = 0; which < m_settings.size(); which++)
-            change_setting(which, which == 0 ? 10 : 1);
+            change_setting(which, which == 0 ? Session::time_out : 1);
         set_driver_log(2);
         call(driver_log(), "ClearLog", {});
     }
