@@ -171,22 +171,21 @@ std::string readWebLaunchURL()
 {
     static const char path[] = "/etc/nvr_smis.conf";
     Undisturbed undisturbed;
-    File file = open_file(path, "r");
-    if (!file) {
+    Line_Reader file(path);
+    if (!file.is_open()) {
         NVR_LOG("WebLaunch config file '%s' not found.", path);
         return "";
     }
     char line[256];
-    while (std::fgets(line, sizeof line, file.get())) {
-        const bool whole = std::strchr(line, '\n') != nullptr;
+    bool is_rest = false; // the rest of a long comment is no line of its own
+    for (int pieces = 0; pieces < 10000 && file.read(line); pieces++) {
+        const bool is_whole = std::strchr(line, '\n') != nullptr;
         line[std::strcspn(line, "\n")] = '\0';
         const char* text = line;
         while (is_space(*text))
             text++;
-        if (*text != '\0' && *text != '#') return text;
-        // The rest of a long comment is no line of its own.
-        for (int c = 0; !whole && c != EOF && c != '\n';)
-            c = std::fgetc(file.get());
+        if (!is_rest && *text != '\0' && *text != '#') return text;
+        is_rest = !is_whole;
     }
     return "";
 }

@@ -28,18 +28,21 @@ File stream_of(int fd, const char* mode)
     return file;
 }
 
-/// Writes all of it, with the first call if the system lets it; false, with errno set, once something is refused.
-bool write_all(int fd, std::string_view bytes, std::string_view rest = {})
+/// Writes all of them, with the first call if the system lets it; false, with errno set, once something is refused.
+template <std::size_t Count>
+bool write_all(int fd, const std::string_view (&texts)[Count])
 {
-    while (!bytes.empty() || !rest.empty()) {
-        const iovec parts[] = {{const_cast<char*>(bytes.data()), bytes.size()},
-                               {const_cast<char*>(rest.data()), rest.size()}};
-        const ssize_t written = ::writev(fd, parts, 2);
+    iovec parts[Count];
+    for (std::size_t i = 0; i < Count; i++)
+        parts[i] = {const_cast<char*>(texts[i].data()), texts[i].size()};
+    for (iovec* part = parts; part != parts + Count;) {
+        const ssize_t written = ::writev(fd, part, static_cast<int>(parts + Count - part));
         if (written < 0 && errno == EINTR) continue;
-        if (written <= 0) return false;
-        const auto size = static_cast<std::size_t>(written);
-        rest.remove_prefix(size - std::min(size, bytes.size()));
-        bytes.remove_prefix(std::min(size, bytes.size()));
+        if (written < 0) return false;
+        auto left = static_cast<std::size_t>(written);
+        for (; part != parts + Count && left >= part->iov_len; part++)
+            left -= part->iov_len;
+        if (part != parts + Count) *part = {static_cast<char*>(part->iov_base) + left, part->iov_len - left};
     }
     return true;
 }
@@ -131,11 +134,14 @@ int fault_of_file(const char* path)
 
 bool write_text(const char* path, std::string_view text, std::string_view rest)
 {
-    const int fd = ::open(path, O_WRONLY | O_CREAT | O_TRUNC | always, 0666);
+    const int fd = ::open(path, O_WRONLY | O_CREAT | always, 0666);
     if (fd < 0) return false;
-    write_all(fd, text, rest);
-    ::close(fd);
-    return true;
+    // What is left of a longer text goes once all is there, and not before: its room might be another's then. Until
+    // then it is a line of its own.
+    const bool written = write_all(fd, {text, rest, "\n"});
+    if (written) static_cast<void>(::ftruncate(fd, static_cast<off_t>(text.size() + rest.size())));
+    close_keeping_errno(fd);
+    return written;
 }
 
 File open_regular_file(const char* path, const char* mode)
@@ -148,7 +154,7 @@ bool write_regular_file(const char* path, std::string_view bytes)
 {
     const int fd = open_regular(path, true);
     if (fd < 0) return false;
-    const bool written = write_all(fd, bytes);
+    const bool written = write_all(fd, {bytes});
     const bool emptied = !written && ::ftruncate(fd, 0) == 0;
     if (::close(fd) == 0 && written) return true;
     // A link is not ours to remove, unless a part would be read through it.

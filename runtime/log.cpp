@@ -25,6 +25,7 @@ constexpr const char* level_names[] = {"FATAL", "ERR", "WARN", "INFO", "DBG"};
 constexpr int number_of_levels = 5;
 constexpr int closed = -1;
 constexpr std::size_t longest_line = 1024; // of the configuration file
+constexpr int longest_file = 1024 * 1024;
 
 // Guards what follows.
 Mutex log_mutex(false, "log_mutex", Lock_Place::log);
@@ -52,12 +53,23 @@ int level_of(const char* name)
     return closed;
 }
 
-// One line without its white space at the end; what a line has beyond its limit is dropped.
-bool read_line(std::FILE* file, char (&line)[longest_line + 1])
+// As fopen, but that nobody waits for the other end of a pipe.
+std::FILE* open_stream(const String& path, int flags, const char* mode)
+{
+    const int file = open(path.c_str(), flags | O_NONBLOCK | O_NOCTTY | O_CLOEXEC, 0666);
+    if (file == -1) return nullptr;
+    std::FILE* stream = fdopen(file, mode);
+    if (!stream) close(file);
+    return stream;
+}
+
+// One line without its white space at the end; what a line has beyond its limit is dropped. `left` bytes are read at
+// most.
+bool read_line(std::FILE* file, char (&line)[longest_line + 1], int& left)
 {
     std::size_t size = 0;
-    int c;
-    while ((c = std::getc(file)) != EOF && c != '\n')
+    int c = EOF;
+    while (left-- > 0 && (c = std::getc(file)) != EOF && c != '\n')
         if (size < longest_line) line[size++] = static_cast<char>(c);
     if (c == EOF && size == 0) return false;
     while (size && (is_blank(line[size - 1]) || (line[size - 1] >= '\n' && line[size - 1] <= '\r')))
@@ -77,11 +89,12 @@ const char* level_name_in(const char* line)
 
 int configured_level(const String& path)
 {
-    std::FILE* file = std::fopen(path.c_str(), "re");
+    std::FILE* file = open_stream(path, O_RDONLY, "r");
     if (!file) return closed;
     int level = 0;
     char line[longest_line + 1];
-    while (read_line(file, line)) {
+    int left = longest_file;
+    while (left > 0 && read_line(file, line, left)) {
         if (line[0] == '#' || line[0] == '\0') continue;
         if (const char* name = level_name_in(line)) {
             level = level_of(name);
@@ -102,9 +115,9 @@ String operator+(const String& a, const char* b)
 bool open_files(const String& folder)
 {
     mkdir(folder.c_str(), 0777);
-    log_lock_file = open((folder + "/messages.lock").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);
+    log_lock_file = open((folder + "/messages.lock").c_str(), O_WRONLY | O_CREAT | O_NONBLOCK | O_CLOEXEC, 0600);
     if (log_lock_file == -1) return false;
-    log_file = std::fopen((folder + "/messages").c_str(), "ae");
+    log_file = open_stream(folder + "/messages", O_WRONLY | O_CREAT | O_APPEND, "a");
     if (log_file) return true;
     close(log_lock_file);
     return false;

@@ -126,7 +126,7 @@ TEST_F(Software, WithoutCurlOnlyFilesCanBeInstalled)
 TEST_F(Software, WithCurlMoreCanBeFetched)
 {
     nvrtest::remove(library_folder() + "/libcurl.so");
-    nvrtest::link(NVRSIM_BUILD "/lib/libHBAAPI.so", library_folder() + "/libcurl.so");
+    nvrtest::make_link(NVRSIM_BUILD "/lib/libHBAAPI.so", library_folder() + "/libcurl.so");
     ASSERT_EQ(load(), 0);
     EXPECT_EQ(value(only(agent().m_NVRHBA_SoftwareInstallationServiceCapabilities_map).get(), "SupportedURISchemes"),
               "{3,4,5,6,8}");

@@ -204,7 +204,7 @@ TEST_F(Binding, LooksInTheGlobalScopeForOneOperationOnly)
 {
     fake::install({});
     const std::string file = nvrtest::library_folder() + "/libelsewhere.so";
-    nvrtest::link(NVR_FAKE_LIBRARIES "/libfake_rmapi.so", file);
+    nvrtest::make_link(NVR_FAKE_LIBRARIES "/libfake_rmapi.so", file);
     void* elsewhere = ::dlopen(file.c_str(), RTLD_NOW | RTLD_GLOBAL);
     ASSERT_NE(elsewhere, nullptr);
     fake::install({"HBAAPI", "lrmapi", "tssdm"});

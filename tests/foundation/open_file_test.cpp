@@ -5,6 +5,7 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -108,14 +109,14 @@ TEST(OpenRegularFile, MakesFilesAsTheUmaskSays)
 TEST(OpenRegularFile, FollowsALinkToAFile)
 {
     write_file(other, "old");
-    link(other, opened);
+    make_link(other, opened);
     ASSERT_TRUE(rewrite());
     EXPECT_EQ(read_file(other), "new");
 }
 
 TEST(OpenRegularFile, MakesNothingBehindALinkThatLeadsNowhere)
 {
-    link(other, opened);
+    make_link(other, opened);
     expect_refused("wb", EEXIST);
     expect_refused("rb", ENOENT);
     EXPECT_FALSE(exists(other));
@@ -142,7 +143,7 @@ TEST(OpenRegularFile, RefusesFifosWithoutWaitingForTheirOtherEnd)
 
 TEST(OpenRegularFile, RefusesDevices)
 {
-    link("/dev/null", opened);
+    make_link("/dev/null", opened);
     expect_refused("wb", EINVAL);
     expect_refused("rb", EINVAL);
 }
@@ -171,6 +172,43 @@ TEST(WriteRegularFile, WritesItsBytesAndNothingElse)
     EXPECT_FALSE(write_regular_file("/var/log/none/file", "new"));
 }
 
+TEST(WriteText, LeavesNothingOfALongerText)
+{
+    for (const char* old : {"", "short", "a text that is longer than the one that is written"}) {
+        write_file(opened, old);
+        EXPECT_TRUE(write_text(opened.c_str(), "a line\n", "and a rest"));
+        EXPECT_EQ(read_file(opened), "a line\nand a rest") << old;
+    }
+    EXPECT_TRUE(write_text(opened.c_str(), ""));
+    EXPECT_EQ(read_file(opened), "");
+}
+
+// As where the process is killed in between.
+TEST(WriteText, KeepsWhatItCannotCutOffApartFromWhatItWrote)
+{
+    const int file = ::memfd_create("settings", MFD_ALLOW_SEALING);
+    ASSERT_EQ(::write(file, "2,5,1\n/var/log/longer", 21), 21);
+    ASSERT_EQ(::fcntl(file, F_ADD_SEALS, F_SEAL_SHRINK), 0);
+    const std::string path = "/proc/self/fd/" + std::to_string(file);
+    EXPECT_TRUE(write_text(path.c_str(), "4,5,1\n", "/var/log/new"));
+    EXPECT_EQ(read_file(path), "4,5,1\n/var/log/new\ner");
+    ::close(file);
+}
+
+TEST(WriteText, OnAFullDiskTakesTheRoomOfTheOldOneOrTells)
+{
+    make_folder("/var/log/disk");
+    const Small_Disk disk("/var/log/disk");
+    write_file("/var/log/disk/file", "old");
+    disk.fill();
+    EXPECT_TRUE(write_text("/var/log/disk/file", "a new text"));
+    EXPECT_EQ(read_file("/var/log/disk/file"), "a new text");
+    EXPECT_FALSE(write_text("/var/log/disk/file", std::string(100000, 'x')));
+    EXPECT_FALSE(write_text("/var/log/disk/another", "a text"));
+    EXPECT_EQ(errno, ENOSPC);
+    EXPECT_EQ(read_file("/var/log/disk/another"), "");
+}
+
 TEST(WriteRegularFile, LeavesNoPartOnAFullDisk)
 {
     make_folder("/var/log/disk");
@@ -180,7 +218,7 @@ TEST(WriteRegularFile, LeavesNoPartOnAFullDisk)
     EXPECT_FALSE(exists("/var/log/disk/file"));
     // A link stays, and what it leads to is no part either.
     write_file("/var/log/disk/file", "old");
-    link("/var/log/disk/file", opened);
+    make_link("/var/log/disk/file", opened);
     EXPECT_FALSE(write_regular_file(opened.c_str(), more));
     EXPECT_TRUE(exists(opened));
     EXPECT_EQ(read_file("/var/log/disk/file"), "");

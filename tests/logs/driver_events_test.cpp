@@ -322,9 +322,9 @@ TEST_F(DriverEvents, WhatIsNoRegularFileHasNoLines)
     remove(system_log);
     ASSERT_EQ(mkfifo(system_log, 0600), 0);
     expect_nothing("a pipe");
-    nvrtest::link("/dev/zero", system_log);
+    nvrtest::make_link("/dev/zero", system_log);
     expect_nothing("an endless device");
-    nvrtest::link("/var/log/messages", system_log);
+    nvrtest::make_link("/var/log/messages", system_log);
     expect_nothing("a link to itself");
     write_file(system_log, line(1));
     make_unopenable(system_log);

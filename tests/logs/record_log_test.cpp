@@ -243,7 +243,7 @@ TEST_F(RecordLog, TracePathsThatCannotBeWrittenAreRefused)
     write_file("/var/log/read-only", "");
     ASSERT_EQ(chmod("/var/log/read-only", 0444), 0);
     write_file("/var/log/plain", "");
-    nvrtest::link("/var/log/nowhere/file", "/var/log/to-nowhere");
+    nvrtest::make_link("/var/log/nowhere/file", "/var/log/to-nowhere");
     const std::string long_name(4096, 'x');
     for (const std::string& path : {std::string(), std::string("/var/log"), std::string("/var/log/read-only"),
                                     std::string("/var/log/plain/below"), std::string("/nowhere/at/all"),
@@ -263,7 +263,7 @@ TEST_F(RecordLog, DevicesAndDanglingLinksCanBeTraceFiles)
     EXPECT_EQ(set_params(provider_log(), 5, 2, "/dev/null"), 0u);
     EXPECT_EQ(shown("TracePath"), "/dev/null");
     EXPECT_EQ(set_params(provider_log(), 5, 2, "/dev/full"), 0u); // its records are lost
-    nvrtest::link("/var/log/made-by-the-link", "/var/log/dangling");
+    nvrtest::make_link("/var/log/made-by-the-link", "/var/log/dangling");
     EXPECT_EQ(set_params(provider_log(), 5, 2, "/var/log/dangling"), 0u);
     EXPECT_TRUE(exists("/var/log/made-by-the-link"));
     ASSERT_EQ(mkfifo("/var/log/fifo", 0600), 0);

@@ -220,8 +220,8 @@ TEST_P(InstallFromBytes, WritesToNothingButAFile)
     Firmware_Host host(*GetParam());
     ASSERT_EQ(::mkfifo("fifo", 0600), 0);
     make_folder("folder");
-    nvrtest::link("/dev/null", "device");
-    nvrtest::link("nowhere", "dangling");
+    nvrtest::make_link("/dev/null", "device");
+    nvrtest::make_link("nowhere", "dangling");
     write_file("a.file", "");
     const Words before = names_in(firmware_folder);
     for (const std::string& path :
@@ -276,7 +276,7 @@ TEST_P(InstallFromBytes, AFullDiskLeavesNoPartBehindALink)
     make_folder("/var/log/disk");
     mount_small_disk("/var/log/disk", 16);
     write_file("/var/log/disk/image", "old");
-    nvrtest::link("/var/log/disk/image", copy);
+    nvrtest::make_link("/var/log/disk/image", copy);
     const Called called = host.install_bytes(image(new_version, 60000), {32768}, {copy});
     EXPECT_THAT(called, returned(4));
     EXPECT_EQ(called.words, joined({with_file(1, 32768), {not_opened}}));

@@ -341,8 +341,8 @@ TEST_P(InstallFromUri, PathsThatAreNoFilesAreRefusedWithoutWaiting)
     Firmware_Host host(*GetParam());
     ASSERT_EQ(::mkfifo("fifo", 0600), 0);
     make_folder("folder");
-    nvrtest::link("/dev/zero", "device");
-    nvrtest::link("nowhere", "dangling");
+    nvrtest::make_link("/dev/zero", "device");
+    nvrtest::make_link("nowhere", "dangling");
     const Words before = names_in(firmware_folder);
     for (const char* path : {"fifo", "folder", "device", "/dev/null", "/var/log/"}) {
         const Called called = host.install(path);

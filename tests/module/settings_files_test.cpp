@@ -1,5 +1,7 @@
 // The module's settings files, sound and broken in every line: no fault in them stops the module.
 #include <cerrno>
+#include <dlfcn.h>
+#include <pthread.h>
 #include <string>
 #include <sys/stat.h>
 #include <vector>
@@ -129,8 +131,8 @@ TEST(SettingsFiles, OnAFullDiskTakeWhatWasSet)
     write_file("/var/log/disk/conf", "NVR_PROVIDER_CACHE_TIMEOUT = 20\n");
     write_file("/var/log/disk/dmp", "2,5,1\n" + std::string(trace_path));
     Rig rig({host::Manner::strict(), "small"});
-    link("/var/log/disk/conf", conf_path);
-    link("/var/log/disk/dmp", dmp_path);
+    make_link("/var/log/disk/conf", conf_path);
+    make_link("/var/log/disk/dmp", dmp_path);
     disk.fill();
     host::Instance setting = rig.enumerate("NVRHBA_ProviderConfigSetting").instances.at(0);
     setting.set("current", host::Value::uint32(3));
@@ -141,6 +143,75 @@ TEST(SettingsFiles, OnAFullDiskTakeWhatWasSet)
     rig.stop();
     remove(conf_path);
     remove(dmp_path);
+}
+
+TEST(SettingsFiles, ThatAFullDiskRefusesAreWrittenAtTheEnd)
+{
+    make_folder("/var/log/disk");
+    Rig rig({host::Manner::strict(), "small"});
+    const host::Instance log = rig.enumerate("NVRHBA_RecordLog").instances.at(0);
+    {
+        const Small_Disk disk("/var/log/disk");
+        remove(dmp_path);
+        make_link("/var/log/disk/dmp", dmp_path);
+        disk.fill();
+        const host::Answer set = rig.server().call(log.path, "SetLogParams",
+                                                   {{"LogLevel", host::Value::uint16(5)},
+                                                    {"LogMode", host::Value::uint16(4)},
+                                                    {"TracePath", host::Value::string(trace_path)}});
+        ASSERT_THAT(set, succeeded());
+        ASSERT_EQ(set.value.as_uint(), 0u);
+        EXPECT_EQ(read_file("/var/log/disk/dmp"), "");
+        remove(dmp_path);
+    }
+    rig.stop();
+    EXPECT_EQ(read_file(dmp_path), "4,5,1\n" + std::string(trace_path));
+}
+
+// --- A request that is cancelled
+// --------------------------------------------------------------------------------------------------
+
+namespace {
+
+struct First_Request {
+    const CMPIBroker* broker;
+    const CMPIContext* context;
+    CMPIInstanceMI* (*factory)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+    CMPIInstanceMI* made = nullptr;
+};
+
+void* ask_and_be_cancelled(void* data)
+{
+    auto* request = static_cast<First_Request*>(data);
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    ::pthread_cancel(::pthread_self());
+    request->made = request->factory(request->broker, request->context, &status);
+    ::pthread_testcancel();
+    return nullptr;
+}
+
+} // namespace
+
+TEST(SettingsFiles, OutliveAFirstRequestThatIsCancelled)
+{
+    const std::string conf = "NVR_PROVIDER_CACHE_TIMEOUT = 20\n";
+    Rig rig({host::Manner::strict(), "small"});
+    const Entries module;
+    write_file(conf_path, conf);
+    rig.server().on_request_thread([&](const CMPIBroker* broker, const CMPIContext* context) {
+        void* const factory = dlsym(module.handle(), "NVRHBA_ProviderConfigSetting_Create_InstanceMI");
+        First_Request request{broker, context, reinterpret_cast<decltype(First_Request::factory)>(factory)};
+        pthread_t thread;
+        void* result = nullptr;
+        ASSERT_EQ(::pthread_create(&thread, nullptr, ask_and_be_cancelled, &request), 0);
+        ASSERT_EQ(::pthread_join(thread, &result), 0);
+        EXPECT_EQ(result, PTHREAD_CANCELED);
+        EXPECT_EQ(read_file(conf_path), conf);
+        ASSERT_TRUE(request.made);
+        EXPECT_EQ(request.made->ft->cleanup(request.made, context, 1).rc, CMPI_RC_OK);
+    });
+    EXPECT_THAT(read_file(conf_path), testing::HasSubstr(conf));
+    EXPECT_EQ(read_file(dmp_path), "2,5,1\n" + std::string(trace_path));
 }
 
 // --- The log's settings
@@ -263,4 +334,9 @@ TEST(WebLaunchFile, OfEveryShapeStopsNobody)
         rig.stop();
         remove(smis_path);
     }
+    make_link("/dev/zero", smis_path);
+    Rig rig({host::Manner::strict(), "small"});
+    EXPECT_THAT(rig.enumerate("NVRHBA_RemoteServiceAccessPoint").instances, IsEmpty());
+    rig.stop();
+    remove(smis_path);
 }

@@ -16,7 +16,7 @@ namespace {
 
 void install_system_library()
 {
-    link(NVR_SYSTEM_HBAAPI, library_folder() + "/libHBAAPI.so");
+    make_link(NVR_SYSTEM_HBAAPI, library_folder() + "/libHBAAPI.so");
     write_file("/etc/hba.conf",
                std::string("com.norvane.simulator ") + NVRSIM_BUILD + "/lib/libnvrsim_hba_vendor.so\n");
 }

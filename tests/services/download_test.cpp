@@ -145,8 +145,8 @@ TEST_F(Download, WritesToNothingButAFile)
     install_curl();
     make_folder(folder + "/folder");
     ASSERT_EQ(::mkfifo((folder + "/fifo").c_str(), 0600), 0);
-    link("/dev/null", folder + "/device");
-    link("/var/log/elsewhere", folder + "/dangling");
+    make_link("/dev/null", folder + "/device");
+    make_link("/var/log/elsewhere", folder + "/dangling");
     const Words before = names_in(folder);
     for (const std::string& name :
          {std::string(".."), std::string("."), std::string("folder"), std::string("fifo"), std::string("device"),

@@ -220,7 +220,7 @@ TEST(TagTables, OfWhichAPartIsWrittenAreNotLeftBehindALink)
     make_folder("/var/log/disk");
     const Small_Disk disk("/var/log/disk");
     write_file("/var/log/disk/tags", "");
-    nvrtest::link("/var/log/disk/tags", "/var/log/link");
+    nvrtest::make_link("/var/log/disk/tags", "/var/log/link");
     Log_Capture log;
     WriteConfigTablesToFile("/var/log/link", makeTagTable(1000), "Norvane-FC2162-0");
     EXPECT_THAT(log.words(), ElementsAre("NVRHBA_FCTagService_Provider::WriteConfigTablesToFile",

@@ -94,7 +94,7 @@ TEST_F(Upload, SendsNothingButFiles)
 {
     use_stand_in();
     ASSERT_EQ(::mkfifo((folder + "/fifo").c_str(), 0600), 0);
-    link("/dev/zero", folder + "/device");
+    make_link("/dev/zero", folder + "/device");
     for (const char* path : {"fifo", "device", "/var/log"})
         expect_told("http://127.0.0.1/file", 1, joined({search, version_words()}), path);
     EXPECT_EQ(stand_in->handles, 3);

@@ -26,7 +26,7 @@ void install_curl()
     // What it and its own libraries keep to the end would count as lost if they were unloaded before.
     static void* const kept = ::dlopen(system_curl().c_str(), RTLD_NOW | RTLD_LOCAL);
     if (!kept) throw std::runtime_error("the system's libcurl does not open");
-    link(system_curl(), place());
+    make_link(system_curl(), place());
 }
 
 void install_no_curl()
@@ -37,7 +37,7 @@ void install_no_curl()
 Curl_Stand_In& install_curl_without(const std::string& entry)
 {
     const std::string file = std::string(NVR_CURL_FOLDER) + "/libcurl_without_" + entry + ".so";
-    link(file, place());
+    make_link(file, place());
     void* const library = ::dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
     void* const record = library ? ::dlsym(library, "curl_stand_in") : nullptr;
     if (!record) throw std::runtime_error("no stand-in without " + entry);

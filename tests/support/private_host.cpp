@@ -73,7 +73,7 @@ void make_folder(const std::string& path)
     if (::mkdir(path.c_str(), 0755) != 0) fail("mkdir " + path);
 }
 
-void link(const std::string& target, const std::string& path)
+void make_link(const std::string& target, const std::string& path)
 {
     remove(path);
     if (::symlink(target.c_str(), path.c_str()) != 0) fail("link " + path);

@@ -23,7 +23,7 @@ bool exists(const std::string& path);
 void remove(const std::string& path);
 void make_folder(const std::string& path);
 /// `path` becomes a link to `target`.
-void link(const std::string& target, const std::string& path);
+void make_link(const std::string& target, const std::string& path);
 
 /// Covers an existing file that cannot be written, such as one of /proc, by this content; or so that it cannot be
 /// opened.

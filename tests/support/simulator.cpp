@@ -130,7 +130,7 @@ void compose_libraries(const std::vector<std::string>& present)
     for (const char* name : library_names) {
         const std::string path = library_folder() + file_of(name);
         if (std::find(present.begin(), present.end(), name) != present.end())
-            link(NVRSIM_BUILD "/lib" + file_of(name), path);
+            make_link(NVRSIM_BUILD "/lib" + file_of(name), path);
         else
             write_file(path, "No library of this name is installed.\n");
     }
@@ -142,7 +142,7 @@ void compose_variant(const std::string& variant)
         const std::string file = NVRSIM_BUILD "/variants/" + variant + file_of(name);
         const std::string path = library_folder() + file_of(name);
         if (exists(file))
-            link(file, path);
+            make_link(file, path);
         else
             remove(path);
     }
