@@ -52,8 +52,10 @@ bool in_use()
 
 ProviderAgent* ProviderAgent::lockedInstance()
 {
-    if (!the_agent) the_agent = new ProviderAgent(errno);
-    return the_agent;
+    if (the_agent) return the_agent;
+    // Cut short, it would leave a settings file half read for the end to write, and an agent that is gone for an exit.
+    const Undisturbed undisturbed;
+    return the_agent = new ProviderAgent(errno);
 }
 
 ProviderAgent* ProviderAgent::GetInstance()

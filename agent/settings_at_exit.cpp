@@ -9,6 +9,7 @@
 #include "foundation/Management_Session.h"
 #include "foundation/NvrConfigFile.h"
 #include "runtime/Mutex.h"
+#include "runtime/Undisturbed.h"
 #include "runtime/guarded.h"
 
 namespace cimple {
@@ -23,6 +24,7 @@ bool registered = false;
 
 void save()
 {
+    const Undisturbed undisturbed; // a thread that was cancelled would leave its exit, and the lock with it
     if (owner != ::getpid() || !mutex.lock_soon()) return;
     if (living)
         guarded([] {

@@ -41,7 +41,7 @@ constexpr int table_version = 100;
 // `buffer` takes kind and provider name. A text that is there already stays untouched: a server may be reading it.
 void fill_name(char (&buffer)[MI_Table_Set::name_size], const char* kind, const char* provider_name)
 {
-    char text[MI_Table_Set::name_size];
+    char text[MI_Table_Set::name_size] = {};
     if (std::snprintf(text, sizeof text, "%s%s", kind, provider_name ? provider_name : "") < 0) return;
     if (std::strcmp(text, buffer) != 0) std::memcpy(buffer, text, sizeof text);
 }
@@ -152,8 +152,8 @@ bool CMPI_Adapter::hold()
 
 void CMPI_Adapter::unload()
 {
+    const Undisturbed undisturbed; // nobody else would unload it
     {
-        const Undisturbed undisturbed; // nobody else would unload it
         Auto_Mutex locked(m_calls_mutex);
         while (m_calls > Running_Call::own(*this))
             m_call_ended.wait(m_calls_mutex);

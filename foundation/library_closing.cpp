@@ -5,6 +5,8 @@
 #include <cxxabi.h>
 #include <dlfcn.h>
 
+#include "runtime/Undisturbed.h"
+
 namespace cimple {
 
 namespace {
@@ -20,6 +22,7 @@ thread_local bool forgetting = false;
 void wait_for_closings(void*)
 {
     if (forgetting) return;
+    const Undisturbed undisturbed; // a thread that was cancelled would leave its exit
     exiting = true;
     constexpr timespec pause = {0, 1000000};
     for (int tries = 0; under_way != 0 && tries < 100; tries++)

@@ -253,6 +253,26 @@ TEST(Exit, AtAnyMomentOfAChangeOfTheLogLeavesOneOfItsStates)
         remove(path);
 }
 
+// The thread would leave the exit where it first waits, and the process live on without an end of its settings.
+TEST(Exit, OfAThreadThatWasCancelledIsOne)
+{
+    const Ended ended = exit_after([] {
+        Rig& rig = lasting_rig(in_sfcb);
+        set_minutes(rig, 17);
+        rig.settle();
+        remove(conf_path);
+        remove(dmp_path);
+        std::thread([] {
+            pthread_cancel(pthread_self());
+            std::exit(0);
+        }).join();
+        std::_Exit(8);
+    });
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(read_file(conf_path), six_lines);
+    EXPECT_EQ(read_file(dmp_path), std::string("2,5,1\n") + trace_path);
+}
+
 TEST(Exit, OfAProcessThatNeverLoadedWritesNothing)
 {
     const Ended ended = exit_after([] {
