@@ -1,9 +1,12 @@
 # norvane_room(NAME SOURCES... [LINK libs...]): a room of the house as a static library `nvr_NAME`, included by paths
-# from the repository's root ("runtime/Instance.h"), compiled so that it can go into the shared module.
+# from the repository's root ("runtime/Instance.h"), compiled so that it can go into the shared module. What it keeps for
+# each thread lies with the threads' own data: else the loader would ask for memory when a thread first comes to it, and
+# end the process where there is none.
 function(norvane_room name)
   cmake_parse_arguments(ROOM "" "" "SOURCES;LINK" ${ARGN})
   add_library(nvr_${name} STATIC ${ROOM_SOURCES})
   target_include_directories(nvr_${name} PUBLIC ${PROJECT_SOURCE_DIR})
+  target_compile_options(nvr_${name} PRIVATE -ftls-model=initial-exec)
   target_link_libraries(nvr_${name} PUBLIC ${ROOM_LINK} Threads::Threads)
 endfunction()
 

@@ -90,6 +90,16 @@ TEST(Exports, TheModuleStaysLoadedAndBindsItsOwnNamesToItself)
     EXPECT_TRUE(module.dynamic_entry(DT_FLAGS) & DF_SYMBOLIC);
 }
 
+// The loader would ask for memory where a thread first comes to what is its own, and end the process without.
+TEST(Exports, WhatBelongsToAThreadNeedsNoMemoryOfItsOwn)
+{
+    const Elf_File module(NVR_MODULE);
+    EXPECT_TRUE(module.dynamic_entry(DT_FLAGS) & DF_STATIC_TLS);
+#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+    EXPECT_THAT(module.imported(), testing::Not(testing::Contains("__tls_get_addr")));
+#endif
+}
+
 TEST(Exports, NoManagementLibraryIsLinked)
 {
     // The languages' own, and what the sanitizers bring.
