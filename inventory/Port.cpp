@@ -105,7 +105,7 @@ void FCPort::rescanTargets(Adapter* adapter)
 
 uint32 FCPort::getTargetMapping(HBA_HANDLE handle, HBA_FCPTARGETMAPPING** mapping)
 {
-    constexpr uint32 max_capacity = 1u << 20; // the library may name any number; for more there is no memory
+    constexpr uint32 max_capacity = 65536; // the library may name any number; for more there is no memory
     uint32 capacity = 256;
     uint32 status = HBA_STATUS_ERROR;
     Mapping buffer(nullptr, &std::free);

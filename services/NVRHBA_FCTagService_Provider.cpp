@@ -130,7 +130,7 @@ public:
     }
 
 private:
-    uint32 m_hint = 0; // of a failure, which shows better in the file that is not there
+    uint32 m_hint = 0; // of a failure; whether a file is there is what counts
     bool m_fetched = false;
     const std::string m_path;
 };
@@ -174,8 +174,10 @@ uint32 writeTable(const Tag_Adapter& adapter, uint32 entries, const char* name)
         return ANSWER_BAD_ARGUMENT;
     }
     NVR_LOG("GetConfigTable: filename :%s", path.c_str());
-    open_regular_file(path.c_str(), "wb"); // so that it exists
-    WriteConfigTablesToFile(path, table, adapter.name());
+    // A client names a file in that folder, and none elsewhere.
+    const bool is_name = !std::strchr(name, '/');
+    if (is_name) open_regular_file(path.c_str(), "wb"); // so that it exists
+    WriteConfigTablesToFile(is_name ? path : std::string(), table, adapter.name());
     return ANSWER_DONE;
 }
 

@@ -163,7 +163,7 @@ uint32 installFromURI(ProviderAgent& agent, const NVRHBA_SoftwareInstallationSer
         return ANSWER_INVALID_PARAMETER;
     }
 
-    uint32 transferAnswer = 0; // tells nothing that the look at the file would not
+    uint32 transferAnswer = 0; // whether an image is there is what counts
     bool fetched = false;
     const std::string path = NVR_MethodWrapper::downloadFileUsingCurl(uri, transferAnswer, fetched);
     NVR_LOG("filename is : %s", path.c_str());

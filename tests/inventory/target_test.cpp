@@ -188,7 +188,7 @@ TEST_F(Targets, BelieveNoCountOfTheMapping)
 
 TEST_F(Targets, BelieveNoNeedOfTheMapping)
 {
-    for (uint32 count : {0u, 1u, 0x7FFFFFFFu, 0xFFFFFFFFu}) {
+    for (uint32 count : {0u, 1u, 65537u, 1048576u, 0x7FFFFFFFu, 0xFFFFFFFFu}) {
         int calls = 0;
         fake::operations().HBA_GetFcpTargetMapping = [&](HBA_HANDLE, HBA_FCPTARGETMAPPING* mapping) {
             calls++;

@@ -412,7 +412,8 @@ TEST_P(TagService, AFileThatCannotBeWrittenShowsInTheLogAlone)
     make_folder(std::string(directory) + "/folder");
     ASSERT_EQ(::mkfifo("/var/log/dumps/fifo", 0600), 0);
     ASSERT_EQ(::symlink("/var/log/dumps/nowhere", "/var/log/dumps/link"), 0);
-    for (const char* name : {"nobody/tags.xml", "folder", "fifo", "link", "folder/", "/", "..", "."}) {
+    for (const char* name :
+         {"nobody/tags.xml", "folder/tags.xml", "../tags.xml", "folder", "fifo", "link", "folder/", "/", "..", "."}) {
         const Called called = service->call("GetConfigTable", with(name));
         EXPECT_THAT(called, returned(0)) << name;
         const std::size_t size = called.words.size();
@@ -422,6 +423,8 @@ TEST_P(TagService, AFileThatCannotBeWrittenShowsInTheLogAlone)
                          provider + "::GetConfigTable Successful"}));
     }
     EXPECT_THAT(files(directory), ElementsAre("fifo", "folder", "link"));
+    EXPECT_THAT(files(std::string(directory) + "/folder"), IsEmpty());
+    EXPECT_FALSE(exists("/var/log/tags.xml"));
 }
 
 TEST_P(TagService, AFullDiskLeavesNoFile)
