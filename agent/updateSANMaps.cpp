@@ -1,6 +1,4 @@
 // The rebuild of the SAN-side maps: its walk over adapters and ports, and how a failure ends it.
-#include <cxxabi.h>
-#include <exception>
 #include <malloc.h>
 
 #include "agent/SAN_Update.h"
@@ -13,6 +11,7 @@
 #include "inventory/NVR_Data.h"
 #include "inventory/Port.h"
 #include "inventory/Target.h"
+#include "runtime/guarded.h"
 
 namespace cimple {
 
@@ -86,13 +85,10 @@ uint32 ProviderAgent::updateSANMaps()
     for (Blocks* blocks : {&m_SANEndpointBlocks, &m_SANUnitBlocks, &m_SANLinkBlocks})
         blocks->rewind();
     if (paths >= many_paths) malloc_trim(0);
-    try {
+    const bool is_walked = guarded([this] {
         if (m_pData && m_pData->haveAdapters()) SAN_Update(*this).walkAdapters();
-    } catch (abi::__forced_unwind&) {
-        throw;
-    } catch (...) { // a refused instance, or an inventory that contradicts itself
-        return NVR_FAILURE;
-    }
+    });
+    if (!is_walked) return NVR_FAILURE; // a refused instance, or an inventory that contradicts itself
     NVR_LOG("PERF: updateSANMaps: cleanExit");
     return 0;
 }

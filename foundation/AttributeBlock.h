@@ -44,7 +44,8 @@ protected:
     AttributeBlock(unsigned char* buffer, uint32 capacity) : m_capacity(capacity), m_bytes(buffer) {}
 
 private:
-    /// The bytes of the attribute that lie inside the block: `size` of them; null if there is none.
+    /// The bytes of the attribute that lie inside the block, `room` of them, and the `length` that it claims to have;
+    /// null if there is none. `status` as the library gave it.
     const unsigned char* find(uint16 number, std::size_t& room, uint16& length, uint32& status);
 
     struct Free {

@@ -83,9 +83,11 @@ static int open_libraries()
 
 int loadLibraries()
 {
-    const int result = open_libraries();
-    watchExit();
-    return result;
+    struct Watch {
+        ~Watch() { watchExit(); } // also after a library that throws as it is loaded
+    };
+    const Watch watch;
+    return open_libraries();
 }
 
 void* ForwardName::resolve()
@@ -132,7 +134,7 @@ int unloadLibraries()
 {
     {
         const bool kept = keptMapped;
-        const Library_Closing closing; // which the common library does with its vendors', too
+        const Library_Closing closing; // the common library closes its vendors' libraries when it is freed
         if (slots[SLOT_HBAAPI] && !kept && closing.allowed()) call_if_there("HBA_FreeLibrary");
         for (std::atomic<void*>& slot : slots)
             if (void* library = slot.exchange(nullptr); library && !kept) closeLibrary(library);
