@@ -13,7 +13,8 @@ void install(const std::vector<std::string>& libraries)
         const std::size_t equals = library.find('=');
         const std::string build = library.substr(0, equals);
         const std::string name = equals == std::string::npos ? library : library.substr(equals + 1);
-        nvrtest::make_link(std::string(NVR_FAKE_LIBRARIES) + "/libfake_" + build + ".so", folder + "/lib" + name + ".so");
+        nvrtest::make_link(std::string(NVR_FAKE_LIBRARIES) + "/libfake_" + build + ".so",
+                           folder + "/lib" + name + ".so");
     }
 }
 
