@@ -61,6 +61,7 @@ Load_Status NVRHBA_AlertIndication_Provider::load()
 Unload_Status NVRHBA_AlertIndication_Provider::unload()
 {
     const uint32 result = cleanUp();
+    if (delivers) return UNLOAD_FAILED; // it would wait for itself; the agent stays for the worker
     {
         Auto_Mutex lock(m_IndicationProviderMutex);
         m_unloaded = true;

@@ -97,7 +97,10 @@ uint32 registerPort(const Adapter& adapter, int index, const Port& port, void* p
             status = HBA_RegisterForAdapterPortEvents(&NVRHBA_AlertIndication_Provider::hbaThreadProc, provider, handle,
                                                       wwpn, &registration.handle);
         });
-        if (status == HBA_STATUS_OK) ports.push_back(std::move(registration));
+        if (status == HBA_STATUS_OK)
+            ports.push_back(std::move(registration));
+        else if (registration.handle) // it is registered all the same, and each event would come once more
+            guarded([&] { HBA_RemoveCallback(registration.handle); });
     }
     if (status != HBA_STATUS_OK) {
         NVR_LOG("Failed to register the Indication notification");

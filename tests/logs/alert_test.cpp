@@ -485,6 +485,20 @@ TEST_F(Alerts, ARegistrationThatThrowsIsForgottenAndMadeAnew)
     }
 }
 
+TEST_F(Alerts, ARegistrationThatFailedAndWasMadeAllTheSameIsTakenBack)
+{
+    fault("call = 'HBA_RegisterForAdapterPortEvents', times = 1, status = 7, value = 1");
+    EXPECT_EQ(enable(), 140);
+    EXPECT_EQ(nvrsim_callbacks(), 0u);
+    EXPECT_EQ(disable(), 0);
+    EXPECT_EQ(enable(), 0);
+    EXPECT_EQ(nvrsim_callbacks(), 2u);
+    event("0", link_down);
+    event("1", link_down);
+    EXPECT_THAT(client.wait_for(2), SizeIs(2));
+    EXPECT_EQ(disable(), 0);
+}
+
 TEST_F(Alerts, AnAdapterThatCannotBeOpenedEndsTheRegistration)
 {
     fault("call = 'HBA_OpenAdapter', damage = 'null'");
@@ -676,6 +690,19 @@ TEST_F(Alerts, ASubscriberThatDisablesOrEnablesFromWithinItsDeliveryIsRefused)
     EXPECT_THAT(client.wait_for(2), SizeIs(2)) << "alerts are still on";
     EXPECT_EQ(disable(), 0);
     EXPECT_EQ(client.stops, 1);
+}
+
+TEST_F(Alerts, ASubscriberThatUnloadsFromWithinItsDeliveryIsRefused)
+{
+    int unloaded = -1;
+    client.during = [&] { unloaded = provider->unload(); };
+    ASSERT_EQ(enable(), 0);
+    link("0", false);
+    client.wait_for(1);
+    EXPECT_EQ(unloaded, UNLOAD_FAILED);
+    link("0", true);
+    EXPECT_THAT(client.wait_for(2), SizeIs(2)) << "alerts are still on";
+    EXPECT_EQ(disable(), 0);
 }
 
 TEST_F(Alerts, ADeliveryThatThrowsCostsOnlyItself)

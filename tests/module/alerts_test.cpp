@@ -302,6 +302,8 @@ TEST(AlertsOfOneServer, ALibraryThatThrowsWhereAlertsEndIsOutlived)
             ASSERT_EQ(nvrsim_event(first_port, link_down, 0), 1);
             sink.wait_for(1);
             rig.settle();
+            while (rig.count_words("waiting for signal to occur") < 2) // the worker's last words of the delivery
+                std::this_thread::sleep_for(std::chrono::milliseconds(1));
             rig.forget_words();
             add_fault("call = \"HBA_RemoveCallback\", " + std::string(failure));
             rig.restart();
