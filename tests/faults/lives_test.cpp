@@ -128,7 +128,9 @@ TEST(Lives, AThousandLeaveTheProcessAsItWas)
     EXPECT_THAT(after.shared_memory, ElementsAre("sem.NVR_RM_INIT_LIB_DONE_" + std::to_string(getpid())));
     EXPECT_EQ(after.mappings, warm.mappings);
 #if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+#if !defined(NORVANE_COVERAGE) // whose runtime loses the name of its file with each library that is closed
     EXPECT_LT(after.bytes, warm.bytes + 16 * lives); // half of what the smallest block a life is
+#endif
     EXPECT_LT(after.resident, warm.resident + 2 * lives);
 #endif
     RecordProperty("ends in a refresh", std::to_string(ends_in_refresh));

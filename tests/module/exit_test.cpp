@@ -253,6 +253,7 @@ TEST(Exit, AtAnyMomentOfAChangeOfTheLogLeavesOneOfItsStates)
         remove(path);
 }
 
+#if !defined(NORVANE_COVERAGE) // which writes a file first, and is cancelled there
 // The thread would leave the exit where it first waits, and the process live on without an end of its settings.
 TEST(Exit, OfAThreadThatWasCancelledIsOne)
 {
@@ -272,6 +273,8 @@ TEST(Exit, OfAThreadThatWasCancelledIsOne)
     EXPECT_EQ(read_file(conf_path), six_lines);
     EXPECT_EQ(read_file(dmp_path), std::string("2,5,1\n") + trace_path);
 }
+
+#endif
 
 TEST(Exit, OfAProcessThatNeverLoadedWritesNothing)
 {
