@@ -136,6 +136,19 @@ TEST_F(RuntimeLog, AConfigurationWithoutALevelLogsFatalOnly)
     EXPECT_THAT(lines(), ElementsAre("FATAL: file.cpp(0): message 0"));
 }
 
+TEST_F(RuntimeLog, AConfigurationWithoutAnEndOrAWriterHoldsNobodyUp)
+{
+    const std::string file = home + "/.cimplerc";
+    for (const bool is_pipe : {false, true}) {
+        ASSERT_EQ(is_pipe ? mkfifo(file.c_str(), 0600) : symlink("/dev/zero", file.c_str()), 0);
+        in_child([] {
+            alarm(20);
+            log_all_levels();
+        });
+        unlink(file.c_str());
+    }
+}
+
 TEST_F(RuntimeLog, AnotherLevelNameClosesTheMatter)
 {
     for (const char* text : {"LOG_LEVEL=LOUD\nLOG_LEVEL=DBG\n", "LOG_LEVEL=\n", "LOG_LEVEL=DBG x\n"}) {
