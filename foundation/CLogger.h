@@ -62,7 +62,7 @@ public:
     void clearAll();
 
     /// Writes mode, level, enabled flag and the trace file's path (of the first attached NVR_FileLogger) to
-    /// "/etc/norvane_fc_provider.dmp". A file that cannot be opened is logged and that is all.
+    /// "/etc/norvane_fc_provider.dmp". That it cannot be written is logged and that is all.
     void saveSettings();
     /// The same at the end of a life, but for a file that could not be read and that nobody has written since: what it
     /// holds would be lost.

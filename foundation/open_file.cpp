@@ -35,16 +35,21 @@ bool write_all(int fd, const std::string_view (&texts)[Count])
     iovec parts[Count];
     for (std::size_t i = 0; i < Count; i++)
         parts[i] = {const_cast<char*>(texts[i].data()), texts[i].size()};
-    for (iovec* part = parts; part != parts + Count;) {
-        const ssize_t written = ::writev(fd, part, static_cast<int>(parts + Count - part));
-        if (written < 0 && errno == EINTR) continue;
-        if (written < 0) return false;
-        auto left = static_cast<std::size_t>(written);
-        for (; part != parts + Count && left >= part->iov_len; part++)
-            left -= part->iov_len;
-        if (part != parts + Count) *part = {static_cast<char*>(part->iov_base) + left, part->iov_len - left};
+    iovec* const end = parts + Count;
+    std::size_t written = 0; // of what begins at `part`
+    for (iovec* part = parts;;) {
+        for (; part != end && written >= part->iov_len; part++)
+            written -= part->iov_len;
+        if (part == end) return true;
+        *part = {static_cast<char*>(part->iov_base) + written, part->iov_len - written};
+        ssize_t result;
+        do
+            result = ::writev(fd, part, static_cast<int>(end - part));
+        while (result < 0 && errno == EINTR);
+        if (result == 0) errno = EIO; // it would go on for ever
+        if (result <= 0) return false;
+        written = static_cast<std::size_t>(result);
     }
-    return true;
 }
 
 bool is_regular(const struct stat& status)

@@ -49,9 +49,9 @@ private:
 };
 
 /// Makes the file, or writes over what it holds: the text and what comes behind it, and nothing else. False, with errno
-/// set, if that cannot be done. All in one write, so that no reader finds the one without the other, and on a full disk
-/// a file that is there takes it or stays as it is. Asks for no memory and takes no lock, also none of the C library's:
-/// to be called by a process that ends, too.
+/// set, if that cannot be done. All in one write, so that no reader finds the one without the other, and that on a full
+/// disk a text of less than a block goes into the room of the old one. Asks for no memory and takes no lock, also none
+/// of the C library's: to be called by a process that ends, too.
 bool write_text(const char* path, std::string_view text, std::string_view rest = {});
 
 /// As open_file, for paths that clients name, which may lead anywhere: as fopen with mode "rb" or "wb", but for regular

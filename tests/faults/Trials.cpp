@@ -74,6 +74,7 @@ public:
         const std::string wrong = m_session->settings().wrong();
         expect(wrong.empty(), wrong);
     }
+
     /// After the unload: what the server lent is given back.
     void expect_nothing_lent()
     {

@@ -1,12 +1,16 @@
 #include "foundation/open_file.h"
 
+#include <algorithm>
 #include <cerrno>
+#include <cstdint>
 #include <string>
 
+#include <dlfcn.h>
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/mman.h>
 #include <sys/stat.h>
+#include <sys/uio.h>
 #include <unistd.h>
 
 #include "tests/support/private_host.h"
@@ -18,6 +22,10 @@ namespace {
 
 const std::string opened = "/var/log/file";
 const std::string other = "/var/log/other";
+
+/// Bytes that the system takes of what is written at a time.
+constexpr std::size_t all = SIZE_MAX;
+std::size_t most_taken = all;
 
 /// Writes "new" to the file at `opened`; false, with errno, if it cannot be opened.
 bool rewrite()
@@ -38,6 +46,15 @@ void expect_refused(const char* mode, int error)
 }
 
 } // namespace
+
+extern "C" __attribute__((visibility("default"))) ssize_t writev(int file, const iovec* parts, int count)
+{
+    static auto* const next = reinterpret_cast<ssize_t (*)(int, const iovec*, int)>(dlsym(RTLD_NEXT, "writev"));
+    if (most_taken == all) return next(file, parts, count);
+    for (; count > 0 && parts->iov_len == 0; count--)
+        parts++;
+    return count > 0 && most_taken > 0 ? write(file, parts->iov_base, std::min(parts->iov_len, most_taken)) : 0;
+}
 
 TEST(LineReader, ReadsAsFgetsDoes)
 {
@@ -193,6 +210,24 @@ TEST(WriteText, KeepsWhatItCannotCutOffApartFromWhatItWrote)
     EXPECT_TRUE(write_text(path.c_str(), "4,5,1\n", "/var/log/new"));
     EXPECT_EQ(read_file(path), "4,5,1\n/var/log/new\ner");
     ::close(file);
+}
+
+TEST(WriteText, GoesOnWhereTheSystemTookAPart)
+{
+    most_taken = 4;
+    EXPECT_TRUE(write_text(opened.c_str(), "a line\n", "and a rest"));
+    most_taken = all;
+    EXPECT_EQ(read_file(opened), "a line\nand a rest");
+}
+
+TEST(WriteText, DoesNotOfferForEverWhatNobodyTakes)
+{
+    most_taken = 0;
+    EXPECT_FALSE(write_text(opened.c_str(), "a text"));
+    EXPECT_EQ(errno, EIO);
+    EXPECT_FALSE(write_regular_file(opened.c_str(), "a text"));
+    EXPECT_TRUE(write_regular_file(opened.c_str(), ""));
+    most_taken = all;
 }
 
 TEST(WriteText, OnAFullDiskTakesTheRoomOfTheOldOneOrTells)

@@ -50,6 +50,20 @@ protected:
             std::this_thread::yield();
         }
     }
+    /// The next life takes over the two registrations that stayed. `alerts` have come by then.
+    void live_again(std::size_t alerts)
+    {
+        nvrsim_clear_faults();
+        provider.reset(new NVRHBA_AlertIndication_Provider);
+        ASSERT_EQ(provider->load(), 0);
+        refresh();
+        ASSERT_EQ(enable(), 0);
+        EXPECT_EQ(nvrsim_callbacks(), 2u);
+        link("0", true);
+        expect_rows(client.wait_for(alerts)[alerts - 1].get(), {{"Message", "PORT LINK UP"}, {"SequenceNumber", "0"}});
+        EXPECT_EQ(disable(), 0);
+        EXPECT_EQ(nvrsim_callbacks(), 0u);
+    }
     std::size_t count_word(const std::string& word)
     {
         const std::vector<std::string> all = log->words();
@@ -595,16 +609,7 @@ TEST_F(Alerts, ARemovalThatThrowsIsOneThatIsRefused)
     listenAgain();
 
     // Each of the two is still known by its own handle.
-    nvrsim_clear_faults();
-    provider.reset(new NVRHBA_AlertIndication_Provider);
-    ASSERT_EQ(provider->load(), 0);
-    refresh();
-    ASSERT_EQ(enable(), 0);
-    EXPECT_EQ(nvrsim_callbacks(), 2u);
-    link("0", true);
-    expect_rows(client.wait_for(2)[1].get(), {{"Message", "PORT LINK UP"}, {"SequenceNumber", "0"}});
-    EXPECT_EQ(disable(), 0);
-    EXPECT_EQ(nvrsim_callbacks(), 0u);
+    live_again(2);
 }
 
 TEST_F(Alerts, WhatRemainsIsTriedOnceMoreAtTheUnload)
@@ -634,16 +639,7 @@ TEST_F(Alerts, ACallbackThatOutlivesTheUnloadTouchesNothing)
     EXPECT_EQ(client.count(), 0u);
 
     // The next life takes the registrations over.
-    nvrsim_clear_faults();
-    provider.reset(new NVRHBA_AlertIndication_Provider);
-    ASSERT_EQ(provider->load(), 0);
-    refresh();
-    ASSERT_EQ(enable(), 0);
-    EXPECT_EQ(nvrsim_callbacks(), 2u);
-    link("0", true);
-    expect_rows(client.wait_for(1)[0].get(), {{"Message", "PORT LINK UP"}, {"SequenceNumber", "0"}});
-    EXPECT_EQ(disable(), 0);
-    EXPECT_EQ(nvrsim_callbacks(), 0u);
+    live_again(1);
 }
 
 TEST_F(Alerts, WithoutAWorkerAlertsStayOff)

@@ -90,6 +90,15 @@ void wait_for_call(const std::string& call)
         std::this_thread::sleep_for(std::chrono::milliseconds(1));
 }
 
+// A client has set something, and nothing of it is written.
+void prepare(Rig& rig)
+{
+    set_minutes(rig, 17);
+    rig.settle();
+    remove(conf_path);
+    remove(dmp_path);
+}
+
 // It outlives the exit, as a server's module does.
 Rig& lasting_rig(const Rig_Options& options)
 {
@@ -174,10 +183,7 @@ TEST(Exit, WhileTheAgentLetsGoOfItsLibrariesFindsBothFilesWritten)
 {
     const Ended ended = exit_after([] {
         Rig& rig = lasting_rig({host::Manner::strict(), "small"});
-        set_minutes(rig, 17);
-        rig.settle();
-        remove(conf_path);
-        remove(dmp_path);
+        prepare(rig);
         // The last that the agent's end does.
         add_fault("call = \"HBA_FreeLibrary\", delay_ms = 600000");
         std::thread([&] { rig.stop(); }).detach();
@@ -202,10 +208,7 @@ TEST(Exit, AtAnyMomentOfTheAgentsEndLeavesWholeFiles)
                 remove(trace_path);
             }
             Rig& rig = lasting_rig({host::Manner::strict(), "small"});
-            set_minutes(rig, 17);
-            rig.settle();
-            remove(conf_path);
-            remove(dmp_path);
+            prepare(rig);
             std::thread([&] { rig.stop(); }).detach();
             while (rig.count_words("Entering the function ~ProviderAgent()") == 0)
                 std::this_thread::yield();
@@ -259,10 +262,7 @@ TEST(Exit, OfAThreadThatWasCancelledIsOne)
 {
     const Ended ended = exit_after([] {
         Rig& rig = lasting_rig(in_sfcb);
-        set_minutes(rig, 17);
-        rig.settle();
-        remove(conf_path);
-        remove(dmp_path);
+        prepare(rig);
         std::thread([] {
             pthread_cancel(pthread_self());
             std::exit(0);
@@ -292,10 +292,7 @@ TEST(Exit, OfAProcessThatNeverLoadedWritesNothing)
 TEST(Exit, OfAChildOfTheServerLeavesTheServersFilesAndName)
 {
     Rig rig({host::Manner::strict(), "small"});
-    set_minutes(rig, 17);
-    rig.settle();
-    remove(conf_path);
-    remove(dmp_path);
+    prepare(rig);
     EXPECT_EQ(exit_after([] {}).status, 0);
     EXPECT_FALSE(exists(conf_path));
     EXPECT_FALSE(exists(dmp_path));
@@ -309,10 +306,7 @@ TEST(Exit, WithFilesThatCannotBeWrittenIsClean)
 {
     const Ended ended = exit_after([] {
         Rig& rig = lasting_rig(in_sfcb);
-        set_minutes(rig, 17);
-        rig.settle();
-        remove(conf_path);
-        remove(dmp_path);
+        prepare(rig);
         make_folder(conf_path);
         make_folder(dmp_path);
     });
